@@ -1,0 +1,13 @@
+# Every target of the project links iscsieptool_flags, which stays out of what is installed.
+add_library(iscsieptool_flags INTERFACE)
+target_compile_features(iscsieptool_flags INTERFACE cxx_std_17)
+target_compile_options(iscsieptool_flags INTERFACE
+  -Wall -Wextra -Wpedantic -Wconversion -Wsign-conversion -Wshadow -Wold-style-cast -Wformat=2)
+# File positions are 64 bits wide on 32-bit machines too.
+target_compile_definitions(iscsieptool_flags INTERFACE _FILE_OFFSET_BITS=64)
+
+set(CMAKE_CXX_STANDARD 17)
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)

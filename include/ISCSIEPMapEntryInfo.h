@@ -1,0 +1,32 @@
+// One entry of a map file.
+#pragma once
+
+#include <string>
+
+#include "etc/ISCSIEPDiagnostics.h"
+
+namespace ISCSI::TOOL {
+
+/// The decoded map entry of one index: a plain value.
+class ISCSI_EP_EXPORT ISCSIEPMapEntryInfo {
+public:
+    /// An entry of all zero bits.
+    ISCSIEPMapEntryInfo();
+    ISCSIEPMapEntryInfo(unsigned long long entryExtentAddress, unsigned int entryPoolNumber, bool isMapped,
+                        bool isVPushed, bool isVPulled, bool isSynced);
+    ISCSIEPMapEntryInfo(const ISCSIEPMapEntryInfo&) = default;
+    ISCSIEPMapEntryInfo& operator=(const ISCSIEPMapEntryInfo&) = default;
+    virtual ~ISCSIEPMapEntryInfo();
+
+    /// The entry as one line, its line feed included. Throws nothing but std::bad_alloc.
+    std::string toString() const;
+
+    unsigned long long extentAddress = 0;
+    unsigned int poolNumber = 0;
+    bool mapped = false;
+    bool vpushed = false;
+    bool vpulled = false;
+    bool synced = false;
+};
+
+}  // namespace ISCSI::TOOL

@@ -1,0 +1,209 @@
+#include "ISCSIEPFileMAP.h"
+
+#include <algorithm>
+#include <cstdint>
+#include <exception>
+#include <memory>
+#include <utility>
+
+#include "DumpText.h"
+#include "EPLayout.h"
+#include "EPLookup.h"
+#include "LittleEndian.h"
+#include "etc/ISCSIQuorinStringTool.h"
+
+namespace ISCSI::TOOL {
+
+namespace {
+
+constexpr unsigned int maxPoolCount = (EP_HEADER_BLOCK_SIZE - EP_SEG0) / EP_UUID_SIZE;
+constexpr unsigned int entriesPerRead = 8192;
+
+constexpr EPLookup entryLookup = {
+    GetSourceFileName(__FILE__), "getMapEntry", EP_FILE_TYPE_MAP, 172, 176, 180, 185, 189,
+};
+constexpr EPLookup entriesLookup = {
+    GetSourceFileName(__FILE__), "getMapEntries", EP_FILE_TYPE_MAP, 201, 202, 203, 204, 205,
+};
+
+// Bits 48 to 51 count in both fields until the program that writes map files settles to which they belong.
+constexpr std::uint64_t extentAddressMask = 0x000FFFFFFFFFFFFF;
+constexpr std::uint64_t poolNumberMask = 0x0FFF000000000000;
+constexpr unsigned int poolNumberShift = 48;
+
+ISCSIEPMapEntryInfo decodeEntry(const unsigned char* bytes) {
+    const std::uint64_t entry = le64(bytes);
+    const auto flag = [entry](unsigned int bit) { return ((entry >> bit) & 1U) != 0; };
+    return {entry & extentAddressMask,
+            static_cast<unsigned int>((entry & poolNumberMask) >> poolNumberShift),
+            flag(63),
+            flag(62),
+            flag(61),
+            flag(60)};
+}
+
+/// Appends the text of the UUID at `bytes` to `list`. Returns 0 or EP_ERR_BAD_UUID.
+int appendUUID(const unsigned char* bytes, std::vector<std::string>& list) {
+    std::string text;
+    const int error = GetUUIDInString(bytes, text);
+    if (error != 0) return error;
+    try {
+        list.push_back(std::move(text));
+    } catch (const std::exception&) {  // no memory
+        return EP_ERR_BAD_UUID;
+    }
+    return 0;
+}
+
+/// Appends entries from `stream` to `run` until it holds `count`, or all up to the end of the file. False on an error.
+bool readEntries(EPFileStream& stream, std::uint64_t count, std::vector<ISCSIEPMapEntryInfo>& run) {
+    const auto blockEntries = std::min<std::uint64_t>(count, entriesPerRead);
+    const std::unique_ptr<unsigned char[]> block(
+        new unsigned char[static_cast<std::size_t>(blockEntries * EP_MAP_ENTRY_SIZE)]);
+    while (run.size() < count) {
+        const auto wanted = std::min(count - run.size(), blockEntries);
+        const auto got = stream.readUpTo(block.get(), static_cast<std::streamsize>(wanted * EP_MAP_ENTRY_SIZE));
+        if (got < 0) return false;
+        const auto arrived = static_cast<std::size_t>(got) / EP_MAP_ENTRY_SIZE;
+        if (run.empty()) run.reserve(arrived);
+        for (std::size_t i = 0; i < arrived; ++i)
+            run.push_back(decodeEntry(block.get() + i * EP_MAP_ENTRY_SIZE));
+        if (arrived < wanted) break;
+    }
+    return true;
+}
+
+}  // namespace
+
+ISCSIEPFileMAP::ISCSIEPFileMAP() : ISCSIEPFileMAP(std::string()) {}
+
+ISCSIEPFileMAP::ISCSIEPFileMAP(const std::string& filePath) : ISCSIEPFile(filePath) {}
+
+ISCSIEPFileMAP::~ISCSIEPFileMAP() = default;
+
+int ISCSIEPFileMAP::parseFile() {
+    int error = parseHead0();
+    if (error != 0) {
+        EP_LOG_ERR(63, "Failed to get parse HEAD[0]. path: %s", path.c_str());
+        return error;
+    }
+    const unsigned char* head1 = headerBlock + EP_HEAD1;
+    head1Checksum = le32(head1);
+    attribute = le32(head1 + 4);
+    logicBlockSize = le32(head1 + 8);
+    totalCount = le64(head1 + 12);
+    error = GetUUIDInString(head1 + 20, parentUUID);
+    if (error != 0) {
+        EP_LOG_ERR(84, "Failed to get HEAD[1] parent UUID. path: %s", path.c_str());
+        return error;
+    }
+    parentTotalCount = le64(head1 + 36);
+
+    const unsigned char* var0 = headerBlock + EP_VAR0;
+    var0Checksum = le32(var0);
+    mappedCount = le64(var0 + 4);
+
+    const unsigned char* var1 = headerBlock + EP_VAR1;
+    var1Checksum = le32(var1);
+    seg0Checksum = le32(var1 + 4);
+    seg0PoolCount = le32(var1 + 8);
+    error = GetUUIDInString(var1 + 12, sessionUUID);
+    if (error != 0) {
+        EP_LOG_ERR(114, "Failed to get VAR[1] session UUID. path: %s", path.c_str());
+        return error;
+    }
+    promoteTime = le32(var1 + 28);
+
+    const unsigned char* var2 = headerBlock + EP_VAR2;
+    var2Checksum = le32(var2);
+    syncCount = le64(var2 + 4);
+    childAttribute = le32(var2 + 12);
+    error = GetUUIDInString(var2 + 16, trackUUID);
+    if (error != 0) {
+        EP_LOG_ERR(136, "Failed to get VAR[2] track UUID. path: %s", path.c_str());
+        return error;
+    }
+    error = GetUUIDInString(var2 + 32, previousTrackUUID);
+    if (error != 0) {
+        EP_LOG_ERR(140, "Failed to get VAR[2] previous track UUID. path: %s", path.c_str());
+        return error;
+    }
+    error = GetUUIDInString(var2 + 48, currentTrackUUID);
+    if (error != 0) {
+        EP_LOG_ERR(144, "Failed to get VAR[2] current track UUID. path: %s", path.c_str());
+        return error;
+    }
+
+    const std::size_t poolCount = std::min(seg0PoolCount, maxPoolCount);
+    for (std::size_t i = 0; i < poolCount; ++i) {
+        error = appendUUID(headerBlock + EP_SEG0 + i * EP_UUID_SIZE, poolUUIDs);
+        if (error != 0) {
+            EP_LOG_ERR(152, "Failed to get SEG[0] #%zu pool UUID. path: %s", i, path.c_str());
+            return error;
+        }
+    }
+    return 0;
+}
+
+int ISCSIEPFileMAP::getMapEntry(unsigned long long index, ISCSIEPMapEntryInfo& entry) {
+    EPFileStream stream(path);
+    const int error = seekToItem(*this, stream, entryLookup, index, EP_MAP_ENTRY_SIZE);
+    if (error != 0) return error;
+    unsigned char bytes[EP_MAP_ENTRY_SIZE];
+    if (!stream.read(bytes, sizeof bytes)) return readFailed(*this, entryLookup);
+    entry = decodeEntry(bytes);
+    return 0;
+}
+
+int ISCSIEPFileMAP::getMapEntries(unsigned long long first, unsigned long long count,
+                                  std::vector<ISCSIEPMapEntryInfo>& entries) {
+    std::vector<ISCSIEPMapEntryInfo> run;
+    if (count > 0) {
+        EPFileStream stream(path);
+        const int error = seekToItem(*this, stream, entriesLookup, first, EP_MAP_ENTRY_SIZE);
+        if (error != 0) return error;
+        try {
+            if (!readEntries(stream, count, run) || run.empty()) return readFailed(*this, entriesLookup);
+        } catch (const std::exception&) {  // no memory
+            return readFailed(*this, entriesLookup);
+        }
+    }
+    entries.swap(run);
+    return 0;
+}
+
+std::string ISCSIEPFileMAP::toString() const {
+    constexpr std::size_t textSize = 1024;
+    constexpr std::size_t poolLineSize = 64;
+    DumpText text(ISCSIEPFile::toString(), textSize + poolLineSize * poolUUIDs.size());
+    text.section("HEAD[1]")
+        .hex("checksum", head1Checksum)
+        .hex("attribute", attribute)
+        .dec("logic block size", logicBlockSize)
+        .dec("total count", totalCount)
+        .text("parent UUID", parentUUID)
+        .dec("parent total count", parentTotalCount)
+        .section("VAR[0]")
+        .hex("checksum", var0Checksum)
+        .dec("mapped count", mappedCount)
+        .section("VAR[1]")
+        .hex("checksum", var1Checksum)
+        .hex("seg0 checksum", seg0Checksum)
+        .dec("seg0 pool count", seg0PoolCount)
+        .text("session UUID", sessionUUID)
+        .time("promote time", promoteTime)
+        .section("VAR[2]")
+        .hex("checksum", var2Checksum)
+        .dec("sync count", syncCount)
+        .hex("child attribute", childAttribute)
+        .text("track UUID", trackUUID)
+        .text("previous track UUID", previousTrackUUID)
+        .text("current track UUID", currentTrackUUID)
+        .section("SEG[0]");
+    unsigned long long number = 0;
+    for (const std::string& poolUUID : poolUUIDs)
+        text.item("pool", ++number, poolUUID);
+    return text.str();
+}
+
+}  // namespace ISCSI::TOOL

@@ -1,0 +1,220 @@
+// The lookups beyond the header block: map entries and extents.
+#include <ISCSIEPFileDAT.h>
+#include <ISCSIEPFileMAP.h>
+
+#include <filesystem>
+#include <limits>
+
+#include "Support.h"
+
+using namespace ISCSI::TOOL;
+using epsample::EPFileBuilder;
+namespace head0 = epsample::head0;
+
+namespace {
+
+constexpr std::uint64_t blockSize = 24576;
+constexpr std::uint64_t maximum = std::numeric_limits<std::uint64_t>::max();
+
+/// How one lookup is driven, and the lines it logs.
+struct Lookup {
+    std::string source;
+    int header, type, open, seek, read;
+    std::uint64_t itemSize;
+    EPFileBuilder builder;
+    std::unique_ptr<ISCSIEPFile> (*make)(const std::string& path);
+    /// Looks up one item; false when a failure has changed the result.
+    bool (*find)(ISCSIEPFile& file, std::uint64_t index, int expected);
+};
+
+std::vector<Lookup> allLookups() {
+    const auto makeMap = [](const std::string& path) -> std::unique_ptr<ISCSIEPFile> {
+        return std::make_unique<ISCSIEPFileMAP>(path);
+    };
+    const auto makeData = [](const std::string& path) -> std::unique_ptr<ISCSIEPFile> {
+        return std::make_unique<ISCSIEPFileDAT>(path);
+    };
+    return {{"ISCSIEPFileMAP.cpp", 172, 176, 180, 185, 189, 8, EPFileBuilder::map(), makeMap,
+             [](ISCSIEPFile& file, std::uint64_t index, int expected) {
+                 ISCSIEPMapEntryInfo entry(1, 2, true, false, true, false);
+                 EXPECT_EQ(expected, dynamic_cast<ISCSIEPFileMAP&>(file).getMapEntry(index, entry)) << index;
+                 return entry.toString() ==
+                        "pool number: 2 ,extent address: 1 ,mapped: true ,vpushed: false "
+                        ",vpulled: true ,synced: false\n";
+             }},
+            {"ISCSIEPFileMAP.cpp", 201, 202, 203, 204, 205, 8, EPFileBuilder::map(), makeMap,
+             [](ISCSIEPFile& file, std::uint64_t index, int expected) {
+                 std::vector<ISCSIEPMapEntryInfo> entries(3);
+                 EXPECT_EQ(expected, dynamic_cast<ISCSIEPFileMAP&>(file).getMapEntries(index, 1, entries)) << index;
+                 return entries.size() == 3;
+             }},
+            {"ISCSIEPFileDAT.cpp", 69, 73, 77, 82, 87, 512, EPFileBuilder::data(), makeData,
+             [](ISCSIEPFile& file, std::uint64_t index, int expected) {
+                 std::string data = "old";
+                 EXPECT_EQ(expected, dynamic_cast<ISCSIEPFileDAT&>(file).getExtentData(index, 512, data)) << index;
+                 return data == "old";
+             }}};
+}
+
+/// What each lookup calls itself, in the order of allLookups().
+const char* const operations[] = {"getMapEntry", "getMapEntries", "getExtentData"};
+
+}  // namespace
+
+TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
+    const TempDir folder;
+    const char* const* operation = operations;
+    for (const Lookup& lookup : allLookups()) {
+        const std::string name = ":" + std::string(*operation++) + " ";
+        const auto expectFailure = [&](ISCSIEPFile& file, std::uint64_t index, int code, std::vector<std::string> lines,
+                                       int line, const std::string& message) {
+            EXPECT_TRUE(lookup.find(file, index, code)) << name;
+            lines.push_back(lookup.source + ":" + std::to_string(line) + name + message);
+            EXPECT_EQ(chain(file.path, lines), takeLog()) << name << index;
+        };
+        const std::string failedRead = "Failed to read file.";
+        const std::string failedSeek = "Failed to seek to offset.";
+        const std::string path = folder.path("file");
+
+        const auto missing = lookup.make(folder.path("missing"));
+        expectFailure(*missing, 0, 18990038,
+                      {"ISCSIEPFile.cpp:37:readHeader Failed to open file.",
+                       "ISCSIEPFile.cpp:59:parseHead0 Failed to read header."},
+                      lookup.header, "Failed to parse header.");
+
+        for (const int type : {0, 1, 7, -1}) {  // the stored number is shown as signed
+            EPFileBuilder other = lookup.builder;
+            const auto file = lookup.make(folder.write(
+                "file", other.set(head0::type, static_cast<std::uint32_t>(type)).resize(blockSize + 4096)));
+            expectFailure(*file, 0, 18990400, {}, lookup.type, "Wrong EP file type: " + std::to_string(type) + ".");
+        }
+
+        // Two items and all but the last byte of a third.
+        EPFileBuilder builder = lookup.builder;
+        const auto file = lookup.make(folder.write("file", builder.resize(blockSize + 3 * lookup.itemSize - 1)));
+        EXPECT_FALSE(lookup.find(*file, 1, 0));
+        for (const std::uint64_t index : {std::uint64_t{2}, std::uint64_t{3}, std::uint64_t{0x100000001}}) {
+            expectFailure(*file, index, 18990039, {}, lookup.read, failedRead);
+        }
+        expectFailure(*file, (std::uint64_t{1} << 63) / lookup.itemSize, 18990041, {}, lookup.seek, failedSeek);
+        expectFailure(*file, (maximum - 2 * blockSize) / lookup.itemSize, 18990041, {}, lookup.seek, failedSeek);
+        const std::uint64_t wrapped = maximum / lookup.itemSize + 1 - blockSize / lookup.itemSize;
+        EXPECT_FALSE(lookup.find(*file, wrapped, 0));  // position 0, modulo 2^64
+
+        std::filesystem::resize_file(path, 100);  // HEAD[0] is known by now
+        expectFailure(*file, 1, 18990039, {}, lookup.read, failedRead);
+        std::filesystem::remove(path);
+        expectFailure(*file, 1, 18990038, {}, lookup.open, "Failed to open file.");
+
+        EPFileBuilder far = lookup.builder;
+        const auto outside = lookup.make(folder.write("far", far.set(head0::dataStartOffset, maximum)));
+        expectFailure(*outside, 0, 18990041, {}, lookup.seek, failedSeek);
+    }
+}
+
+TEST(MapEntry, BitsBecomeMembersAndALine) {
+    struct Case {
+        std::uint64_t stored;
+        const char* line;
+    };
+    const Case cases[] = {
+        {0, "pool number: 0 ,extent address: 0 ,mapped: false ,vpushed: false ,vpulled: false ,synced: false\n"},
+        {0x8000000000000400,
+         "pool number: 0 ,extent address: 1024 ,mapped: true ,vpushed: false ,vpulled: false ,synced: false\n"},
+        {0x100000000000002a,
+         "pool number: 0 ,extent address: 42 ,mapped: false ,vpushed: false ,vpulled: false ,synced: true\n"},
+        {0xd000000000001000,
+         "pool number: 0 ,extent address: 4096 ,mapped: true ,vpushed: true ,vpulled: false ,synced: true\n"},
+        {0x2ff0ffffffffffff,
+         "pool number: 4080 ,extent address: 281474976710655 ,mapped: false ,vpushed: false "
+         ",vpulled: true ,synced: false\n"},
+        {0x0001000000000000,
+         "pool number: 1 ,extent address: 281474976710656 ,mapped: false ,vpushed: false "
+         ",vpulled: false ,synced: false\n"},
+        {maximum,
+         "pool number: 4095 ,extent address: 4503599627370495 ,mapped: true ,vpushed: true ,vpulled: true "
+         ",synced: true\n"},
+    };
+    const TempDir folder;
+    EPFileBuilder builder = EPFileBuilder::map();
+    std::uint64_t index = 0;
+    for (const Case& c : cases)
+        builder.entry(index++, c.stored);
+    ISCSIEPFileMAP file(folder.write("map", builder));
+    std::vector<ISCSIEPMapEntryInfo> entries;
+    EXPECT_EQ(0, file.getMapEntries(0, maximum, entries));
+    ASSERT_EQ(std::size(cases), entries.size());
+    ISCSIEPMapEntryInfo entry;
+    while (index-- > 0) {
+        EXPECT_EQ(0, file.getMapEntry(index, entry));
+        EXPECT_EQ(cases[index].line, entry.toString());
+        EXPECT_EQ(cases[index].line, entries[static_cast<std::size_t>(index)].toString());
+    }
+}
+
+TEST(MapEntry, RunsOfEntriesEndWithTheFile) {
+    constexpr std::uint64_t total = 20000;  // several reads
+    const TempDir folder;
+    EPFileBuilder builder = EPFileBuilder::map();
+    std::string content;
+    for (std::uint64_t i = 0; i < total; ++i)
+        content += epsample::littleEndian(i, 8);
+    ISCSIEPFileMAP file(folder.write("map", builder.bytes(blockSize, content + "rest")));
+    struct Case {
+        std::uint64_t first, count, expected;
+    };
+    // The last count once made the walk endless: eight times it is 0, modulo 2^64.
+    for (const Case& c :
+         {Case{0, 0, 0}, Case{total, 0, 0}, Case{0, 1, 1}, Case{0, 8192, 8192}, Case{5, 8193, 8193},
+          Case{0, total, total}, Case{0, total + 1, total}, Case{total - 1, maximum, 1}, Case{1, maximum, total - 1},
+          Case{total - 16384, 16385, 16384}, Case{0, std::uint64_t{1} << 63, total}}) {
+        std::vector<ISCSIEPMapEntryInfo> entries(7);
+        EXPECT_EQ(0, file.getMapEntries(c.first, c.count, entries));
+        ASSERT_EQ(c.expected, entries.size()) << c.first << ' ' << c.count;
+        if (entries.empty()) continue;
+        EXPECT_EQ(c.first, entries.front().extentAddress);
+        EXPECT_EQ(c.first + c.expected - 1, entries.back().extentAddress);
+    }
+}
+
+TEST(Extent, MarksComeOutFromBeyondThe32BitRange) {
+    const TempDir folder;
+    EPFileBuilder builder = EPFileBuilder::data();
+    const std::uint64_t marks[] = {0, 0x7fffffff, 0x80000000, 0xffffffff, 0x100000000, 0x140000123};
+    for (std::size_t i = 0; i < std::size(marks); ++i) {
+        builder.bytes(blockSize + marks[i], std::string(1, static_cast<char>(0xa0 + i)));
+    }
+    ISCSIEPFileDAT file(folder.write("data", builder));
+    for (std::size_t i = 0; i < std::size(marks); ++i) {
+        std::string data;
+        EXPECT_EQ(0, file.getExtentData(marks[i], 1, data));
+        EXPECT_EQ("a" + std::to_string(i), data);
+    }
+    std::string data;  // the product of index and size needs 64 bits
+    EXPECT_EQ(0, file.getExtentData(0x1000, 0x100000, data));
+    EXPECT_EQ(std::string("a4") + std::string(0x200000 - 2, '0'), data);
+}
+
+TEST(Extent, BytesComeOutInFileOrderAndSizesAreChecked) {
+    const TempDir folder;
+    const std::string bytes("\x00\x0f\xa0\xff\x12\x34", 6);
+    const std::string path = folder.write("data", EPFileBuilder::data().bytes(blockSize, bytes));
+    ISCSIEPFileDAT file(path);
+    std::string data = "old";
+    EXPECT_EQ(0, file.getExtentData(0, 4, data));
+    EXPECT_EQ("000fa0ff", data);
+    EXPECT_EQ(0, file.getExtentData(1, 3, data));
+    EXPECT_EQ("ff1234", data);
+    EXPECT_EQ(0U, file.serialNumber);  // HEAD[1] is not decoded by a lookup
+
+    ISCSIEPFileDAT missing(folder.path("missing"));
+    EXPECT_EQ(18990507, missing.getExtentData(0, 0, data));
+    EXPECT_EQ(chain(missing.path, {"ISCSIEPFileDAT.cpp:65:getExtentData Invaild LUN extent size: 0."}), takeLog());
+    for (const unsigned int size : {0x7fffffffU, 0x80000000U, 0xffffffffU}) {
+        EXPECT_EQ(18990038, missing.getExtentData(0, size, data));
+        // Where a pointer has 32 bits no text of that size can be held, elsewhere the file ends too early.
+        EXPECT_EQ(sizeof(void*) == 4 ? 18990507 : 18990039, file.getExtentData(0, size, data));
+        takeLog();
+    }
+    EXPECT_EQ("ff1234", data);
+}
