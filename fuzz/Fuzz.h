@@ -1,4 +1,4 @@
-// What the fuzz programs share: the input as a file, and a system log that swallows the lines.
+// What the fuzz programs share: the input as a file, claims, and a system log that swallows the lines.
 #pragma once
 
 #include <sys/mman.h>
@@ -11,22 +11,13 @@
 
 extern "C" __attribute__((visibility("default"))) void syslog(int /*priority*/, const char* /*format*/, ...) {}
 
-/// A file in memory with the given bytes.
-class MemoryFile {
-public:
-    explicit MemoryFile(const std::vector<std::uint8_t>& bytes) : descriptor_(memfd_create("input", 0)) {
-        require(write(descriptor_, bytes.data(), bytes.size()) == static_cast<ssize_t>(bytes.size()));
-    }
-    MemoryFile(const MemoryFile&) = delete;
-    MemoryFile& operator=(const MemoryFile&) = delete;
-    ~MemoryFile() { close(descriptor_); }
+inline void require(bool holds) {
+    if (!holds) std::abort();
+}
 
-    std::string path() const { return "/proc/self/fd/" + std::to_string(descriptor_); }
-
-    static void require(bool holds) {
-        if (!holds) std::abort();
-    }
-
-private:
-    int descriptor_;
-};
+/// Puts the input into a file in memory, the same one each time, and returns its path.
+inline std::string inputFile(const std::uint8_t* bytes, std::size_t size) {
+    static const int descriptor = memfd_create("input", 0);
+    require(ftruncate(descriptor, 0) == 0 && pwrite(descriptor, bytes, size, 0) == static_cast<ssize_t>(size));
+    return "/proc/self/fd/" + std::to_string(descriptor);
+}

@@ -6,13 +6,12 @@
 #include "Fuzz.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t size) {
-    const MemoryFile file({bytes, bytes + size});
-    setenv("KELPISCSIEP_LUNS", file.path().c_str(), 1);
+    setenv("KELPISCSIEP_LUNS", inputFile(bytes, size).c_str(), 1);
     std::vector<unsigned char> record(KELPISCSI_LUN_RECORD_SIZE);  // of its exact size, so that a write behind it shows
     for (const unsigned int lid : {0U, 1U, 2U}) {
         const int error = KELPiSCSILunGetByLid(lid, 0, record.data());
-        MemoryFile::require(std::strlen(KELPiSCSIStrError(error)) > 0);
-        MemoryFile::require(error != 0 || (record[117] == 0 && record[4212] == 0 && record.back() == 0));
+        require(std::strlen(KELPiSCSIStrError(error)) > 0);
+        require(error != 0 || (record[117] == 0 && record[4212] == 0 && record.back() == 0));
     }
     return 0;
 }

@@ -4,6 +4,7 @@
 
 #include <filesystem>
 #include <limits>
+#include <map>
 
 #include "Support.h"
 
@@ -16,139 +17,101 @@ namespace {
 constexpr std::uint64_t blockSize = 24576;
 constexpr std::uint64_t maximum = std::numeric_limits<std::uint64_t>::max();
 
-/// How one lookup is driven, and the lines it logs.
+/// The lines at which a lookup logs, and the size of what it looks up.
 struct Lookup {
-    std::string source;
+    std::string source, operation;
     int header, type, open, seek, read;
     std::uint64_t itemSize;
-    EPFileBuilder builder;
-    std::unique_ptr<ISCSIEPFile> (*make)(const std::string& path);
-    /// Looks up one item; false when a failure has changed the result.
-    bool (*find)(ISCSIEPFile& file, std::uint64_t index, int expected);
 };
 
-std::vector<Lookup> allLookups() {
-    const auto makeMap = [](const std::string& path) -> std::unique_ptr<ISCSIEPFile> {
-        return std::make_unique<ISCSIEPFileMAP>(path);
+/// Drives one lookup into each of its failures. `find(file, index)` gives its code, or -1 when a failed call has
+/// touched the result.
+template <typename File, typename Find>
+void expectFailures(const Lookup& lookup, const EPFileBuilder& valid, Find find) {
+    const TempDir folder;
+    const auto expectFailure = [&](File& file, std::uint64_t index, int code, int line, const std::string& message,
+                                   std::vector<std::string> lines = {}) {
+        EXPECT_EQ(code, find(file, index)) << index;
+        lines.push_back(lookup.source + ":" + std::to_string(line) + ":" + lookup.operation + " " + message);
+        EXPECT_EQ(chain(file.path, lines), takeLog()) << index;
     };
-    const auto makeData = [](const std::string& path) -> std::unique_ptr<ISCSIEPFile> {
-        return std::make_unique<ISCSIEPFileDAT>(path);
-    };
-    return {{"ISCSIEPFileMAP.cpp", 172, 176, 180, 185, 189, 8, EPFileBuilder::map(), makeMap,
-             [](ISCSIEPFile& file, std::uint64_t index, int expected) {
-                 ISCSIEPMapEntryInfo entry(1, 2, true, false, true, false);
-                 EXPECT_EQ(expected, dynamic_cast<ISCSIEPFileMAP&>(file).getMapEntry(index, entry)) << index;
-                 return entry.toString() ==
-                        "pool number: 2 ,extent address: 1 ,mapped: true ,vpushed: false "
-                        ",vpulled: true ,synced: false\n";
-             }},
-            {"ISCSIEPFileMAP.cpp", 201, 202, 203, 204, 205, 8, EPFileBuilder::map(), makeMap,
-             [](ISCSIEPFile& file, std::uint64_t index, int expected) {
-                 std::vector<ISCSIEPMapEntryInfo> entries(3);
-                 EXPECT_EQ(expected, dynamic_cast<ISCSIEPFileMAP&>(file).getMapEntries(index, 1, entries)) << index;
-                 return entries.size() == 3;
-             }},
-            {"ISCSIEPFileDAT.cpp", 69, 73, 77, 82, 87, 512, EPFileBuilder::data(), makeData,
-             [](ISCSIEPFile& file, std::uint64_t index, int expected) {
-                 std::string data = "old";
-                 EXPECT_EQ(expected, dynamic_cast<ISCSIEPFileDAT&>(file).getExtentData(index, 512, data)) << index;
-                 return data == "old";
-             }}};
+    File missing(folder.path("missing"));
+    expectFailure(
+        missing, 0, 18990038, lookup.header, "Failed to parse header.",
+        {"ISCSIEPFile.cpp:37:readHeader Failed to open file.", "ISCSIEPFile.cpp:59:parseHead0 Failed to read header."});
+    for (const int type : {0, 1, 7, -1}) {  // the stored number is shown as signed
+        EPFileBuilder other = valid;
+        other.set(head0::type, static_cast<std::uint32_t>(type)).resize(blockSize + 4096);
+        File file(folder.write("other", other));
+        expectFailure(file, 0, 18990400, lookup.type, "Wrong EP file type: " + std::to_string(type) + ".");
+    }
+    // Two items and all but the last byte of a third.
+    EPFileBuilder builder = valid;
+    File file(folder.write("file", builder.resize(blockSize + 3 * lookup.itemSize - 1)));
+    EXPECT_EQ(0, find(file, 1));
+    for (const std::uint64_t index : {std::uint64_t{2}, std::uint64_t{3}, std::uint64_t{0x100000001}}) {
+        expectFailure(file, index, 18990039, lookup.read, "Failed to read file.");
+    }
+    for (const std::uint64_t position : {std::uint64_t{1} << 63, maximum - 2 * blockSize}) {
+        expectFailure(file, position / lookup.itemSize, 18990041, lookup.seek, "Failed to seek to offset.");
+    }
+    EXPECT_EQ(0, find(file, maximum / lookup.itemSize + 1 - blockSize / lookup.itemSize));  // position 0, modulo 2^64
+    std::filesystem::resize_file(file.path, 100);                                           // HEAD[0] is known by now
+    expectFailure(file, 1, 18990039, lookup.read, "Failed to read file.");
+    std::filesystem::remove(file.path);
+    expectFailure(file, 1, 18990038, lookup.open, "Failed to open file.");
 }
-
-/// What each lookup calls itself, in the order of allLookups().
-const char* const operations[] = {"getMapEntry", "getMapEntries", "getExtentData"};
 
 }  // namespace
 
 TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
-    const TempDir folder;
-    const char* const* operation = operations;
-    for (const Lookup& lookup : allLookups()) {
-        const std::string name = ":" + std::string(*operation++) + " ";
-        const auto expectFailure = [&](ISCSIEPFile& file, std::uint64_t index, int code, std::vector<std::string> lines,
-                                       int line, const std::string& message) {
-            EXPECT_TRUE(lookup.find(file, index, code)) << name;
-            lines.push_back(lookup.source + ":" + std::to_string(line) + name + message);
-            EXPECT_EQ(chain(file.path, lines), takeLog()) << name << index;
-        };
-        const std::string failedRead = "Failed to read file.";
-        const std::string failedSeek = "Failed to seek to offset.";
-        const std::string path = folder.path("file");
-
-        const auto missing = lookup.make(folder.path("missing"));
-        expectFailure(*missing, 0, 18990038,
-                      {"ISCSIEPFile.cpp:37:readHeader Failed to open file.",
-                       "ISCSIEPFile.cpp:59:parseHead0 Failed to read header."},
-                      lookup.header, "Failed to parse header.");
-
-        for (const int type : {0, 1, 7, -1}) {  // the stored number is shown as signed
-            EPFileBuilder other = lookup.builder;
-            const auto file = lookup.make(folder.write(
-                "file", other.set(head0::type, static_cast<std::uint32_t>(type)).resize(blockSize + 4096)));
-            expectFailure(*file, 0, 18990400, {}, lookup.type, "Wrong EP file type: " + std::to_string(type) + ".");
-        }
-
-        // Two items and all but the last byte of a third.
-        EPFileBuilder builder = lookup.builder;
-        const auto file = lookup.make(folder.write("file", builder.resize(blockSize + 3 * lookup.itemSize - 1)));
-        EXPECT_FALSE(lookup.find(*file, 1, 0));
-        for (const std::uint64_t index : {std::uint64_t{2}, std::uint64_t{3}, std::uint64_t{0x100000001}}) {
-            expectFailure(*file, index, 18990039, {}, lookup.read, failedRead);
-        }
-        expectFailure(*file, (std::uint64_t{1} << 63) / lookup.itemSize, 18990041, {}, lookup.seek, failedSeek);
-        expectFailure(*file, (maximum - 2 * blockSize) / lookup.itemSize, 18990041, {}, lookup.seek, failedSeek);
-        const std::uint64_t wrapped = maximum / lookup.itemSize + 1 - blockSize / lookup.itemSize;
-        EXPECT_FALSE(lookup.find(*file, wrapped, 0));  // position 0, modulo 2^64
-
-        std::filesystem::resize_file(path, 100);  // HEAD[0] is known by now
-        expectFailure(*file, 1, 18990039, {}, lookup.read, failedRead);
-        std::filesystem::remove(path);
-        expectFailure(*file, 1, 18990038, {}, lookup.open, "Failed to open file.");
-
-        EPFileBuilder far = lookup.builder;
-        const auto outside = lookup.make(folder.write("far", far.set(head0::dataStartOffset, maximum)));
-        expectFailure(*outside, 0, 18990041, {}, lookup.seek, failedSeek);
-    }
+    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntry", 172, 176, 180, 185, 189, 8},
+                                   EPFileBuilder::map(), [](ISCSIEPFileMAP& file, std::uint64_t index) {
+                                       ISCSIEPMapEntryInfo entry(1, 2, true, true, true, true);
+                                       const std::string before = entry.toString();
+                                       const int code = file.getMapEntry(index, entry);
+                                       return code == 0 || entry.toString() == before ? code : -1;
+                                   });
+    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8},
+                                   EPFileBuilder::map(), [](ISCSIEPFileMAP& file, std::uint64_t index) {
+                                       std::vector<ISCSIEPMapEntryInfo> entries(3);
+                                       const int code = file.getMapEntries(index, 1, entries);
+                                       return code == 0 || entries.size() == 3 ? code : -1;
+                                   });
+    expectFailures<ISCSIEPFileDAT>({"ISCSIEPFileDAT.cpp", "getExtentData", 69, 73, 77, 82, 87, 512},
+                                   EPFileBuilder::data(), [](ISCSIEPFileDAT& file, std::uint64_t index) {
+                                       std::string data = "old";
+                                       const int code = file.getExtentData(index, 512, data);
+                                       return code == 0 || data == "old" ? code : -1;
+                                   });
 }
 
 TEST(MapEntry, BitsBecomeMembersAndALine) {
-    struct Case {
-        std::uint64_t stored;
-        const char* line;
-    };
-    const Case cases[] = {
+    // clang-format off
+    const std::map<std::uint64_t, std::string> lines = {
         {0, "pool number: 0 ,extent address: 0 ,mapped: false ,vpushed: false ,vpulled: false ,synced: false\n"},
-        {0x8000000000000400,
-         "pool number: 0 ,extent address: 1024 ,mapped: true ,vpushed: false ,vpulled: false ,synced: false\n"},
-        {0x100000000000002a,
-         "pool number: 0 ,extent address: 42 ,mapped: false ,vpushed: false ,vpulled: false ,synced: true\n"},
-        {0xd000000000001000,
-         "pool number: 0 ,extent address: 4096 ,mapped: true ,vpushed: true ,vpulled: false ,synced: true\n"},
-        {0x2ff0ffffffffffff,
-         "pool number: 4080 ,extent address: 281474976710655 ,mapped: false ,vpushed: false "
-         ",vpulled: true ,synced: false\n"},
-        {0x0001000000000000,
-         "pool number: 1 ,extent address: 281474976710656 ,mapped: false ,vpushed: false "
-         ",vpulled: false ,synced: false\n"},
-        {maximum,
-         "pool number: 4095 ,extent address: 4503599627370495 ,mapped: true ,vpushed: true ,vpulled: true "
-         ",synced: true\n"},
-    };
+        {0x8000000000000400, "pool number: 0 ,extent address: 1024 ,mapped: true ,vpushed: false ,vpulled: false ,synced: false\n"},
+        {0x100000000000002a, "pool number: 0 ,extent address: 42 ,mapped: false ,vpushed: false ,vpulled: false ,synced: true\n"},
+        {0xd000000000001000, "pool number: 0 ,extent address: 4096 ,mapped: true ,vpushed: true ,vpulled: false ,synced: true\n"},
+        {0x2ff0ffffffffffff, "pool number: 4080 ,extent address: 281474976710655 ,mapped: false ,vpushed: false ,vpulled: true ,synced: false\n"},
+        {0x0001000000000000, "pool number: 1 ,extent address: 281474976710656 ,mapped: false ,vpushed: false ,vpulled: false ,synced: false\n"},
+        {maximum, "pool number: 4095 ,extent address: 4503599627370495 ,mapped: true ,vpushed: true ,vpulled: true ,synced: true\n"}};
+    // clang-format on
     const TempDir folder;
     EPFileBuilder builder = EPFileBuilder::map();
     std::uint64_t index = 0;
-    for (const Case& c : cases)
-        builder.entry(index++, c.stored);
+    for (const auto& [stored, line] : lines)
+        builder.entry(index++, stored);
     ISCSIEPFileMAP file(folder.write("map", builder));
     std::vector<ISCSIEPMapEntryInfo> entries;
     EXPECT_EQ(0, file.getMapEntries(0, maximum, entries));
-    ASSERT_EQ(std::size(cases), entries.size());
-    ISCSIEPMapEntryInfo entry;
-    while (index-- > 0) {
+    ASSERT_EQ(lines.size(), entries.size());
+    index = 0;
+    for (const auto& [stored, line] : lines) {
+        ISCSIEPMapEntryInfo entry;
         EXPECT_EQ(0, file.getMapEntry(index, entry));
-        EXPECT_EQ(cases[index].line, entry.toString());
-        EXPECT_EQ(cases[index].line, entries[static_cast<std::size_t>(index)].toString());
+        EXPECT_EQ(line, entry.toString());
+        EXPECT_EQ(line, entries[static_cast<std::size_t>(index++)].toString());
     }
 }
 

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <map>
 
 #include "Support.h"
 
@@ -102,32 +103,15 @@ TEST(LunConf, TextsEndAtTheirNulOrWithTheRecord) {
 }
 
 TEST(LunConf, TypesAreNamedByEqualityOnly) {
-    struct Case {
-        int type;
-        const char* name;
+    const std::map<int, std::string> names = {
+        // clang-format off
+        {1, "BLOCK"}, {3, "FILE"}, {7, "THIN"}, {15, "ADV"}, {31, "SINK"}, {47, "VDISK_ADV"}, {71, "BKP_THIN"},
+        {79, "BKP_ADV"}, {143, "CINDER"}, {259, "BLUN_THICK"}, {263, "BLUN"}, {275, "BLUN_THICK_SINK"},
+        {279, "BLUN_SINK"}, {291, "VDISK_BLUN_THICK"}, {295, "VDISK_BLUN"}, {311, "VDISK_BLUN_SINK"},
+        {323, "BKP_BLUN_THICK"}, {327, "BKP_BLUN"}, {387, "CINDER_BLUN_THICK"}, {391, "CINDER_BLUN"},
+        {807, "VDISK_BLUN_COW"}, {1831, "VDISK_BLUN_Q9"}
+        // clang-format on
     };
-    const Case cases[] = {{1, "BLOCK"},
-                          {3, "FILE"},
-                          {7, "THIN"},
-                          {15, "ADV"},
-                          {31, "SINK"},
-                          {47, "VDISK_ADV"},
-                          {71, "BKP_THIN"},
-                          {79, "BKP_ADV"},
-                          {143, "CINDER"},
-                          {259, "BLUN_THICK"},
-                          {263, "BLUN"},
-                          {275, "BLUN_THICK_SINK"},
-                          {279, "BLUN_SINK"},
-                          {291, "VDISK_BLUN_THICK"},
-                          {295, "VDISK_BLUN"},
-                          {311, "VDISK_BLUN_SINK"},
-                          {323, "BKP_BLUN_THICK"},
-                          {327, "BKP_BLUN"},
-                          {387, "CINDER_BLUN_THICK"},
-                          {391, "CINDER_BLUN"},
-                          {807, "VDISK_BLUN_COW"},
-                          {1831, "VDISK_BLUN_Q9"}};
     const auto nameOf = [](int type) {
         ISCSILUNConfInfo lun;
         lun.type = type;
@@ -136,86 +120,79 @@ TEST(LunConf, TypesAreNamedByEqualityOnly) {
         return text.substr(start, text.find(' ', start) - start);
     };
     for (int type = -2; type < 2000; ++type) {
-        const auto row =
-            std::find_if(std::begin(cases), std::end(cases), [&](const Case& c) { return c.type == type; });
-        EXPECT_EQ(row == std::end(cases) ? "UNKNOWN" : row->name, nameOf(type)) << type;
+        const auto row = names.find(type);
+        EXPECT_EQ(row == names.end() ? "UNKNOWN" : row->second, nameOf(type)) << type;
     }
     EXPECT_EQ("UNKNOWN", nameOf(263 - 0x7fffffff - 1));
 }
 
 TEST(LunConf, ByteCountsAreSplitIntoUnits) {
-    struct Case {
-        unsigned long long count;
-        const char* text;
+    const std::map<unsigned long long, std::string> texts = {
+        // clang-format off
+        {0, "0bytes"}, {1023, "1023bytes"}, {1024, "1KB"}, {1536, "1KB,512bytes"}, {1048576, "1MB"},
+        {1048577, "1MB,1bytes"}, {1610612736, "1GB,512MB"}, {4294967295, "3GB,1023MB,1023KB,1023bytes"},
+        {1ULL << 40, "1TB"}, {1ULL << 50, "1PB"}, {1ULL << 60, "1EB"},
+        {(1ULL << 60) - 1, "1023PB,1023TB,1023GB,1023MB,1023KB,1023bytes"},
+        {18446744073709551615ULL, "15EB,1023PB,1023TB,1023GB,1023MB,1023KB,1023bytes"}
+        // clang-format on
     };
-    for (const Case& c :
-         {Case{0, "0bytes"}, Case{1023, "1023bytes"}, Case{1024, "1KB"}, Case{1536, "1KB,512bytes"},
-          Case{1048576, "1MB"}, Case{1048577, "1MB,1bytes"}, Case{1610612736, "1GB,512MB"},
-          Case{4294967295, "3GB,1023MB,1023KB,1023bytes"}, Case{1ULL << 40, "1TB"}, Case{1ULL << 50, "1PB"},
-          Case{(1ULL << 60) - 1, "1023PB,1023TB,1023GB,1023MB,1023KB,1023bytes"}, Case{1ULL << 60, "1EB"},
-          Case{18446744073709551615ULL, "15EB,1023PB,1023TB,1023GB,1023MB,1023KB,1023bytes"}}) {
+    for (const auto& [count, text] : texts) {
         ISCSILUNConfInfo lun;
-        lun.size = c.count;
-        EXPECT_NE(std::string::npos,
-                  lun.toString().find(",size: " + std::to_string(c.count) + " (" + c.text + ") ,restore"))
-            << c.text << lun.toString();
+        lun.size = count;
+        const std::string expected = ",size: " + std::to_string(count) + " (" + text + ") ,restore";
+        EXPECT_NE(std::string::npos, lun.toString().find(expected)) << expected;
     }
 }
 
 namespace {
 
 struct Sibling {
-    int (*find)(const ISCSIEPFile& file, std::string& path);
     const char* suffix;
-    std::string missingLine, invalidLine;
+    std::string missing, invalid;  ///< lines and operation of the two failures
+    std::string kind;
+    int (*find)(const ISCSIEPFile& file, std::string& path);
 };
 
-const Sibling siblings[] = {{[](const ISCSIEPFile& file, std::string& path) { return file.getTBLFilePath(path); },
-                             "EP_TBL", "ISCSIEPFile.cpp:106:getTBLFilePath Failed to get TBL file path.",
-                             "ISCSIEPFile.cpp:110:getTBLFilePath Failed to get volume ID."},
-                            {[](const ISCSIEPFile& file, std::string& path) { return file.getFRIFilePath(path); },
-                             "EP_FRI", "ISCSIEPFile.cpp:129:getFRIFilePath Failed to get FRI file path.",
-                             "ISCSIEPFile.cpp:133:getFRIFilePath Failed to get volume ID."},
-                            {[](const ISCSIEPFile& file, std::string& path) { return file.getDATFilePath(0, 9, path); },
-                             "EP_DAT_00000", "ISCSIEPFile.cpp:153:getDATFilePath Failed to get DAT file path.",
-                             "ISCSIEPFile.cpp:157:getDATFilePath Failed to get volume ID."}};
+const Sibling siblings[] = {
+    {"EP_TBL", "106:getTBLFilePath", "110:getTBLFilePath", "TBL",
+     [](const ISCSIEPFile& file, std::string& path) { return file.getTBLFilePath(path); }},
+    {"EP_FRI", "129:getFRIFilePath", "133:getFRIFilePath", "FRI",
+     [](const ISCSIEPFile& file, std::string& path) { return file.getFRIFilePath(path); }},
+    {"EP_DAT_00000", "153:getDATFilePath", "157:getDATFilePath", "DAT",
+     [](const ISCSIEPFile& file, std::string& path) { return file.getDATFilePath(0, 9, path); }}};
 
 }  // namespace
 
 TEST(Locations, SiblingsLieOnTheVolumeThatThePathNames) {
-    struct Case {
-        const char* path;
-        const char* volume;  ///< "" no volume id, "0" one that is not above 0
+    const std::map<std::string, std::string> volumes = {
+        // clang-format off
+        {"/volume1/@iSCSI/EP/EP_TBL", "/volume1"}, {"/volume01/x", "/volume1"}, {"/volume12abc", "/volume12"},
+        {"/volume \t+3", "/volume3"}, {"/volume2147483647", "/volume2147483647"},
+        {"/volume0/x", "invalid"}, {"/volume-2/x", "invalid"}, {"/volume-2147483648", "invalid"},
+        {"", "missing"}, {"/var/db/iscsi/EP_JNL", "missing"}, {"/volumeX", "missing"}, {"/volum", "missing"},
+        {"/volume", "missing"}, {"/volume- 1", "missing"}, {"volume1", "missing"}, {"//volume1", "missing"},
+        {"/volume2147483648", "missing"}, {"/volume-2147483649", "missing"}, {"/volume4294967297/%s", "missing"},
+        {"/volume99999999999999999999999999/x", "missing"}
+        // clang-format on
     };
-    for (const Case& c : {Case{"/volume1/@iSCSI/EP/EP_TBL", "/volume1"},
-                          Case{"/volume01/x", "/volume1"},
-                          Case{"/volume12abc", "/volume12"},
-                          Case{"/volume \t+3", "/volume3"},
-                          Case{"/volume2147483647", "/volume2147483647"},
-                          Case{"/volume0/x", "0"},
-                          Case{"/volume-2/x", "0"},
-                          Case{"/volume-2147483648", "0"},
-                          Case{"", ""},
-                          Case{"/var/db/iscsi/EP_JNL", ""},
-                          Case{"/volumeX", ""},
-                          Case{"/volum", ""},
-                          Case{"/volume", ""},
-                          Case{"/volume- 1", ""},
-                          Case{"volume1", ""},
-                          Case{"//volume1", ""},
-                          Case{"/volume2147483648", ""},
-                          Case{"/volume-2147483649", ""},
-                          Case{"/volume4294967297/%s", ""},
-                          Case{"/volume99999999999999999999999999/x", ""}}) {
+    for (const auto& [own, volume] : volumes) {
         for (const Sibling& sibling : siblings) {
             std::string path = "old";
-            const bool found = c.volume[0] == '/';
-            EXPECT_EQ(found ? 0 : 18990401, sibling.find(ISCSIEPFile(c.path), path)) << c.path;
-            EXPECT_EQ(found ? std::string(c.volume) + "/@iSCSI/EP/" + sibling.suffix : "old", path);
-            const std::string& line = c.volume[0] == '0' ? sibling.invalidLine : sibling.missingLine;
-            EXPECT_EQ(found ? std::vector<std::string>() : chain(c.path, {line}), takeLog());
+            const int code = sibling.find(ISCSIEPFile(own), path);
+            if (volume[0] == '/') {
+                EXPECT_EQ(0, code) << own;
+                EXPECT_EQ(volume + "/@iSCSI/EP/" + sibling.suffix, path);
+                continue;
+            }
+            EXPECT_EQ(18990401, code) << own;
+            EXPECT_EQ("old", path);
+            const std::string line = volume == "missing"
+                                         ? sibling.missing + " Failed to get " + sibling.kind + " file path."
+                                         : sibling.invalid + " Failed to get volume ID.";
+            EXPECT_EQ(chain(own, {"ISCSIEPFile.cpp:" + line}), takeLog());
         }
     }
+    EXPECT_TRUE(takeLog().empty());
 }
 
 TEST(Locations, DataFilesHoldFourTebibytesEach) {

@@ -49,26 +49,19 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
         std::string to;
         int expected;
     };
-    for (const Case& c : {Case{"", "", 0},
-                          Case{"4294967295", "4294967296", bad},
-                          Case{"4294967295", "-1", bad},
-                          Case{"18446744073709551615", "18446744073709551616", bad},
-                          Case{"-5", "-2147483649", bad},
-                          Case{"-5", "2147483648", bad},
-                          Case{"-5", "1.5", bad},
-                          Case{"\"U\"", "null", bad},
-                          Case{"\"name\"", "\"other\"", bad},
-                          Case{"7", "\"7\"", bad},
-                          Case{"[", "[3,", bad},
-                          Case{"\"N\"", "\"\\u0000\"", bad},
-                          Case{"\"N\"", "\"\xff\"", malformed},
-                          Case{"\"U\"", "\"" + std::string(73, 'u') + "\"", 0},
-                          Case{"\"U\"", "\"" + std::string(74, 'u') + "\"", bad},
-                          Case{"\"R\"", "\"" + std::string(4095, 'r') + "\"", bad},
-                          Case{"\"N\"", "\"" + std::string(266, 'n') + "\"", 0},
-                          Case{"\"N\"", "\"" + std::string(267, 'n') + "\"", bad},
-                          Case{"[", "{\"a\": [", malformed},
-                          Case{"[", std::string(100000, '['), malformed}}) {
+    const auto quoted = [](std::size_t length) { return '"' + std::string(length, 'x') + '"'; };
+    const Case cases[] = {
+        // clang-format off
+        {"", "", 0}, {"4294967295", "4294967296", bad}, {"4294967295", "-1", bad}, {"-5", "-2147483649", bad},
+        {"18446744073709551615", "18446744073709551616", bad}, {"-5", "2147483648", bad}, {"-5", "1.5", bad},
+        {"\"U\"", "null", bad}, {"\"name\"", "\"other\"", bad}, {"7", "\"7\"", bad}, {"[", "[3,", bad},
+        {"\"N\"", "\"\\u0000\"", bad}, {"\"N\"", "\"\xff\"", malformed},
+        {"\"U\"", quoted(73), 0}, {"\"U\"", quoted(74), bad}, {"\"R\"", quoted(4094), 0}, {"\"R\"", quoted(4095), bad},
+        {"\"N\"", quoted(266), 0}, {"\"N\"", quoted(267), bad},
+        {"[", "{\"a\": [", malformed}, {"[", std::string(100000, '['), malformed}
+        // clang-format on
+    };
+    for (const Case& c : cases) {
         folder.write("luns.json", list(c.from, c.to));
         EXPECT_EQ(c.expected, ask(7)) << c.from << " -> " << c.to.substr(0, 80);
     }

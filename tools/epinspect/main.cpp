@@ -40,7 +40,8 @@ int run(int argc, char** argv) {
     } catch (const CLI::CallForHelp&) {
         print(app.help());
     } catch (const CLI::ParseError& error) {
-        complain(error.what());
+        const bool unknown = app.get_subcommands().empty() && !app.remaining().empty();
+        complain(unknown ? "unknown subcommand or option: " + app.remaining().front() : error.what());
         return 2;
     }
     finishOutput();
