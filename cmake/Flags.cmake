@@ -3,6 +3,9 @@ add_library(iscsieptool_flags INTERFACE)
 target_compile_features(iscsieptool_flags INTERFACE cxx_std_17)
 target_compile_options(iscsieptool_flags INTERFACE
   -Wall -Wextra -Wpedantic -Wconversion -Wsign-conversion -Wshadow -Wold-style-cast -Wformat=2)
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+  target_compile_options(iscsieptool_flags INTERFACE -Wno-psabi)  # remarks on how old compilers passed parameters on ARM
+endif()
 # File positions are 64 bits wide on 32-bit machines too.
 target_compile_definitions(iscsieptool_flags INTERFACE _FILE_OFFSET_BITS=64)
 
