@@ -1,27 +1,56 @@
-// What the tests share: log lines as they reach syslog(), and a folder for files.
+// What the tests share: log lines as they reach syslog(), and a folder for files. Included once per test program.
 #pragma once
 
 #include <gtest/gtest.h>
+#include <syslog.h>
 
+#include <cstdarg>
+#include <filesystem>
 #include <fstream>
+#include <mutex>
 #include <string>
 #include <vector>
 
 #include "EPFileBuilder.h"
 
-/// The lines that have reached syslog() since the last call; one that was not at LOG_ERR says so.
-std::vector<std::string> takeLog();
+using Lines = std::vector<std::string>;
+
+inline Lines logLines;
+inline std::mutex logMutex;
+
+/// What the library writes to the system log; a line that was not at LOG_ERR says so.
+extern "C" __attribute__((visibility("default"))) void syslog(int priority, const char* format, ...) {
+    char text[8192];
+    va_list arguments;
+    va_start(arguments, format);
+    std::vsnprintf(text, sizeof text, format, arguments);
+    va_end(arguments);
+    const std::lock_guard lock(logMutex);
+    try {
+        logLines.push_back(priority == LOG_ERR ? text : "not LOG_ERR: " + std::string(text));
+    } catch (const std::bad_alloc&) {  // a test has made memory scarce: the line is lost
+    }
+}
+
+/// The lines logged since the last call.
+inline Lines takeLog() {
+    return std::exchange(logLines, {});
+}
 
 /// "iSCSI:SOURCE path: PATH" for each source, as a failure chain about one path leaves them.
-std::vector<std::string> chain(const std::string& path, const std::vector<std::string>& sources);
+inline Lines chain(const std::string& path, Lines sources) {
+    for (std::string& source : sources)
+        source = "iSCSI:" + source + " path: " + path;
+    return sources;
+}
 
 /// A folder of the test's own, gone at its end.
 class TempDir {
 public:
-    TempDir();
+    TempDir() { mkdtemp(path_.data()); }
     TempDir(const TempDir&) = delete;
     TempDir& operator=(const TempDir&) = delete;
-    ~TempDir();
+    ~TempDir() { std::filesystem::remove_all(path_); }
 
     std::string path(const std::string& name) const { return path_ + "/" + name; }
 
@@ -30,11 +59,7 @@ public:
         builder.write(path(name));
         return path(name);
     }
-    std::string write(const std::string& name, const std::string& text) const {
-        std::ofstream(path(name)) << text;
-        return path(name);
-    }
 
 private:
-    std::string path_;
+    std::string path_ = (std::filesystem::temp_directory_path() / "eptestXXXXXX").string();
 };

@@ -30,9 +30,10 @@ template <typename File, typename Find>
 void expectFailures(const Lookup& lookup, const EPFileBuilder& valid, Find find) {
     const TempDir folder;
     const auto expectFailure = [&](File& file, std::uint64_t index, int code, int line, const std::string& message,
-                                   std::vector<std::string> lines = {}) {
+                                   Lines lines = {}) {
         EXPECT_EQ(code, find(file, index)) << index;
-        lines.push_back(lookup.source + ":" + std::to_string(line) + ":" + lookup.operation + " " + message);
+        lines.push_back("ISCSIEPFile" + lookup.source + ":" + std::to_string(line) + ":" + lookup.operation + " " +
+                        message);
         EXPECT_EQ(chain(file.path, lines), takeLog()) << index;
     };
     File missing(folder.path("missing"));
@@ -65,25 +66,27 @@ void expectFailures(const Lookup& lookup, const EPFileBuilder& valid, Find find)
 }  // namespace
 
 TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
-    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntry", 172, 176, 180, 185, 189, 8},
-                                   EPFileBuilder::map(), [](ISCSIEPFileMAP& file, std::uint64_t index) {
-                                       ISCSIEPMapEntryInfo entry(1, 2, true, true, true, true);
-                                       const std::string before = entry.toString();
-                                       const int code = file.getMapEntry(index, entry);
-                                       return code == 0 || entry.toString() == before ? code : -1;
-                                   });
-    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8},
-                                   EPFileBuilder::map(), [](ISCSIEPFileMAP& file, std::uint64_t index) {
-                                       std::vector<ISCSIEPMapEntryInfo> entries(3);
-                                       const int code = file.getMapEntries(index, 1, entries);
-                                       return code == 0 || entries.size() == 3 ? code : -1;
-                                   });
-    expectFailures<ISCSIEPFileDAT>({"ISCSIEPFileDAT.cpp", "getExtentData", 69, 73, 77, 82, 87, 512},
-                                   EPFileBuilder::data(), [](ISCSIEPFileDAT& file, std::uint64_t index) {
-                                       std::string data = "old";
-                                       const int code = file.getExtentData(index, 512, data);
-                                       return code == 0 || data == "old" ? code : -1;
-                                   });
+    const auto getMapEntry = [](ISCSIEPFileMAP& file, std::uint64_t index) {
+        ISCSIEPMapEntryInfo entry(1, 2, true, true, true, true);
+        const std::string before = entry.toString();
+        const int code = file.getMapEntry(index, entry);
+        return code == 0 || entry.toString() == before ? code : -1;
+    };
+    const auto getMapEntries = [](ISCSIEPFileMAP& file, std::uint64_t index) {
+        std::vector<ISCSIEPMapEntryInfo> entries(3);
+        const int code = file.getMapEntries(index, 1, entries);
+        return code == 0 || entries.size() == 3 ? code : -1;
+    };
+    const auto getExtentData = [](ISCSIEPFileDAT& file, std::uint64_t index) {
+        std::string data = "old";
+        const int code = file.getExtentData(index, 512, data);
+        return code == 0 || data == "old" ? code : -1;
+    };
+    const EPFileBuilder map = EPFileBuilder::map();
+    expectFailures<ISCSIEPFileMAP>({"MAP.cpp", "getMapEntry", 172, 176, 180, 185, 189, 8}, map, getMapEntry);
+    expectFailures<ISCSIEPFileMAP>({"MAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8}, map, getMapEntries);
+    expectFailures<ISCSIEPFileDAT>({"DAT.cpp", "getExtentData", 69, 73, 77, 82, 87, 512}, EPFileBuilder::data(),
+                                   getExtentData);
 }
 
 TEST(MapEntry, BitsBecomeMembersAndALine) {

@@ -3,7 +3,6 @@
 #include <ISCSIEPFileMAP.h>
 #include <ISCSILUNConfInfo.h>
 
-#include <algorithm>
 #include <cstring>
 #include <map>
 
@@ -14,87 +13,61 @@ using namespace ISCSI::TOOL;
 namespace {
 
 /// What the platform library will answer, and what it was asked.
-struct Platform {
-    int result = 0;
-    std::string record = std::string(4480, '\0');
-    unsigned int askedLid = 0;
-    int askedReserved = -1;
-    bool recordWasZero = false;
-} platform;
+int result = 0;
+std::string record(4480, '\0');
+unsigned int askedLid = 0;
 
-template <typename Number>
-void put(std::size_t offset, Number value) {
-    std::memcpy(platform.record.data() + offset, &value, sizeof value);
-}
-
-void putText(std::size_t offset, const std::string& text) {
-    platform.record.replace(offset, text.size(), text);
-}
-
+/// Makes a record; texts are uuid abc, root path /volume1, name lun3.
 void answer(unsigned int extentSize, unsigned long long size, int restoreTime, int type) {
-    platform = Platform();
-    put(20, extentSize);
-    put(24, size);
-    put(32, restoreTime);
-    put(36, type);
-    putText(44, "abc");
-    putText(118, "/volume1");
-    putText(4213, "lun3");
+    record.assign(4480, '\0');
+    std::memcpy(&record[20], &extentSize, 4);
+    std::memcpy(&record[24], &size, 8);
+    std::memcpy(&record[32], &restoreTime, 4);
+    std::memcpy(&record[36], &type, 4);
+    record.replace(44, 3, "abc").replace(118, 8, "/volume1").replace(4213, 4, "lun3");
+    result = 0;
 }
 
 }  // namespace
 
-extern "C" __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsigned int lid, int reserved,
-                                                                           void* record) {
-    platform.askedLid = lid;
-    platform.askedReserved = reserved;
-    const auto* bytes = static_cast<const char*>(record);
-    platform.recordWasZero = std::all_of(bytes, bytes + 4480, [](char byte) { return byte == 0; });
-    std::memcpy(record, platform.record.data(), 4480);  // a failed call may leave anything in the record
-    return platform.result;
+extern "C" __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsigned int lid, int reserved, void* to) {
+    askedLid = lid;
+    EXPECT_EQ(0, reserved);
+    EXPECT_EQ(std::string(4480, '\0'), std::string(static_cast<const char*>(to), 4480));
+    std::memcpy(to, record.data(), 4480);  // a failed call may leave anything in the record
+    return result;
 }
 
 extern "C" __attribute__((visibility("default"))) const char* KELPiSCSIStrError(int code) {
     return code == -77 ? "no such thing" : "?";
 }
 
-TEST(LunConf, ARecordIsLoadedAndShown) {
+TEST(LunConf, ARecordIsLoadedWholeOrNotAtAll) {
     answer(1048576, 10737418240, 0, 263);
     ISCSILUNConfInfo lun(3);
     EXPECT_EQ(0, lun.loadFromConfig());
-    EXPECT_EQ(3U, platform.askedLid);
-    EXPECT_EQ(0, platform.askedReserved);
-    EXPECT_TRUE(platform.recordWasZero);
-    EXPECT_EQ(
+    EXPECT_EQ(3U, askedLid);
+    const std::string line =
         "lid: 3 ,extent_size: 1048576 (1MB) ,size: 10737418240 (10GB) ,restore time: Thu Jan 01 00:00:00 UTC 1970 "
-        ",type: BLUN ,uuid: abc ,rootpath: /volume1 ,name: lun3",
-        lun.toString());
+        ",type: BLUN ,uuid: abc ,rootpath: /volume1 ,name: lun3";
+    EXPECT_EQ(line, lun.toString());
+    answer(4, 5, 6, 15);
+    result = -77;
+    EXPECT_EQ(-77, lun.loadFromConfig());
+    EXPECT_EQ(line, lun.toString());
+    EXPECT_EQ(Lines{"iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig Failed to get LUN config by LUN ID. info: " + line +
+                    ". error: -77 (no such thing)"},
+              takeLog());
     EXPECT_EQ(
         "lid: 0 ,extent_size: 0 (0bytes) ,size: 0 (0bytes) ,restore time: Thu Jan 01 00:00:00 UTC 1970 "
         ",type: UNKNOWN ,uuid:  ,rootpath:  ,name: ",
         ISCSILUNConfInfo().toString());
 }
 
-TEST(LunConf, AFailedLoadLeavesTheRecordAndShowsIt) {
-    answer(1, 2, 3, 7);
-    ISCSILUNConfInfo lun(9);
-    EXPECT_EQ(0, lun.loadFromConfig());
-    const std::string before = lun.toString();
-    answer(4, 5, 6, 15);
-    platform.result = -77;
-    EXPECT_EQ(-77, lun.loadFromConfig());
-    EXPECT_EQ(before, lun.toString());
-    EXPECT_EQ(std::vector<std::string>{"iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig Failed to get LUN config by LUN "
-                                       "ID. info: lid: 9 ,extent_size: 1 (1bytes) ,size: 2 (2bytes) ,restore time: "
-                                       "Thu Jan 01 00:00:03 UTC 1970 ,type: THIN ,uuid: abc ,rootpath: /volume1 "
-                                       ",name: lun3. error: -77 (no such thing)"},
-              takeLog());
-}
-
 TEST(LunConf, TextsEndAtTheirNulOrWithTheRecord) {
     answer(1, 1, 0, 1);
-    putText(44, std::string(74, 'u'));     // runs on into the root path
-    putText(4213, std::string(267, 'n'));  // fills the record to its last byte
+    record.replace(44, 74, std::string(74, 'u'));      // runs on into the root path
+    record.replace(4213, 267, std::string(267, 'n'));  // fills the record to its last byte
     ISCSILUNConfInfo lun(1);
     EXPECT_EQ(0, lun.loadFromConfig());
     EXPECT_EQ(std::string(74, 'u') + "/volume1", lun.uuid);
@@ -102,97 +75,63 @@ TEST(LunConf, TextsEndAtTheirNulOrWithTheRecord) {
     EXPECT_EQ(std::string(267, 'n'), lun.name);
 }
 
-TEST(LunConf, TypesAreNamedByEqualityOnly) {
+TEST(LunConf, TypesAreNamedByEqualityOnlyAndByteCountsSplitIntoUnits) {
+    // clang-format off
     const std::map<int, std::string> names = {
-        // clang-format off
         {1, "BLOCK"}, {3, "FILE"}, {7, "THIN"}, {15, "ADV"}, {31, "SINK"}, {47, "VDISK_ADV"}, {71, "BKP_THIN"},
         {79, "BKP_ADV"}, {143, "CINDER"}, {259, "BLUN_THICK"}, {263, "BLUN"}, {275, "BLUN_THICK_SINK"},
         {279, "BLUN_SINK"}, {291, "VDISK_BLUN_THICK"}, {295, "VDISK_BLUN"}, {311, "VDISK_BLUN_SINK"},
         {323, "BKP_BLUN_THICK"}, {327, "BKP_BLUN"}, {387, "CINDER_BLUN_THICK"}, {391, "CINDER_BLUN"},
-        {807, "VDISK_BLUN_COW"}, {1831, "VDISK_BLUN_Q9"}
-        // clang-format on
-    };
-    const auto nameOf = [](int type) {
-        ISCSILUNConfInfo lun;
-        lun.type = type;
-        const std::string text = lun.toString();
-        const auto start = text.find(",type: ") + 7;
-        return text.substr(start, text.find(' ', start) - start);
-    };
-    for (int type = -2; type < 2000; ++type) {
-        const auto row = names.find(type);
-        EXPECT_EQ(row == names.end() ? "UNKNOWN" : row->second, nameOf(type)) << type;
-    }
-    EXPECT_EQ("UNKNOWN", nameOf(263 - 0x7fffffff - 1));
-}
-
-TEST(LunConf, ByteCountsAreSplitIntoUnits) {
-    const std::map<unsigned long long, std::string> texts = {
-        // clang-format off
+        {807, "VDISK_BLUN_COW"}, {1831, "VDISK_BLUN_Q9"}};
+    const std::map<unsigned long long, std::string> counts = {
         {0, "0bytes"}, {1023, "1023bytes"}, {1024, "1KB"}, {1536, "1KB,512bytes"}, {1048576, "1MB"},
         {1048577, "1MB,1bytes"}, {1610612736, "1GB,512MB"}, {4294967295, "3GB,1023MB,1023KB,1023bytes"},
         {1ULL << 40, "1TB"}, {1ULL << 50, "1PB"}, {1ULL << 60, "1EB"},
         {(1ULL << 60) - 1, "1023PB,1023TB,1023GB,1023MB,1023KB,1023bytes"},
-        {18446744073709551615ULL, "15EB,1023PB,1023TB,1023GB,1023MB,1023KB,1023bytes"}
-        // clang-format on
-    };
-    for (const auto& [count, text] : texts) {
-        ISCSILUNConfInfo lun;
+        {18446744073709551615ULL, "15EB,1023PB,1023TB,1023GB,1023MB,1023KB,1023bytes"}};
+    // clang-format on
+    ISCSILUNConfInfo lun;
+    for (lun.type = -2; lun.type < 2000; ++lun.type) {
+        const std::string name = names.count(lun.type) > 0 ? names.at(lun.type) : "UNKNOWN";
+        EXPECT_NE(std::string::npos, lun.toString().find(" ,type: " + name + " ,uuid")) << lun.type;
+    }
+    for (const auto& [count, text] : counts) {
         lun.size = count;
-        const std::string expected = ",size: " + std::to_string(count) + " (" + text + ") ,restore";
+        const std::string expected = " ,size: " + std::to_string(count) + " (" + text + ") ,restore";
         EXPECT_NE(std::string::npos, lun.toString().find(expected)) << expected;
     }
 }
 
-namespace {
-
-struct Sibling {
-    const char* suffix;
-    std::string missing, invalid;  ///< lines and operation of the two failures
-    std::string kind;
-    int (*find)(const ISCSIEPFile& file, std::string& path);
-};
-
-const Sibling siblings[] = {
-    {"EP_TBL", "106:getTBLFilePath", "110:getTBLFilePath", "TBL",
-     [](const ISCSIEPFile& file, std::string& path) { return file.getTBLFilePath(path); }},
-    {"EP_FRI", "129:getFRIFilePath", "133:getFRIFilePath", "FRI",
-     [](const ISCSIEPFile& file, std::string& path) { return file.getFRIFilePath(path); }},
-    {"EP_DAT_00000", "153:getDATFilePath", "157:getDATFilePath", "DAT",
-     [](const ISCSIEPFile& file, std::string& path) { return file.getDATFilePath(0, 9, path); }}};
-
-}  // namespace
-
 TEST(Locations, SiblingsLieOnTheVolumeThatThePathNames) {
+    // clang-format off
     const std::map<std::string, std::string> volumes = {
-        // clang-format off
         {"/volume1/@iSCSI/EP/EP_TBL", "/volume1"}, {"/volume01/x", "/volume1"}, {"/volume12abc", "/volume12"},
         {"/volume \t+3", "/volume3"}, {"/volume2147483647", "/volume2147483647"},
         {"/volume0/x", "invalid"}, {"/volume-2/x", "invalid"}, {"/volume-2147483648", "invalid"},
         {"", "missing"}, {"/var/db/iscsi/EP_JNL", "missing"}, {"/volumeX", "missing"}, {"/volum", "missing"},
         {"/volume", "missing"}, {"/volume- 1", "missing"}, {"volume1", "missing"}, {"//volume1", "missing"},
         {"/volume2147483648", "missing"}, {"/volume-2147483649", "missing"}, {"/volume4294967297/%s", "missing"},
-        {"/volume99999999999999999999999999/x", "missing"}
-        // clang-format on
-    };
+        {"/volume99999999999999999999999999/x", "missing"}};
+    // clang-format on
     for (const auto& [own, volume] : volumes) {
-        for (const Sibling& sibling : siblings) {
-            std::string path = "old";
-            const int code = sibling.find(ISCSIEPFile(own), path);
-            if (volume[0] == '/') {
-                EXPECT_EQ(0, code) << own;
-                EXPECT_EQ(volume + "/@iSCSI/EP/" + sibling.suffix, path);
-                continue;
-            }
-            EXPECT_EQ(18990401, code) << own;
-            EXPECT_EQ("old", path);
-            const std::string line = volume == "missing"
-                                         ? sibling.missing + " Failed to get " + sibling.kind + " file path."
-                                         : sibling.invalid + " Failed to get volume ID.";
-            EXPECT_EQ(chain(own, {"ISCSIEPFile.cpp:" + line}), takeLog());
-        }
+        const ISCSIEPFile file(own);
+        const auto expect = [&, &own = own, &volume = volume](int code, const std::string& path, const char* kind,
+                                                              const char* name, int missingLine) {
+            const bool found = volume[0] == '/';
+            EXPECT_EQ(found ? 0 : 18990401, code) << own;
+            EXPECT_EQ(found ? volume + "/@iSCSI/EP/" + name : "old", path);
+            const bool missing = volume == "missing";
+            const std::string message =
+                missing ? std::string("Failed to get ") + kind + " file path." : "Failed to get volume ID.";
+            const std::string line = "ISCSIEPFile.cpp:" + std::to_string(missingLine + (missing ? 0 : 4)) + ":get" +
+                                     kind + "FilePath " + message;
+            EXPECT_EQ(found ? Lines() : chain(own, {line}), takeLog());
+        };
+        std::string table = "old", freeIndex = "old", data = "old";
+        expect(file.getTBLFilePath(table), table, "TBL", "EP_TBL", 106);
+        expect(file.getFRIFilePath(freeIndex), freeIndex, "FRI", "EP_FRI", 129);
+        expect(file.getDATFilePath(0, 9, data), data, "DAT", "EP_DAT_00000", 153);
     }
-    EXPECT_TRUE(takeLog().empty());
 }
 
 TEST(Locations, DataFilesHoldFourTebibytesEach) {
@@ -215,16 +154,16 @@ TEST(Locations, TheMapFileFollowsTheConfigurationAndTheJournalNothing) {
     std::string path = "old";
     answer(1, 1, 0, 263);
     EXPECT_EQ(0, ISCSIEPFileMAP().getMAPFilePath(4294967295, path));
-    EXPECT_EQ(4294967295, platform.askedLid);
+    EXPECT_EQ(4294967295, askedLid);
     EXPECT_EQ("/volume1/@iSCSI/LUN/BLUNabclun3_00000", path);
     answer(1, 1, 0, 5);
-    putText(118, std::string(8, '\0'));
+    record[118] = '\0';
     EXPECT_EQ(0, ISCSIEPFileMAP().getMAPFilePath(1, path));
     EXPECT_EQ("/@iSCSI/LUN/UNKNOWNabclun3_00000", path);
-    platform.result = 4;
+    result = 4;
     EXPECT_EQ(4, ISCSIEPFileJNL("/own%s").getMAPFilePath(8, path));
     EXPECT_EQ("/@iSCSI/LUN/UNKNOWNabclun3_00000", path);
-    const std::vector<std::string> log = takeLog();
+    const Lines log = takeLog();
     ASSERT_EQ(2U, log.size());
     EXPECT_EQ(0U, log[0].find("iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig Failed to get LUN config by LUN ID. "));
     EXPECT_EQ("iSCSI:ISCSIEPFile.cpp:180:getMAPFilePath Failed to get LUN conf info. path: /own%s", log[1]);

@@ -1,40 +1,25 @@
-#include <ctime>
-
 #include "Support.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
 using namespace ISCSI::TOOL;
 
-TEST(StringTools, BytesBecomeLowerCaseHexadecimal) {
-    const unsigned char bytes[] = {0x0a, 0xde, 0xad, 0xbe, 0xef, 0x00, 0x9f};
+TEST(StringTools, BytesBecomeHexadecimalAndUUIDText) {
+    const unsigned char bytes[] = {0x0a, 0xde, 0xad, 0xbe, 0xef, 0, 1, 2, 3, 4, 5, 6, 7, 0x80, 0xff, 0x9f};
     std::string text = "old";
     EXPECT_EQ(0, GetHexInString(bytes, 7, text));
-    EXPECT_EQ("0adeadbeef009f", text);
+    EXPECT_EQ("0adeadbeef0001", text);
     EXPECT_EQ(0, GetHexInString(bytes, 0, text));
     EXPECT_EQ("", text);
-    EXPECT_EQ(0, GetHexInString(std::vector<unsigned char>(5000, 0xc5).data(), 5000, text));  // more than one block
-    std::string expected;
-    for (int i = 0; i < 5000; ++i)
-        expected += "c5";
-    EXPECT_EQ(expected, text);
-}
-
-TEST(StringTools, SixteenBytesBecomeAUUIDInStoredOrder) {
-    const unsigned char counting[] = {0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15};
-    std::string text;
-    EXPECT_EQ(0, GetUUIDInString(counting, text));
-    EXPECT_EQ("00010203-0405-0607-0809-0a0b0c0d0e0f", text);
-    EXPECT_EQ(0, GetUUIDInString(std::vector<unsigned char>(16, 0xff).data(), text));
-    EXPECT_EQ("ffffffff-ffff-ffff-ffff-ffffffffffff", text);
+    EXPECT_EQ(0, GetUUIDInString(bytes, text));
+    EXPECT_EQ("0adeadbe-ef00-0102-0304-05060780ff9f", text);
 }
 
 TEST(StringTools, MissingInputIsRefusedAndLeavesTheText) {
     std::string text = "old";
     EXPECT_EQ(18990003, GetUUIDInString(nullptr, text));
-    EXPECT_EQ(std::vector<std::string>(), takeLog());
+    EXPECT_EQ(Lines(), takeLog());
     EXPECT_EQ(18990003, GetHexInString(nullptr, 0, text));
-    EXPECT_EQ(std::vector<std::string>{"iSCSI:ISCSIQuorinStringTool.h:190:GetHexInString Input pointer is NULL."},
-              takeLog());
+    EXPECT_EQ(Lines{"iSCSI:ISCSIQuorinStringTool.h:190:GetHexInString Input pointer is NULL."}, takeLog());
     EXPECT_EQ("old", text);
 }
 
@@ -47,12 +32,10 @@ TEST(StringTools, TimesFollowTheZoneAndAreSigned) {
     for (const Case& c :
          {Case{"UTC", 0, "Thu Jan 01 00:00:00 UTC 1970"}, Case{"UTC", 0x7fffffff, "Tue Jan 19 03:14:07 UTC 2038"},
           Case{"UTC", 0x80000000, "Fri Dec 13 20:45:52 UTC 1901"},
-          Case{"UTC", 0xffffffff, "Wed Dec 31 23:59:59 UTC 1969"},
           Case{"ABC-2", 1600000000, "Sun Sep 13 14:26:40 ABC 2020"},
           Case{"ABCDEF0", 0, "Thu Jan 01 00:00:00 ABCDEF 1970"},  // just fits
           Case{"ABCDEFG0", 0, ""}}) {
         setenv("TZ", c.zone, 1);
         EXPECT_EQ(c.text, GetTimeInString(c.seconds)) << c.zone << ' ' << c.seconds;
     }
-    setenv("TZ", "UTC", 1);
 }
