@@ -19,22 +19,17 @@ void parseAndDump(const std::string& path, bool readable) {
     require(file.toString().find("\n================ HEAD[1] ================\n") != std::string::npos);
 }
 
-void lookUpEntries(const std::string& path, std::uint64_t index, std::uint64_t count) {
-    ISCSIEPFileMAP file(path);
+void lookUp(const std::string& path, std::uint64_t index, std::uint64_t count, std::uint32_t extentSize) {
+    ISCSIEPFileMAP map(path);
     ISCSIEPMapEntryInfo entry;
     std::vector<ISCSIEPMapEntryInfo> entries(1);
-    const int single = file.getMapEntry(index, entry);
-    const int run = file.getMapEntries(index, count, entries);
-    require(run == (count == 0 ? 0 : single));
-    require(run == 0 ? entries.size() <= count : entries.size() == 1);
-    if (single == 0 && count > 0) require(entries.at(0).toString() == entry.toString());
-}
-
-void lookUpExtent(const std::string& path, std::uint64_t index, std::uint32_t size) {
-    ISCSIEPFileDAT file(path);
+    const int single = map.getMapEntry(index, entry);
+    const int run = map.getMapEntries(index, count, entries);
+    require(run == (count == 0 ? 0 : single) && (run == 0 ? entries.size() <= count : entries.size() == 1));
+    require(single != 0 || count == 0 || entries.at(0).toString() == entry.toString());
     std::string data = "old";
-    const int error = file.getExtentData(index, size, data);
-    require(error == 0 ? data.size() == 2 * std::uint64_t{size} : data == "old");
+    const int error = ISCSIEPFileDAT(path).getExtentData(index, extentSize, data);
+    require(error == 0 ? data.size() == 2 * std::uint64_t{extentSize} : data == "old");
 }
 
 }  // namespace
@@ -53,9 +48,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
     parseAndDump<ISCSIEPFileDAT>(path, readable);
     parseAndDump<ISCSIEPFileMAP>(path, readable);
     parseAndDump<ISCSIEPFileJNL>(path, readable);
-    lookUpEntries(path, index, count);
-    lookUpEntries(path, smallIndex, count);
-    lookUpExtent(path, index, extentSize);
-    lookUpExtent(path, smallIndex, static_cast<std::uint32_t>(count & 0xffffffU));
+    lookUp(path, index, count, extentSize);
+    lookUp(path, smallIndex, count, static_cast<std::uint32_t>(count & 0xffffffU));
     return 0;
 }

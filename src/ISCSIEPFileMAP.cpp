@@ -66,8 +66,7 @@ bool readEntries(EPFileStream& stream, std::uint64_t count, std::vector<ISCSIEPM
         if (got < 0) return false;
         const auto arrived = static_cast<std::size_t>(got) / EP_MAP_ENTRY_SIZE;
         if (run.empty()) run.reserve(arrived);
-        for (std::size_t i = 0; i < arrived; ++i)
-            run.push_back(decodeEntry(block.get() + i * EP_MAP_ENTRY_SIZE));
+        for (std::size_t i = 0; i < arrived; ++i) run.push_back(decodeEntry(block.get() + i * EP_MAP_ENTRY_SIZE));
         if (arrived < wanted) break;
     }
     return true;
@@ -201,8 +200,7 @@ std::string ISCSIEPFileMAP::toString() const {
         .text("current track UUID", currentTrackUUID)
         .section("SEG[0]");
     unsigned long long number = 0;
-    for (const std::string& poolUUID : poolUUIDs)
-        text.item("pool", ++number, poolUUID);
+    for (const std::string& poolUUID : poolUUIDs) text.item("pool", ++number, poolUUID);
     return text.str();
 }
 

@@ -39,8 +39,7 @@ inline Lines takeLog() {
 
 /// "iSCSI:SOURCE path: PATH" for each source, as a failure chain about one path leaves them.
 inline Lines chain(const std::string& path, Lines sources) {
-    for (std::string& source : sources)
-        source = "iSCSI:" + source + " path: " + path;
+    for (std::string& source : sources) source = "iSCSI:" + source + " path: " + path;
     return sources;
 }
 

@@ -16,9 +16,9 @@ symbols=$(nm -DC --defined-only "$build/lib/libiscsieptool.so.1" | cut -d' ' -f3
 cmake --install "$build" --prefix "$scratch/first" >/dev/null
 mv "$scratch/first" "$scratch/moved"
 export PKG_CONFIG_PATH=$scratch/moved/lib/pkgconfig LD_LIBRARY_PATH=$scratch/moved/lib
-cp -r "$source/tests/consumer" "$scratch/pkgconfig"
+cp -r "$source/examples/consumer" "$scratch/pkgconfig"
 make -s -C "$scratch/pkgconfig"
-cmake -S "$source/tests/consumer" -B "$scratch/cmake" -DCMAKE_PREFIX_PATH="$scratch/moved" >/dev/null
+cmake -S "$source/examples/consumer" -B "$scratch/cmake" -DCMAKE_PREFIX_PATH="$scratch/moved" >/dev/null
 cmake --build "$scratch/cmake" >/dev/null
 unset LD_LIBRARY_PATH
 "$scratch/moved/bin/epsample" "$scratch/store"

@@ -163,12 +163,10 @@ TEST(EPFile, DumpsMayBeMadeOnSeveralThreads) {
     for (std::string& dump : dumps) {
         threads.emplace_back([&path, &dump] {
             ISCSIEPFileMAP file(path);
-            for (int i = 0; i < 50 && file.parseHead0() == 0; ++i)
-                dump = file.toString();
+            for (int i = 0; i < 50 && file.parseHead0() == 0; ++i) dump = file.toString();
         });
     }
-    for (std::thread& thread : threads)
-        thread.join();
+    for (std::thread& thread : threads) thread.join();
     EXPECT_NE("", dumps[0]);
     EXPECT_EQ(Lines(4, dumps[0]), dumps);
 }

@@ -103,8 +103,7 @@ TEST(MapEntry, BitsBecomeMembersAndALine) {
     const TempDir folder;
     EPFileBuilder builder = EPFileBuilder::map();
     std::uint64_t index = 0;
-    for (const auto& [stored, line] : lines)
-        builder.entry(index++, stored);
+    for (const auto& [stored, line] : lines) builder.entry(index++, stored);
     ISCSIEPFileMAP file(folder.write("map", builder));
     std::vector<ISCSIEPMapEntryInfo> entries;
     EXPECT_EQ(0, file.getMapEntries(0, maximum, entries));
@@ -123,8 +122,7 @@ TEST(MapEntry, RunsOfEntriesEndWithTheFile) {
     const TempDir folder;
     EPFileBuilder builder = EPFileBuilder::map();
     std::string content;
-    for (std::uint64_t i = 0; i < total; ++i)
-        content += epsample::littleEndian(i, 8);
+    for (std::uint64_t i = 0; i < total; ++i) content += epsample::littleEndian(i, 8);
     ISCSIEPFileMAP file(folder.write("map", builder.bytes(blockSize, content + "rest")));
     struct Case {
         std::uint64_t first, count, expected;

@@ -5,6 +5,7 @@
 
 #include <cstring>
 #include <map>
+#include <tuple>
 
 #include "Support.h"
 
@@ -104,29 +105,26 @@ TEST(LunConf, TypesAreNamedByEqualityOnlyAndByteCountsSplitIntoUnits) {
 
 TEST(Locations, SiblingsLieOnTheVolumeThatThePathNames) {
     // clang-format off
-    const std::map<std::string, std::string> volumes = {
-        {"/volume1/@iSCSI/EP/EP_TBL", "/volume1"}, {"/volume01/x", "/volume1"}, {"/volume12abc", "/volume12"},
-        {"/volume \t+3", "/volume3"}, {"/volume2147483647", "/volume2147483647"},
-        {"/volume0/x", "invalid"}, {"/volume-2/x", "invalid"}, {"/volume-2147483648", "invalid"},
-        {"", "missing"}, {"/var/db/iscsi/EP_JNL", "missing"}, {"/volumeX", "missing"}, {"/volum", "missing"},
-        {"/volume", "missing"}, {"/volume- 1", "missing"}, {"volume1", "missing"}, {"//volume1", "missing"},
-        {"/volume2147483648", "missing"}, {"/volume-2147483649", "missing"}, {"/volume4294967297/%s", "missing"},
-        {"/volume99999999999999999999999999/x", "missing"}};
+    const std::map<std::string, int> volumes = {  // 0: not above 0, -1: missing
+        {"/volume1/@iSCSI/EP/EP_TBL", 1}, {"/volume01/x", 1}, {"/volume12abc", 12}, {"/volume \t+3", 3},
+        {"/volume2147483647", 2147483647}, {"/volume0/x", 0}, {"/volume-2/x", 0}, {"/volume-2147483648", 0}, {"", -1},
+        {"/var/db/iscsi/EP_JNL", -1}, {"/volumeX", -1}, {"/volum", -1}, {"/volume", -1}, {"/volume- 1", -1},
+        {"volume1", -1}, {"//volume1", -1}, {"/volume2147483648", -1}, {"/volume-2147483649", -1},
+        {"/volume4294967297/%s", -1}, {"/volume99999999999999999999999999/x", -1}};
     // clang-format on
-    for (const auto& [own, volume] : volumes) {
+    std::string own;
+    int volume = 0;
+    const auto expect = [&](int code, const std::string& path, const std::string& kind, const char* name, int line) {
+        const bool found = volume > 0;
+        EXPECT_EQ(found ? 0 : 18990401, code) << own;
+        EXPECT_EQ(found ? "/volume" + std::to_string(volume) + "/@iSCSI/EP/" + name : "old", path);
+        const std::string message = volume == 0 ? "volume ID." : kind + " file path.";
+        const std::string source = "ISCSIEPFile.cpp:" + std::to_string(volume == 0 ? line + 4 : line) + ":get" + kind;
+        EXPECT_EQ(found ? Lines() : chain(own, {source + "FilePath Failed to get " + message}), takeLog());
+    };
+    for (const auto& row : volumes) {
+        std::tie(own, volume) = row;
         const ISCSIEPFile file(own);
-        const auto expect = [&, &own = own, &volume = volume](int code, const std::string& path, const char* kind,
-                                                              const char* name, int missingLine) {
-            const bool found = volume[0] == '/';
-            EXPECT_EQ(found ? 0 : 18990401, code) << own;
-            EXPECT_EQ(found ? volume + "/@iSCSI/EP/" + name : "old", path);
-            const bool missing = volume == "missing";
-            const std::string message =
-                missing ? std::string("Failed to get ") + kind + " file path." : "Failed to get volume ID.";
-            const std::string line = "ISCSIEPFile.cpp:" + std::to_string(missingLine + (missing ? 0 : 4)) + ":get" +
-                                     kind + "FilePath " + message;
-            EXPECT_EQ(found ? Lines() : chain(own, {line}), takeLog());
-        };
         std::string table = "old", freeIndex = "old", data = "old";
         expect(file.getTBLFilePath(table), table, "TBL", "EP_TBL", 106);
         expect(file.getFRIFilePath(freeIndex), freeIndex, "FRI", "EP_FRI", 129);
@@ -135,18 +133,15 @@ TEST(Locations, SiblingsLieOnTheVolumeThatThePathNames) {
 }
 
 TEST(Locations, DataFilesHoldFourTebibytesEach) {
-    struct Case {
-        unsigned int extentSize;
-        unsigned long long extentAddress;
-        const char* number;
-    };
-    for (const Case& c : {Case{1048576, 0, "00000"}, Case{1048576, 4194303, "00000"}, Case{1048576, 4194304, "00001"},
-                          Case{1, 4398046511104ULL * 99999, "99999"}, Case{1, 4398046511104ULL * 100000, "100000"},
-                          Case{1, 18446744073709551615ULL, "4194303"}, Case{0, 18446744073709551615ULL, "00000"},
-                          Case{0xffffffff, 0xffffffff, "4194303"}, Case{2, 1ULL << 63, "00000"}}) {
+    using Case = std::tuple<unsigned int, unsigned long long, std::string>;
+    for (const auto& [extentSize, extentAddress, number] :
+         {Case{1048576, 0, "00000"}, Case{1048576, 4194303, "00000"}, Case{1048576, 4194304, "00001"},
+          Case{1, 4398046511104ULL * 99999, "99999"}, Case{1, 4398046511104ULL * 100000, "100000"},
+          Case{1, 18446744073709551615ULL, "4194303"}, Case{0, 18446744073709551615ULL, "00000"},
+          Case{0xffffffff, 0xffffffff, "4194303"}, Case{2, 1ULL << 63, "00000"}}) {
         std::string path;
-        EXPECT_EQ(0, ISCSIEPFile("/volume2/x").getDATFilePath(c.extentSize, c.extentAddress, path));
-        EXPECT_EQ(std::string("/volume2/@iSCSI/EP/EP_DAT_") + c.number, path);
+        EXPECT_EQ(0, ISCSIEPFile("/volume2/x").getDATFilePath(extentSize, extentAddress, path));
+        EXPECT_EQ("/volume2/@iSCSI/EP/EP_DAT_" + number, path);
     }
 }
 

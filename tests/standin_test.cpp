@@ -30,8 +30,7 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
     EXPECT_EQ(0, askWith("7", "7"));
     const int unknown = ask(8);
     std::set<std::string> texts;
-    for (const int code : {0, 1, missing, malformed, bad, unknown})
-        texts.insert(KELPiSCSIStrError(code));
+    for (const int code : {0, 1, missing, malformed, bad, unknown}) texts.insert(KELPiSCSIStrError(code));
     EXPECT_EQ(6U, texts.size());
 
     struct Case {

@@ -88,8 +88,7 @@ void addDump(CLI::App& app, Session& session) {
         ->check(CLI::IsMember({"tbl", "map", "dat", "fri", "jnl", "head"}));
     command->add_flag("--json", options->json, "One JSON object a file");
     command->callback([options, &session] {
-        for (const std::string& name : options->files)
-            dumpFile(*options, session, name);
+        for (const std::string& name : options->files) dumpFile(*options, session, name);
     });
 }
 

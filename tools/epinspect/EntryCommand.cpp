@@ -53,14 +53,12 @@ void printRange(const EntryOptions& options, Session& session, tool::ISCSIEPFile
 
 void run(const EntryOptions& options, Session& session) {
     std::vector<IndexRange> ranges;
-    for (const std::string& text : options.indexes)
-        ranges.push_back(parseIndexRange(text));
+    for (const std::string& text : options.indexes) ranges.push_back(parseIndexRange(text));
     const std::optional<std::string> path = session.openablePath(options.file);
     if (!path) return;
     tool::ISCSIEPFileMAP file(*path);
     if (!session.succeeded(file.parseHead0(), options.file)) return;
-    for (const IndexRange range : ranges)
-        printRange(options, session, file, range);
+    for (const IndexRange range : ranges) printRange(options, session, file, range);
 }
 
 }  // namespace

@@ -43,10 +43,8 @@ void addLun(CLI::App& app, Session& session) {
     command->add_flag("--json", options->json, "One JSON object a LUN");
     command->callback([options, &session] {
         std::vector<std::uint32_t> lids;
-        for (const std::string& text : options->lids)
-            lids.push_back(parseNumber32(text));
-        for (const std::uint32_t lid : lids)
-            printLun(*options, session, lid);
+        for (const std::string& text : options->lids) lids.push_back(parseNumber32(text));
+        for (const std::uint32_t lid : lids) printLun(*options, session, lid);
     });
 }
 

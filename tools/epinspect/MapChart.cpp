@@ -28,8 +28,7 @@ unsigned int shadeOf(std::uint64_t mapped, std::uint64_t entries) {
 
 void MapChart::add(bool mapped) {
     if (entries_ == cellSize_ * maxCells) {
-        for (std::size_t i = 0; i < maxCells / 2; ++i)
-            mapped_[i] = mapped_[2 * i] + mapped_[2 * i + 1];
+        for (std::size_t i = 0; i < maxCells / 2; ++i) mapped_[i] = mapped_[2 * i] + mapped_[2 * i + 1];
         mapped_.resize(maxCells / 2);
         cellSize_ *= 2;
     }
@@ -41,10 +40,8 @@ std::string MapChart::draw(unsigned int width, bool unicode) const {
     const Shades& shades = unicode ? blocks : letters;
     const auto labelWidth = std::to_string(first_ + entries_).size();
     std::size_t rowCells = 64;
-    while (rowCells > 8 && labelWidth + 3 + rowCells > width)
-        rowCells /= 2;
-    while (labelWidth + 3 + 2 * rowCells <= width && rowCells < maxCells / 8)
-        rowCells *= 2;
+    while (rowCells > 8 && labelWidth + 3 + rowCells > width) rowCells /= 2;
+    while (labelWidth + 3 + 2 * rowCells <= width && rowCells < maxCells / 8) rowCells *= 2;
 
     std::string text;
     for (std::size_t cell = 0; cell < mapped_.size(); ++cell) {

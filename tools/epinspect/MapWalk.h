@@ -26,8 +26,7 @@ int walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, std::uint64_t first, std::uint64_
         const std::uint64_t wanted = std::min(count - walked, blockSize) + seen;
         const int error = file.getMapEntries(first + walked - seen, wanted, entries);
         if (error != 0) return error;
-        for (auto i = static_cast<std::size_t>(seen); i < entries.size(); ++i)
-            visit(first + walked++, entries[i]);
+        for (auto i = static_cast<std::size_t>(seen); i < entries.size(); ++i) visit(first + walked++, entries[i]);
         if (entries.size() < wanted) break;
         progress.show(walked);
     }

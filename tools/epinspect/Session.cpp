@@ -10,8 +10,7 @@
 namespace epinspect {
 
 void Session::setRoot(std::string folder) {
-    while (!folder.empty() && folder.back() == '/')
-        folder.pop_back();
+    while (!folder.empty() && folder.back() == '/') folder.pop_back();
     root_ = std::move(folder);
     // The stand-in for the platform's library reads its list from there; another choice in the environment wins.
     setenv("KELPISCSIEP_LUNS", (root_ + "/var/db/iscsi/luns.json").c_str(), 0);

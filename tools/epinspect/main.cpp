@@ -31,8 +31,7 @@ int run(int argc, char** argv) {
     CLI::App app("Shows what the EP files of an iSCSI LUN store hold.", "epinspect");
     Session session;
     addCommonOptions(app, session);
-    for (const auto add : {addDump, addEntry, addMap, addExtent, addLun, addPath})
-        add(app, session);
+    for (const auto add : {addDump, addEntry, addMap, addExtent, addLun, addPath}) add(app, session);
     try {
         app.parse(argc, argv);
     } catch (const CLI::CallForVersion& version) {

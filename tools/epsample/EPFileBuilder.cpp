@@ -12,8 +12,7 @@ namespace epsample {
 
 std::string littleEndian(std::uint64_t value, unsigned int width) {
     std::string bytes;
-    for (unsigned int i = 0; i < width; ++i)
-        bytes.push_back(static_cast<char>((value >> (8 * i)) & 0xFFU));
+    for (unsigned int i = 0; i < width; ++i) bytes.push_back(static_cast<char>((value >> (8 * i)) & 0xFFU));
     return bytes;
 }
 
@@ -74,8 +73,7 @@ EPFileBuilder& EPFileBuilder::set(Field field, std::uint64_t value) {
 
 EPFileBuilder& EPFileBuilder::set(UUIDField field, unsigned char firstByte) {
     std::string uuid;
-    for (unsigned int i = 0; i < 16; ++i)
-        uuid.push_back(static_cast<char>(firstByte + i));
+    for (unsigned int i = 0; i < 16; ++i) uuid.push_back(static_cast<char>(firstByte + i));
     return bytes(field.offset, uuid);
 }
 

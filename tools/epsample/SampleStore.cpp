@@ -54,8 +54,7 @@ void writeDataFile(const std::string& path, unsigned int serialNumber) {
         std::string text = "file " + std::to_string(serialNumber) + " extent " + std::to_string(extent) + "\n";
         text.resize(32, '.');
         std::string content;
-        while (content.size() < 4096)
-            content += text;
+        while (content.size() < 4096) content += text;
         file.bytes(headerBlockSize + extent * extentSize, content);
     }
     file.resize(headerBlockSize + std::uint64_t{6144} * extentSize).write(path);
