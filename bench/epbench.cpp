@@ -1,0 +1,242 @@
+// What the library costs, each figure beside the floor it is held against. Run with --benchmark_filter to choose.
+#include <ISCSIEPFileDAT.h>
+#include <ISCSIEPFileFRI.h>
+#include <ISCSIEPFileJNL.h>
+#include <ISCSIEPFileMAP.h>
+#include <ISCSIEPFileTBL.h>
+#include <benchmark/benchmark.h>
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "EPFileBuilder.h"
+
+using namespace ISCSI::TOOL;
+using epsample::EPFileBuilder;
+
+namespace {
+
+constexpr off_t dataStart = 24576;
+constexpr std::uint64_t mapEntries = 1000000;
+constexpr std::size_t extentSize = 1048576;
+
+/// A folder that lives as long as the program.
+const std::string& folder() {
+    static const struct Folder {
+        Folder() { mkdtemp(path.data()); }
+        ~Folder() { std::filesystem::remove_all(path); }
+        std::string path = (std::filesystem::temp_directory_path() / "epbenchXXXXXX").string();
+    } made;
+    return made.path;
+}
+
+std::string write(const std::string& name, const EPFileBuilder& builder) {
+    builder.write(folder() + "/" + name);
+    return folder() + "/" + name;
+}
+
+template <typename File>
+void parseAndDump(benchmark::State& state, const EPFileBuilder& builder) {
+    const std::string path = write("file", builder);
+    for (auto _ : state) {
+        File file(path);
+        if (file.parseFile() != 0) state.SkipWithError("parse failed");
+        benchmark::DoNotOptimize(file.toString());
+    }
+}
+void headerFloor(benchmark::State& state) {
+    const std::string path = write("file", EPFileBuilder::table());
+    unsigned char block[dataStart];
+    for (auto _ : state) {
+        const int file = open(path.c_str(), O_RDONLY);
+        if (read(file, block, sizeof block) != dataStart) state.SkipWithError("read failed");
+        close(file);
+        benchmark::DoNotOptimize(block);
+    }
+}
+
+const std::string& mapFile() {
+    static const std::string path = [] {
+        std::string entries;
+        for (std::uint64_t i = 0; i < mapEntries; ++i) entries += epsample::littleEndian(i | 1ULL << 63U, 8);
+        return write("map", EPFileBuilder::map().bytes(dataStart, entries));
+    }();
+    return path;
+}
+
+void singleLookup(benchmark::State& state) {
+    ISCSIEPFileMAP file(mapFile());
+    ISCSIEPMapEntryInfo entry;
+    std::uint64_t index = 0;
+    for (auto _ : state) {
+        if (file.getMapEntry(index, entry) != 0) state.SkipWithError("lookup failed");
+        index = (index + 7919) % mapEntries;
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+
+void singleLookupFloor(benchmark::State& state) {
+    unsigned char entry[8];
+    std::uint64_t index = 0;
+    for (auto _ : state) {
+        const int file = open(mapFile().c_str(), O_RDONLY);
+        lseek(file, dataStart + static_cast<off_t>(8 * index), SEEK_SET);
+        if (read(file, entry, sizeof entry) != sizeof entry) state.SkipWithError("read failed");
+        close(file);
+        benchmark::DoNotOptimize(entry);
+        index = (index + 7919) % mapEntries;
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+
+void wholeMapWalk(benchmark::State& state) {
+    ISCSIEPFileMAP file(mapFile());
+    std::vector<ISCSIEPMapEntryInfo> entries;
+    for (auto _ : state) {
+        std::uint64_t mapped = 0;
+        for (std::uint64_t first = 0; first < mapEntries; first += entries.size()) {
+            if (file.getMapEntries(first, 8192, entries) != 0) state.SkipWithError("walk failed");
+            for (const ISCSIEPMapEntryInfo& entry : entries) mapped += entry.mapped ? 1U : 0U;
+        }
+        benchmark::DoNotOptimize(mapped);
+    }
+    state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(mapEntries));
+}
+
+const std::string& dataFile() {
+    static const std::string path = [] {
+        std::string content;
+        for (std::size_t i = 0; i < 8 * extentSize; ++i) content.push_back(static_cast<char>(i * 2654435761U >> 13U));
+        return write("data", EPFileBuilder::data().bytes(dataStart, content));
+    }();
+    return path;
+}
+
+void extent(benchmark::State& state) {
+    ISCSIEPFileDAT file(dataFile());
+    std::uint64_t index = 0;
+    for (auto _ : state) {
+        std::string data;
+        if (file.getExtentData(index++ % 8, extentSize, data) != 0) state.SkipWithError("lookup failed");
+        benchmark::DoNotOptimize(data);
+    }
+    state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(extentSize));
+}
+
+/// Open, pread into a fresh buffer, two copies of it into a fresh buffer of twice the size, close.
+void extentFloor(benchmark::State& state) {
+    off_t index = 0;
+    for (auto _ : state) {
+        const int file = open(dataFile().c_str(), O_RDONLY);
+        const std::unique_ptr<char[]> bytes(new char[extentSize]);
+        const off_t position = dataStart + index++ % 8 * static_cast<off_t>(extentSize);
+        if (pread(file, bytes.get(), extentSize, position) < 0) state.SkipWithError("read failed");
+        const std::unique_ptr<char[]> text(new char[2 * extentSize]);
+        std::memcpy(text.get(), bytes.get(), extentSize);
+        std::memcpy(text.get() + extentSize, bytes.get(), extentSize);
+        close(file);
+        benchmark::DoNotOptimize(text.get());
+        benchmark::ClobberMemory();
+    }
+    state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(extentSize));
+}
+
+/// A program of the system on the same bytes, its start and its pipe included.
+void extentProgram(benchmark::State& state, const std::string& program) {
+    const std::string path = folder() + "/extent";
+    std::filesystem::copy_file(dataFile(), path, std::filesystem::copy_options::overwrite_existing);
+    const std::string command = program + " < " + path + " > /dev/null";
+    for (auto _ : state) {
+        if (std::system(command.c_str()) != 0) state.SkipWithError("program failed");
+    }
+    state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(std::filesystem::file_size(path)));
+}
+/// Keeps the best time that each benchmark took for one entry, byte or call.
+class RatioReporter : public benchmark::ConsoleReporter {
+public:
+    void ReportRuns(const std::vector<Run>& runs) override {
+        for (const Run& run : runs) {
+            if (run.run_type == Run::RT_Aggregate) continue;
+            const auto items = run.counters.find("items_per_second");
+            const auto bytes = run.counters.find("bytes_per_second");
+            const double each = items != run.counters.end() ? 1 / items->second.value
+                                : bytes != run.counters.end()
+                                    ? 1 / bytes->second.value
+                                    : run.real_accumulated_time / static_cast<double>(run.iterations);
+            double& best = times_.emplace(run.run_name.function_name, each).first->second;
+            best = std::min(best, each);
+        }
+    }
+
+    void printTimes() const {
+        for (const auto& [name, time] : times_) {
+            std::printf("%-70s %10.3f ns\n", (name + ", one call, entry or byte").c_str(), time * 1e9);
+        }
+    }
+
+    void printRatio(const std::string& what, const std::string& of, const std::string& to) const {
+        if (times_.count(of) == 0 || times_.count(to) == 0) return;
+        std::printf("%-70s %8.2f\n", what.c_str(), times_.at(of) / times_.at(to));
+    }
+
+private:
+    std::map<std::string, double> times_;
+};
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    // In turn and several times, so that a machine whose speed drifts does not favour one side; options may differ.
+    std::string defaults[] = {"--benchmark_repetitions=7", "--benchmark_enable_random_interleaving=true",
+                              "--benchmark_min_time=0.05"};
+    std::vector<char*> arguments = {argv[0]};
+    for (std::string& option : defaults) arguments.push_back(option.data());
+    arguments.insert(arguments.end(), argv + 1, argv + argc);
+    int count = static_cast<int>(arguments.size());
+    benchmark::Initialize(&count, arguments.data());
+    const auto add = [](const char* name, auto... inputs) {
+        benchmark::RegisterBenchmark(name, inputs...)->UseRealTime();
+    };
+    add("header/floor", headerFloor);
+    add("header/table", parseAndDump<ISCSIEPFileTBL>, EPFileBuilder::table());
+    add("header/free-index", parseAndDump<ISCSIEPFileFRI>, EPFileBuilder::freeIndex());
+    add("header/data", parseAndDump<ISCSIEPFileDAT>, EPFileBuilder::data());
+    add("header/journal", parseAndDump<ISCSIEPFileJNL>, EPFileBuilder::journal());
+    add("header/map", parseAndDump<ISCSIEPFileMAP>, EPFileBuilder::map());
+    add("header/map of 1024 pools", parseAndDump<ISCSIEPFileMAP>,
+        EPFileBuilder::map().set(epsample::map::seg0PoolCount, 1024));
+    add("entry/floor", singleLookupFloor);
+    add("entry/single", singleLookup);
+    add("entry/walk", wholeMapWalk);
+    add("extent/floor", extentFloor);
+    add("extent/library", extent);
+    add("extent/basenc", extentProgram, std::string("basenc --base16 -w0"));
+    add("extent/xxd", extentProgram, std::string("xxd -p"));
+    add("extent/od", extentProgram, std::string("od -An -v -tx1"));
+
+    RatioReporter reporter;
+    benchmark::RunSpecifiedBenchmarks(&reporter);
+    reporter.printTimes();
+    std::puts("\nRatios of this run");
+    for (const char* kind : {"table", "free-index", "data", "journal", "map", "map of 1024 pools"}) {
+        reporter.printRatio(std::string("parse and dump, ") + kind + ": time against open, read, close",
+                            std::string("header/") + kind, "header/floor");
+    }
+    reporter.printRatio("single lookup: time against the bare four system calls", "entry/single", "entry/floor");
+    reporter.printRatio("whole-map walk: speed per entry against single lookups", "entry/single", "entry/walk");
+    reporter.printRatio("extents of 1 MiB: speed against the copy floor", "extent/floor", "extent/library");
+    for (const char* program : {"basenc", "xxd", "od"}) {
+        reporter.printRatio(std::string("extents of 1 MiB: speed against ") + program, std::string("extent/") + program,
+                            "extent/library");
+    }
+    return 0;
+}
