@@ -26,7 +26,7 @@ using epsample::EPFileBuilder;
 namespace {
 
 constexpr off_t dataStart = 24576;
-constexpr std::uint64_t mapEntries = 1000000;
+constexpr std::uint64_t mapEntries = 10000000;
 constexpr std::size_t extentSize = 1048576;
 
 /// A folder that lives as long as the program.
@@ -85,10 +85,11 @@ void singleLookup(benchmark::State& state) {
 }
 
 void singleLookupFloor(benchmark::State& state) {
+    const std::string& path = mapFile();
     unsigned char entry[8];
     std::uint64_t index = 0;
     for (auto _ : state) {
-        const int file = open(mapFile().c_str(), O_RDONLY);
+        const int file = open(path.c_str(), O_RDONLY);
         lseek(file, dataStart + static_cast<off_t>(8 * index), SEEK_SET);
         if (read(file, entry, sizeof entry) != sizeof entry) state.SkipWithError("read failed");
         close(file);
@@ -134,9 +135,10 @@ void extent(benchmark::State& state) {
 
 /// Open, pread into a fresh buffer, two copies of it into a fresh buffer of twice the size, close.
 void extentFloor(benchmark::State& state) {
+    const std::string& path = dataFile();
     off_t index = 0;
     for (auto _ : state) {
-        const int file = open(dataFile().c_str(), O_RDONLY);
+        const int file = open(path.c_str(), O_RDONLY);
         const std::unique_ptr<char[]> bytes(new char[extentSize]);
         const off_t position = dataStart + index++ % 8 * static_cast<off_t>(extentSize);
         if (pread(file, bytes.get(), extentSize, position) < 0) state.SkipWithError("read failed");

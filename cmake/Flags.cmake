@@ -6,6 +6,8 @@ target_compile_options(iscsieptool_flags INTERFACE
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
   target_compile_options(iscsieptool_flags INTERFACE -Wno-psabi)  # remarks on how old compilers passed parameters on ARM
 endif()
+target_compile_options(iscsieptool_flags INTERFACE -fstack-protector-strong)
+target_link_options(iscsieptool_flags INTERFACE LINKER:-z,relro,-z,now)
 # File positions are 64 bits wide on 32-bit machines too.
 target_compile_definitions(iscsieptool_flags INTERFACE _FILE_OFFSET_BITS=64)
 

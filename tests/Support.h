@@ -33,9 +33,7 @@ extern "C" __attribute__((visibility("default"))) void syslog(int priority, cons
 }
 
 /// The lines logged since the last call.
-inline Lines takeLog() {
-    return std::exchange(logLines, {});
-}
+inline Lines takeLog() { return std::exchange(logLines, {}); }
 
 /// "iSCSI:SOURCE path: PATH" for each source, as a failure chain about one path leaves them.
 inline Lines chain(const std::string& path, Lines sources) {

@@ -9,12 +9,6 @@
 
 namespace {
 
-std::string contentOf(const std::string& path) {
-    std::ostringstream text;
-    text << std::ifstream(path, std::ios::binary).rdbuf();
-    return text.str();
-}
-
 struct Case {
     std::string command;  ///< for the shell; $E runs epinspect and $P epsample, $S is the store, $M its map file, $T
                           ///< the test's folder
@@ -36,6 +30,7 @@ bool matches(const std::string& text, const std::string& pattern) {
 TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
     const TempDir folder;
     using epsample::EPFileBuilder;
+    folder.write("empty", EPFileBuilder::table().resize(0));
     folder.write("plain", EPFileBuilder::table());
     folder.write("mapped", EPFileBuilder::map().set(epsample::map::seg0PoolCount, 0));
     folder.write("five", EPFileBuilder::map().entry(0, 0x9000000000000000).entry(1, 0x9000000000000001).entry(4, 1));
@@ -62,6 +57,7 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
         {"$E dump /dev/zero", 1, "", "epinspect: /dev/zero: neither a regular file nor a block device\n"},
         {"mkfifo fifo; $E dump fifo", 1, "", "neither a regular file"},
         {"$E dump \"$(printf 'a\\033[1m\\nb')\"", 1, "", "epinspect: a\\x1b[1m\\x0ab: cannot be opened (EP_ERR"},
+        {"for f in none $T empty; do for c in dump 'entry 0' map 'extent 0 --extent-size 1'; do set -- $c; a=$1; shift; $E $a $f \"$@\" 2>/dev/null; printf $?; done; done", 0, "111111111111", ""},
         {"$E dump --as nonsense plain", 2, "", "nonsense"}, {"$E dump", 2, "", "FILE"}, {"$E dump --bogus x", 2, "", "--bogus"},
         // entries
         {"$E entry $M 512 0x190", 0, "512: pool number: 16 ,extent address: 4194816 ,mapped: true ,vpushed: false ,vpulled: false ,synced: false\n400: pool number: 0 ,...false\n", ""},
@@ -98,13 +94,18 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
         {"($E map big/volume1/@iSCSI/LUN/*; echo $? >status) 2>said | true; cat said status", 0, "1\n", ""},
     };
     // clang-format on
+    const auto contentOf = [&folder](const char* name) {
+        std::ostringstream text;
+        text << std::ifstream(folder.path(name), std::ios::binary).rdbuf();
+        return text.str();
+    };
     for (const Case& c : cases) {
         const std::string redirected = "{ " + c.command + "; } >" + folder.path("out") + " 2>" + folder.path("err");
         const int status = std::system((setup.str() + redirected).c_str());
         EXPECT_EQ(c.status, WEXITSTATUS(status)) << c.command;
-        const std::string output = contentOf(folder.path("out"));
+        const std::string output = contentOf("out");
         EXPECT_TRUE(matches(output, c.output)) << c.command << '\n' << output.substr(0, 2000);
-        const std::string message = contentOf(folder.path("err"));
+        const std::string message = contentOf("err");
         const bool asPromised = c.message.empty() ? message.empty() : message.find(c.message) != std::string::npos;
         EXPECT_TRUE(asPromised) << c.command << '\n' << message;
     }

@@ -36,18 +36,14 @@ extern "C" __attribute__((visibility("default"))) ssize_t read(int descriptor, v
     return syscall(SYS_read, descriptor, bytes, size);
 }
 
-void* operator new(std::size_t size) {
+[[gnu::noinline]] void* operator new(std::size_t size) {
     if (allocationsLeft == 0) throw std::bad_alloc();
     if (allocationsLeft > 0) --allocationsLeft;
     if (void* memory = std::malloc(size)) return memory;
     throw std::bad_alloc();
 }
-void operator delete(void* memory) noexcept {
-    std::free(memory);
-}
-void operator delete(void* memory, std::size_t) noexcept {
-    std::free(memory);
-}
+[[gnu::noinline]] void operator delete(void* memory) noexcept { std::free(memory); }
+[[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
 
 namespace {
 

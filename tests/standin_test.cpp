@@ -33,13 +33,9 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
     for (const int code : {0, 1, missing, malformed, bad, unknown}) texts.insert(KELPiSCSIStrError(code));
     EXPECT_EQ(6U, texts.size());
 
-    struct Case {
-        const char* from;
-        std::string to;
-        int expected;
-    };
+    using Case = std::tuple<std::string, std::string, int>;
     // clang-format off
-    for (const Case& c : {
+    for (const auto& [from, to, expected] : {
         Case{"4294967295", "4294967296", bad}, Case{"4294967295", "-1", bad}, Case{"-5", "-2147483649", bad},
         Case{"18446744073709551615", "18446744073709551616", bad}, Case{"-5", "2147483648", bad}, Case{"-5", "1.5", bad},
         Case{"\"U\"", "null", bad}, Case{"\"name\"", "\"other\"", bad}, Case{"7", "\"7\"", bad}, Case{"[", "[3,", bad},
@@ -47,15 +43,13 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
         Case{"\"U\"", quoted(74), bad}, Case{"\"R\"", quoted(4094), 0}, Case{"\"R\"", quoted(4095), bad},
         Case{"\"N\"", quoted(266), 0}, Case{"\"N\"", quoted(267), bad}, Case{"[", "{\"a\": [", malformed},
         Case{"[", std::string(100000, '['), malformed}}) {
-        EXPECT_EQ(c.expected, askWith(c.from, c.to)) << c.from << " -> " << c.to.substr(0, 80);
+        EXPECT_EQ(expected, askWith(from, to)) << from << " -> " << to.substr(0, 80);
     }
     // clang-format on
     EXPECT_EQ(0, askWith("7", "7"));
-    EXPECT_EQ(std::string("\xff\xff\xff\xff\xff\xff\xff\xff\xff\xff\xff\xff\xff\xff\xff\xff\xfb\xff\xff\xff", 20),
-              record.substr(20, 20));
-    EXPECT_STREQ("U", &record[44]);
-    EXPECT_STREQ("R", &record[118]);
-    EXPECT_STREQ("N", &record[4213]);
+    EXPECT_EQ(std::string(16, '\xff') + "\xfb\xff\xff\xff", record.substr(20, 20));
+    for (const auto& [offset, text] : {std::pair{44U, "U"}, {118U, "R"}, {4213U, "N"}})
+        EXPECT_STREQ(text, &record[offset]);
     setenv("KELPISCSIEP_LUNS", folder.path("").c_str(), 1);
     EXPECT_EQ(missing, ask(7));
 }

@@ -24,18 +24,14 @@ TEST(StringTools, MissingInputIsRefusedAndLeavesTheText) {
 }
 
 TEST(StringTools, TimesFollowTheZoneAndAreSigned) {
-    struct Case {
-        const char* zone;
-        unsigned int seconds;
-        const char* text;
-    };
-    for (const Case& c :
+    using Case = std::tuple<const char*, unsigned int, std::string>;
+    for (const auto& [zone, seconds, text] :
          {Case{"UTC", 0, "Thu Jan 01 00:00:00 UTC 1970"}, Case{"UTC", 0x7fffffff, "Tue Jan 19 03:14:07 UTC 2038"},
           Case{"UTC", 0x80000000, "Fri Dec 13 20:45:52 UTC 1901"},
           Case{"ABC-2", 1600000000, "Sun Sep 13 14:26:40 ABC 2020"},
           Case{"ABCDEF0", 0, "Thu Jan 01 00:00:00 ABCDEF 1970"},  // just fits
           Case{"ABCDEFG0", 0, ""}}) {
-        setenv("TZ", c.zone, 1);
-        EXPECT_EQ(c.text, GetTimeInString(c.seconds)) << c.zone << ' ' << c.seconds;
+        setenv("TZ", zone, 1);
+        EXPECT_EQ(text, GetTimeInString(seconds)) << zone << ' ' << seconds;
     }
 }

@@ -36,9 +36,7 @@ std::string_view kindFromType(const tool::ISCSIEPFile& file) {
     return file.head0Type == tool::EP_FILE_TYPE_MAP ? "map" : "head";
 }
 
-int parse(tool::ISCSIEPFile& file) {
-    return file.parseHead0();
-}
+int parse(tool::ISCSIEPFile& file) { return file.parseHead0(); }
 
 template <typename File>
 int parse(File& file) {

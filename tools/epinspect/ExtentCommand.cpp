@@ -19,9 +19,7 @@ struct ExtentOptions {
     bool raw = false;
 };
 
-unsigned int valueOf(char digit) {
-    return static_cast<unsigned int>(digit <= '9' ? digit - '0' : digit - 'a' + 10);
-}
+unsigned int valueOf(char digit) { return static_cast<unsigned int>(digit <= '9' ? digit - '0' : digit - 'a' + 10); }
 
 /// The bytes that the library's hexadecimal text stands for, in place of it.
 void toBytes(std::string& hex) {

@@ -18,9 +18,7 @@ std::string hex(unsigned long long value) {
 
 }  // namespace
 
-Json fileObject(const std::string& file) {
-    return Json::object({{"file", file}});
-}
+Json fileObject(const std::string& file) { return Json::object({{"file", file}}); }
 
 void addMembers(Json& object, const tool::ISCSIEPFile& file) {
     object["head0Checksum"] = hex(file.head0Checksum);

@@ -65,8 +65,6 @@ unsigned int terminalWidth() {
     return known ? size.ws_col : 80;
 }
 
-bool localeIsUnicode() {
-    return std::strcmp(nl_langinfo(CODESET), "UTF-8") == 0;
-}
+bool localeIsUnicode() { return std::strcmp(nl_langinfo(CODESET), "UTF-8") == 0; }
 
 }  // namespace epinspect

@@ -62,9 +62,7 @@ void finishOutput() {
     if (outputError != 0) throw OutputFailure{outputError};
 }
 
-bool outputIsTerminal() {
-    return isatty(STDOUT_FILENO) == 1;
-}
+bool outputIsTerminal() { return isatty(STDOUT_FILENO) == 1; }
 
 std::string printable(std::string_view text) {
     std::string result;
@@ -84,9 +82,7 @@ std::string printable(std::string_view text) {
     return result;
 }
 
-std::string forReader(std::string_view text) {
-    return outputIsTerminal() ? printable(text) : std::string(text);
-}
+std::string forReader(std::string_view text) { return outputIsTerminal() ? printable(text) : std::string(text); }
 
 void complain(std::string_view message) {
     flushOutput();  // what came before is seen before
@@ -94,8 +90,6 @@ void complain(std::string_view message) {
     static_cast<void>(std::fwrite(line.data(), 1, line.size(), stderr));
 }
 
-void complain(std::string_view subject, int error) {
-    complain(std::string(subject) + ": " + describe(error));
-}
+void complain(std::string_view subject, int error) { complain(std::string(subject) + ": " + describe(error)); }
 
 }  // namespace epinspect

@@ -22,9 +22,7 @@ std::string Session::targetPath(const std::string& name) const {
     return name.compare(0, 1, "/") == 0 ? name : "/" + name;
 }
 
-std::string Session::localPath(const std::string& name) const {
-    return root_ + targetPath(name);
-}
+std::string Session::localPath(const std::string& name) const { return root_ + targetPath(name); }
 
 std::optional<std::string> Session::openablePath(const std::string& name) {
     std::string path = localPath(name);

@@ -24,9 +24,7 @@ __attribute__((format(printf, 1, 0))) std::string formatted(const char* format, 
 
 }  // namespace
 
-void epinspect::showLogLines() {
-    shown = true;
-}
+void epinspect::showLogLines() { shown = true; }
 
 extern "C" __attribute__((visibility("default"), format(printf, 2, 3))) void syslog(int priority, const char* format,
                                                                                     ...) {

@@ -36,9 +36,7 @@ inline constexpr Field head1Checksum{64, 4}, attribute{68, 4}, logicBlockSize{72
     seg0PoolCount{4168, 4}, promoteTime{4188, 4}, var2Checksum{4224, 4}, syncCount{4228, 8}, childAttribute{4236, 4};
 inline constexpr UUIDField parentUUID{84}, sessionUUID{4172}, trackUUID{4240}, previousTrackUUID{4256},
     currentTrackUUID{4272};
-constexpr UUIDField poolUUID(unsigned int index) {
-    return {8192 + std::uint64_t{16} * index};
-}
+constexpr UUIDField poolUUID(unsigned int index) { return {8192 + std::uint64_t{16} * index}; }
 }  // namespace map
 
 namespace dat {

@@ -12,9 +12,7 @@ constexpr const char* lunUUID = "6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11";
 
 constexpr std::uint64_t extentsPerDataFile = std::uint64_t{1} << 22U;  // 4 TiB in extents of 1 MiB
 
-[[noreturn]] void failed(const std::string& path) {
-    throw std::system_error(errno, std::generic_category(), path);
-}
+[[noreturn]] void failed(const std::string& path) { throw std::system_error(errno, std::generic_category(), path); }
 
 void appendMapEntries(const std::string& path, std::uint64_t count) {
     std::ofstream file(path, std::ios::binary | std::ios::app);
