@@ -7,7 +7,6 @@
 #include <cstdarg>
 #include <filesystem>
 #include <fstream>
-#include <mutex>
 #include <string>
 #include <vector>
 
@@ -16,7 +15,6 @@
 using Lines = std::vector<std::string>;
 
 inline Lines logLines;
-inline std::mutex logMutex;
 
 /// What the library writes to the system log; a line that was not at LOG_ERR says so.
 extern "C" __attribute__((visibility("default"))) void syslog(int priority, const char* format, ...) {
@@ -25,7 +23,6 @@ extern "C" __attribute__((visibility("default"))) void syslog(int priority, cons
     va_start(arguments, format);
     std::vsnprintf(text, sizeof text, format, arguments);
     va_end(arguments);
-    const std::lock_guard lock(logMutex);
     try {
         logLines.push_back(priority == LOG_ERR ? text : "not LOG_ERR: " + std::string(text));
     } catch (const std::bad_alloc&) {  // a test has made memory scarce: the line is lost
@@ -45,8 +42,6 @@ inline Lines chain(const std::string& path, Lines sources) {
 class TempDir {
 public:
     TempDir() { mkdtemp(path_.data()); }
-    TempDir(const TempDir&) = delete;
-    TempDir& operator=(const TempDir&) = delete;
     ~TempDir() { std::filesystem::remove_all(path_); }
 
     std::string path(const std::string& name) const { return path_ + "/" + name; }

@@ -67,36 +67,27 @@ TEST(EPFile, EveryKindIsDecodedAndShownWhateverTheGlobalLocale) {
     const std::locale before = std::locale::global(std::locale(std::locale::classic(), new Grouping));
     expectKind<ISCSIEPFileTBL>(
         EPFileBuilder::table().set(epsample::tbl::totalCount, 0xffffffffffffffff), "1", "10111213-1415-1617-1819-1a1b1c1d1e1f",
-        "================ HEAD[1] ================\nchecksum:\t\t0xa1\n"
-        "extent size:\t\t1048576\nentry size:\t\t16\ntotal count:\t\t18446744073709551615\n", "ISCSIEPFileTBL.cpp:41");
+        "================ HEAD[1] ================\nchecksum:\t\t0xa1\nextent size:\t\t1048576\nentry size:\t\t16\ntotal count:\t\t18446744073709551615\n", "ISCSIEPFileTBL.cpp:41");
     expectKind<ISCSIEPFileFRI>(
         EPFileBuilder::freeIndex().set(epsample::head0::type, 0xffffffff), "4294967295", "20212223-2425-2627-2829-2a2b2c2d2e2f",
         "================ HEAD[1] ================\nchecksum:\t\t0xb1\nentry size:\t\t8\ntotal group count:\t0x100\n"
-        "================ VAR[0]  ================\nchecksum:\t\t0xb2\ntotal free count:\t0x100000001\nindex head:\t\t77\n",
-        "ISCSIEPFileFRI.cpp:45");
-    expectKind<ISCSIEPFileDAT>(
-        EPFileBuilder::data(), "3", "30313233-3435-3637-3839-3a3b3c3d3e3f",
+        "================ VAR[0]  ================\nchecksum:\t\t0xb2\ntotal free count:\t0x100000001\nindex head:\t\t77\n", "ISCSIEPFileFRI.cpp:45");
+    expectKind<ISCSIEPFileDAT>(EPFileBuilder::data(), "3", "30313233-3435-3637-3839-3a3b3c3d3e3f",
         "================ HEAD[1] ================\nchecksum:\t\t0xc1\nserial number:\t\t5\n", "ISCSIEPFileDAT.cpp:38");
-    expectKind<ISCSIEPFileMAP>(
-        EPFileBuilder::map(), "4", "40414243-4445-4647-4849-4a4b4c4d4e4f",
-        "================ HEAD[1] ================\nchecksum:\t\t0xd1\n"
-        "attribute:\t\t0x3f\nlogic block size:\t512\ntotal count:\t\t4096\n"
-        "parent UUID:\t\t50515253-5455-5657-5859-5a5b5c5d5e5f\nparent total count:\t2048\n"
-        "================ VAR[0]  ================\nchecksum:\t\t0xd2\nmapped count:\t\t3000\n"
+    expectKind<ISCSIEPFileMAP>(EPFileBuilder::map(), "4", "40414243-4445-4647-4849-4a4b4c4d4e4f",
+        "================ HEAD[1] ================\nchecksum:\t\t0xd1\nattribute:\t\t0x3f\nlogic block size:\t512\ntotal count:\t\t4096\nparent UUID:\t\t50515253-5455-5657-5859-5a5b5c5d5e5f\n"
+        "parent total count:\t2048\n================ VAR[0]  ================\nchecksum:\t\t0xd2\nmapped count:\t\t3000\n"
         "================ VAR[1]  ================\nchecksum:\t\t0xd3\nseg0 checksum:\t\t0xd4\nseg0 pool count:\t2\n"
         "session UUID:\t\t60616263-6465-6667-6869-6a6b6c6d6e6f\npromote time:\t\tSun Sep 13 12:27:40 UTC 2020\n"
         "================ VAR[2]  ================\nchecksum:\t\t0xd5\nsync count:\t\t1000\nchild attribute:\t0x1c\n"
         "track UUID:\t\t70717273-7475-7677-7879-7a7b7c7d7e7f\nprevious track UUID:\t80818283-8485-8687-8889-8a8b8c8d8e8f\n"
-        "current track UUID:\t90919293-9495-9697-9899-9a9b9c9d9e9f\n"
-        "================ SEG[0]  ================\n"
+        "current track UUID:\t90919293-9495-9697-9899-9a9b9c9d9e9f\n================ SEG[0]  ================\n"
         "pool #1: a0a1a2a3-a4a5-a6a7-a8a9-aaabacadaeaf\npool #2: b0b1b2b3-b4b5-b6b7-b8b9-babbbcbdbebf\n", "ISCSIEPFileMAP.cpp:63");
-    expectKind<ISCSIEPFileJNL>(
-        EPFileBuilder::journal(), "5", "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf",
+    expectKind<ISCSIEPFileJNL>(EPFileBuilder::journal(), "5", "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf",
         "================ HEAD[1] ================\nchecksum:\t\t0xe1\ntotal count:\t\t65536\n"
         "================ VAR[0]  ================\nchecksum:\t\t0xe2\nshutdown tag:\t\t0x5afe\nsync count:\t\t12\n"
-        "================ VAR[1]  ================\nchecksum:\t\t0xe3\nlast trans ID:\t\t4711\n"
-        "last record start:\t4294967296\nlast flush errno:\t4294967291\nlast recovery error:\t0\nempty record start:\t8192\n",
-        "ISCSIEPFileJNL.cpp:55");
+        "================ VAR[1]  ================\nchecksum:\t\t0xe3\nlast trans ID:\t\t4711\nlast record start:\t4294967296\n"
+        "last flush errno:\t4294967291\nlast recovery error:\t0\nempty record start:\t8192\n", "ISCSIEPFileJNL.cpp:55");
     std::locale::global(before);
 }
 

@@ -45,17 +45,14 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
     // clang-format off
     const Case cases[] = {
         // kinds by name, by type, by choice; several files with a bad one in the middle
-        {"$E dump $S/var/db/iscsi/EP_JNL", 0, "...empty record start:\t8192\n", ""},
-        {"$E dump $D", 0, "...serial number:\t\t1\n", ""},
-        {"$E dump mapped", 0, "...================ SEG[0]  ================\n", ""},
-        {"$E dump plain", 0, "...create time:\t\tSun Sep 13 12:26:40 UTC 2020\n", ""},
+        {"$E dump $S/var/db/iscsi/EP_JNL", 0, "...empty record start:\t8192\n", ""}, {"$E dump $D", 0, "...serial number:\t\t1\n", ""},
+        {"$E dump mapped", 0, "...================ SEG[0]  ================\n", ""}, {"$E dump plain", 0, "...create time:\t\tSun Sep 13 12:26:40 UTC 2020\n", ""},
         {"$E dump --as fri plain", 0, "...index head:\t\t0\n", ""},
         {"$E --root $S dump /volume1/@iSCSI/EP/EP_TBL $S/none $T volume1/@iSCSI/EP/EP_FRI", 1, "/volume1/@iSCSI/EP/EP_TBL:\n...index head:\t\t77\n", "store/none: cannot be opened (EP_ERR_OPEN_FAILED, 18990038)\nepinspect: "},
         {"$E dump --json --as head plain", 0, "{\"file\":\"plain\",\"head0Checksum\":\"0xa1b2c3d\",\"head0Version\":2,\"head0MagicCode\":\"0x1122334455667788\",\"head0Type\":1,\"head0UUID\":\"10111213-1415-1617-1819-1a1b1c1d1e1f\",\"head0DataStartOffset\":\"0x6000\",\"head0CreateTime\":1600000000}\n", ""},
         {"$E dump --json $M", 0, "...\"poolUUIDs\":[\"a0a1a2a3-a4a5-a6a7-a8a9-aaabacadaeaf\",\"b0b1b2b3-b4b5-b6b7-b8b9-babbbcbdbebf\"]}\n", ""},
         {"$E dump short -v", 1, "", "epinspect: iSCSI:ISCSIEPFile.cpp:42:readHeader Failed to read file. path: short\n"},
-        {"$E dump /dev/zero", 1, "", "epinspect: /dev/zero: neither a regular file nor a block device\n"},
-        {"mkfifo fifo; $E dump fifo", 1, "", "neither a regular file"},
+        {"$E dump /dev/zero", 1, "", "epinspect: /dev/zero: neither a regular file nor a block device\n"}, {"mkfifo fifo; $E dump fifo", 1, "", "neither a regular file"},
         {"$E dump \"$(printf 'a\\033[1m\\nb')\"", 1, "", "epinspect: a\\x1b[1m\\x0ab: cannot be opened (EP_ERR"},
         {"for f in none $T empty; do for c in dump 'entry 0' map 'extent 0 --extent-size 1'; do set -- $c; a=$1; shift; $E $a $f \"$@\" 2>/dev/null; printf $?; done; done", 0, "111111111111", ""},
         {"$E dump --as nonsense plain", 2, "", "nonsense"}, {"$E dump", 2, "", "FILE"}, {"$E dump --bogus x", 2, "", "--bogus"},

@@ -52,7 +52,7 @@ constexpr int operationCount = 4;
 
 /// Performs one of the operations that read, on whole files. Tells its code, and whether it has delivered a result.
 /// Afterwards no more files may be open than before.
-int perform(int operation, bool& delivered) {
+std::pair<int, bool> perform(int operation) {
     const TempDir folder;
     EPFileBuilder map = EPFileBuilder::map().entry(entryCount - 1, 0x8000000000000000);
     ISCSIEPFileMAP mapFile(folder.write("map", map));
@@ -70,12 +70,12 @@ int perform(int operation, bool& delivered) {
                                       : dataFile.getExtentData(1, 65536, text);
     allocationsLeft = -1;
     // Pool UUIDs that were appended before a failure may stay.
-    delivered = mapFile.poolUUIDs.size() == 2 || entry.mapped || !entries.empty() || !text.empty();
+    const bool delivered = mapFile.poolUUIDs.size() == 2 || entry.mapped || !entries.empty() || !text.empty();
     const int after = dup(0);
     close(after);
     EXPECT_EQ(before, after) << operation;
     takeLog();
-    return code;
+    return {code, delivered};
 }
 
 }  // namespace
@@ -85,8 +85,7 @@ TEST(Faults, ReadsThatFailComeShortOrMeetAShrunkFile) {
         for (int operation = 0; operation < operationCount; ++operation) {
             for (faultyRead = 1;; ++faultyRead) {
                 fault = kind;
-                bool delivered = false;
-                const int code = perform(operation, delivered);
+                const auto [code, delivered] = perform(operation);
                 fault = Fault::NONE;
                 if (readsSeen < faultyRead) break;  // no such read any more
                 // What comes short is read on; a run of entries may end where the file now ends.
@@ -101,11 +100,10 @@ TEST(Faults, ReadsThatFailComeShortOrMeetAShrunkFile) {
 
 TEST(Faults, MemoryThatRunsOut) {
     for (int operation = 0; operation < operationCount; ++operation) {
-        int code = -1;
-        for (allocationsAllowed = 0; code != 0; ++allocationsAllowed) {
-            bool delivered = false;
-            ASSERT_NO_THROW(code = perform(operation, delivered)) << operation;
-            EXPECT_EQ(code == 0, delivered) << operation << ' ' << allocationsAllowed << ": " << code;
+        std::pair<int, bool> outcome = {-1, false};
+        for (allocationsAllowed = 0; outcome.first != 0; ++allocationsAllowed) {
+            ASSERT_NO_THROW(outcome = perform(operation)) << operation;
+            EXPECT_EQ(outcome.first == 0, outcome.second) << operation << ' ' << allocationsAllowed;
         }
         EXPECT_LT(1, allocationsAllowed) << operation;
         allocationsAllowed = -1;

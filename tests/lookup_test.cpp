@@ -140,21 +140,19 @@ TEST(MapEntry, RunsOfEntriesEndWithTheFile) {
 }
 
 TEST(Extent, MarksComeOutFromBeyondThe32BitRange) {
+    const std::map<char, std::uint64_t> marks = {{'0', 0},          {'1', 0x7fffffff},  {'2', 0x80000000},
+                                                 {'3', 0xffffffff}, {'4', 0x100000000}, {'5', 0x140000123}};
     const TempDir folder;
     EPFileBuilder builder = EPFileBuilder::data();
-    const std::uint64_t marks[] = {0, 0x7fffffff, 0x80000000, 0xffffffff, 0x100000000, 0x140000123};
-    for (std::size_t i = 0; i < std::size(marks); ++i) {
-        builder.bytes(blockSize + marks[i], std::string(1, static_cast<char>(0xa0 + i)));
-    }
+    for (const auto& [mark, offset] : marks) builder.bytes(blockSize + offset, std::string(1, mark));
     ISCSIEPFileDAT file(folder.write("data", builder));
-    for (std::size_t i = 0; i < std::size(marks); ++i) {
-        std::string data;
-        EXPECT_EQ(0, file.getExtentData(marks[i], 1, data));
-        EXPECT_EQ("a" + std::to_string(i), data);
+    std::string data;
+    for (const auto& [mark, offset] : marks) {
+        EXPECT_EQ(0, file.getExtentData(offset, 1, data));
+        EXPECT_EQ(std::string("3") + mark, data);
     }
-    std::string data;  // the product of index and size needs 64 bits
-    EXPECT_EQ(0, file.getExtentData(0x1000, 0x100000, data));
-    EXPECT_EQ(std::string("a4") + std::string(0x200000 - 2, '0'), data);
+    EXPECT_EQ(0, file.getExtentData(0x1000, 0x100000, data));  // the product of index and size needs 64 bits
+    EXPECT_EQ(std::string("34") + std::string(0x200000 - 2, '0'), data);
 }
 
 TEST(Extent, BytesComeOutInFileOrderAndSizesAreChecked) {

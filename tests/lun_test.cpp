@@ -18,12 +18,12 @@ int result = 0;
 std::string record(4480, '\0');
 unsigned int askedLid = 0;
 
-/// Makes a record; texts are uuid abc, root path /volume1, name lun3.
-void answer(unsigned int extentSize, unsigned long long size, int restoreTime, int type) {
+/// Makes a record; the UUID is abc, the root path /volume1, the name lun3.
+void answer(unsigned int extentSize, unsigned long long size, int type) {
     record.assign(4480, '\0');
     std::memcpy(&record[20], &extentSize, 4);
     std::memcpy(&record[24], &size, 8);
-    std::memcpy(&record[32], &restoreTime, 4);
+    record[32] = 60;  // restore time
     std::memcpy(&record[36], &type, 4);
     record.replace(44, 3, "abc").replace(118, 8, "/volume1").replace(4213, 4, "lun3");
     result = 0;
@@ -44,15 +44,15 @@ extern "C" __attribute__((visibility("default"))) const char* KELPiSCSIStrError(
 }
 
 TEST(LunConf, ARecordIsLoadedWholeOrNotAtAll) {
-    answer(1048576, 10737418240, 0, 263);
+    answer(1048576, 10737418240, 263);
     ISCSILUNConfInfo lun(3);
     EXPECT_EQ(0, lun.loadFromConfig());
     EXPECT_EQ(3U, askedLid);
     const std::string line =
-        "lid: 3 ,extent_size: 1048576 (1MB) ,size: 10737418240 (10GB) ,restore time: Thu Jan 01 00:00:00 UTC 1970 "
+        "lid: 3 ,extent_size: 1048576 (1MB) ,size: 10737418240 (10GB) ,restore time: Thu Jan 01 00:01:00 UTC 1970 "
         ",type: BLUN ,uuid: abc ,rootpath: /volume1 ,name: lun3";
     EXPECT_EQ(line, lun.toString());
-    answer(4, 5, 6, 15);
+    answer(4, 5, 15);
     result = -77;
     EXPECT_EQ(-77, lun.loadFromConfig());
     EXPECT_EQ(line, lun.toString());
@@ -66,7 +66,7 @@ TEST(LunConf, ARecordIsLoadedWholeOrNotAtAll) {
 }
 
 TEST(LunConf, TextsEndAtTheirNulOrWithTheRecord) {
-    answer(1, 1, 0, 1);
+    answer(1, 1, 1);
     record.replace(44, 74, std::string(74, 'u'));      // runs on into the root path
     record.replace(4213, 267, std::string(267, 'n'));  // fills the record to its last byte
     ISCSILUNConfInfo lun(1);
@@ -147,11 +147,11 @@ TEST(Locations, DataFilesHoldFourTebibytesEach) {
 
 TEST(Locations, TheMapFileFollowsTheConfigurationAndTheJournalNothing) {
     std::string path = "old";
-    answer(1, 1, 0, 263);
+    answer(1, 1, 263);
     EXPECT_EQ(0, ISCSIEPFileMAP().getMAPFilePath(4294967295, path));
     EXPECT_EQ(4294967295, askedLid);
     EXPECT_EQ("/volume1/@iSCSI/LUN/BLUNabclun3_00000", path);
-    answer(1, 1, 0, 5);
+    answer(1, 1, 5);
     record[118] = '\0';
     EXPECT_EQ(0, ISCSIEPFileMAP().getMAPFilePath(1, path));
     EXPECT_EQ("/@iSCSI/LUN/UNKNOWNabclun3_00000", path);
@@ -160,7 +160,7 @@ TEST(Locations, TheMapFileFollowsTheConfigurationAndTheJournalNothing) {
     EXPECT_EQ("/@iSCSI/LUN/UNKNOWNabclun3_00000", path);
     const Lines log = takeLog();
     ASSERT_EQ(2U, log.size());
-    EXPECT_EQ(0U, log[0].find("iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig Failed to get LUN config by LUN ID. "));
+    EXPECT_EQ(0U, log[0].find("iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig "));
     EXPECT_EQ("iSCSI:ISCSIEPFile.cpp:180:getMAPFilePath Failed to get LUN conf info. path: /own%s", log[1]);
     EXPECT_EQ(0, ISCSIEPFileJNL().getJNLFilePath(path));
     EXPECT_EQ("/var/db/iscsi/EP_JNL", path);
