@@ -66,8 +66,8 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
         // maps
         {"$E map five", 0, "0-1: mapped synced, pool 0, extents 0-1\n2-3: hole\n4: unmapped, pool 0, extent 1\n5 entries: 2 mapped, 2 synced, 2 holes, in 3 runs\n", ""},
         {"$E map five --first 1 --count 2 --json", 0, "{\"file\":\"five\",\"first\":1,\"count\":1,\"extentAddress\":1,\"poolNumber\":0,\"mapped\":true,\"vpushed\":false,\"vpulled\":false,\"synced\":true}\n{\"file\":\"five\",\"first\":2,\"count\":1,\"hole\":true}\n{\"file\":\"five\",\"summary\":true,\"entries\":2,\"mapped\":1,\"synced\":1,\"holes\":1,\"runs\":2}\n", ""},
-        {"$E map five --chart", 0, "0 |##...|\nOne cell: 1 entry. Mapped: . none  - <1/3  + <2/3  * most  # all\n5 entries: 2 mapped, 2 synced, 2 holes, in 3 runs\n", ""},
-        {"$E map $M --chart", 0, "   0 |####...\n3840 |########........................++++++++++++++++++++++++++++++++|\nOne cell: 4 entries. Mapped: . none  - <1/3  + <2/3  * most  # all\n4096 entries: 2256 mapped, 1200 synced, 1840 holes, in 402 runs\n", ""},
+        {"$E map five --chart", 0, "0 |##...|\nOne cell: 1 entry\nMapped: . none  - <1/3  + <2/3  * most  # all\n5 entries: 2 mapped, 2 synced, 2 holes, in 3 runs\n", ""},
+        {"$E map $M --chart", 0, "   0 |####...\n3840 |########........................++++++++++++++++++++++++++++++++|\nOne cell: 4 entries\nMapped: . none  - <1/3  + <2/3  * most  # all\n4096 entries: 2256 mapped, 1200 synced, 1840 holes, in 402 runs\n", ""},
         {"$E map mapped", 0, "0 entries: 0 mapped, 0 synced, 0 holes, in 0 runs\n", ""},
         {"$E map $M --first 4096", 1, "", "entry 4096: cannot be read"}, {"$E map $S/volume1/@iSCSI/EP/EP_TBL", 1, "", "WRONG_FILE_TYPE"},
         {"$E map $M --chart --json", 2, "", "excludes"}, {"$E map $M --count x", 2, "", "not a number"},

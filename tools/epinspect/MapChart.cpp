@@ -54,7 +54,7 @@ std::string MapChart::draw(unsigned int width, bool unicode) const {
         if ((cell + 1) % rowCells == 0 || cell + 1 == mapped_.size()) text.append("|\n");
     }
     text.append("One cell: ").append(std::to_string(cellSize_)).append(cellSize_ == 1 ? " entry" : " entries");
-    text.append(". Mapped: ");
+    text.append("\nMapped: ");
     text.append(shades[0]).append(" none  ").append(shades[1]).append(" <1/3  ").append(shades[2]).append(" <2/3  ");
     return text.append(shades[3]).append(" most  ").append(shades[4]).append(" all\n");
 }
