@@ -20,7 +20,7 @@ packages_of() {
 run_leg() {
   local preset=$1
   [ "$preset" = native ] && preset=release
-  need "${build_packages[@]}" strace $(packages_of "$1")
+  need "${build_packages[@]}" strace pkg-config $(packages_of "$1")
   echo "== $1: building (build/$preset)"
   local strict=OFF
   [ "${CI:-}" = true ] && strict=ON
