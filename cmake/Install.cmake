@@ -43,5 +43,3 @@ if(ISCSIEPTOOL_BUILD_TOOLS)
   install(FILES docs/ep-files.md docs/epinspect-json.md
     DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/epinspect COMPONENT tools)
 endif()
-
-include(cmake/Packages.cmake)
