@@ -159,13 +159,9 @@ TEST(EPFile, SlotsAndMembersStandInTheDocumentedOrder) {
     std::memcpy(&word, &operation, sizeof word);
     EXPECT_EQ(2U, word / sizeof(void*));
     const ISCSIEPFileMAP m;
-    // clang-format off
     const void* const members[] = {
-        &m.path, &m.headerBlock, &m.head0Checksum, &m.head0Version, &m.head0MagicCode, &m.head0Type, &m.head0UUID,
-        &m.head0DataStartOffset, &m.head0CreateTime, &m.head1Checksum, &m.attribute, &m.logicBlockSize, &m.totalCount,
-        &m.parentUUID, &m.parentTotalCount, &m.var0Checksum, &m.mappedCount, &m.var1Checksum, &m.seg0Checksum,
-        &m.seg0PoolCount, &m.sessionUUID, &m.promoteTime, &m.var2Checksum, &m.syncCount, &m.childAttribute, &m.trackUUID,
-        &m.previousTrackUUID, &m.currentTrackUUID, &m.poolUUIDs};
-    // clang-format on
+        &m.path,       &m.headerBlock,  &m.head0Checksum,        &m.head0Version,    &m.head0MagicCode,
+        &m.head0Type,  &m.head0UUID,    &m.head0DataStartOffset, &m.head0CreateTime, &m.attribute,
+        &m.parentUUID, &m.var0Checksum, &m.sessionUUID,          &m.syncCount,       &m.poolUUIDs};
     EXPECT_TRUE(std::is_sorted(std::begin(members), std::end(members)));
 }

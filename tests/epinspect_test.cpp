@@ -29,12 +29,12 @@ bool matches(const std::string& text, const std::string& pattern) {
 
 TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
     const TempDir folder;
-    using epsample::EPFileBuilder;
-    folder.write("empty", EPFileBuilder::table().resize(0));
-    folder.write("plain", EPFileBuilder::table());
-    folder.write("mapped", EPFileBuilder::map().set(epsample::map::seg0PoolCount, 0));
-    folder.write("five", EPFileBuilder::map().entry(0, 0x9000000000000000).entry(1, 0x9000000000000001).entry(4, 1));
-    folder.write("short", EPFileBuilder::map().resize(24575));
+    folder.write("empty", epsample::EPFileBuilder::table().resize(0));
+    folder.write("plain", epsample::EPFileBuilder::table());
+    folder.write("mapped", epsample::EPFileBuilder::map().set(epsample::map::seg0PoolCount, 0));
+    folder.write("five",
+                 epsample::EPFileBuilder::map().entry(0, 0x9000000000000000).entry(1, 0x9010000000000001).entry(4, 1));
+    folder.write("short", epsample::EPFileBuilder::map().resize(24575));
     std::ostringstream setup;
     setup << "E='" EPINSPECT_COMMAND "'; P='" EPSAMPLE_COMMAND "'; T=" << folder.path("")
           << "; S=$T/store; M=$S/volume1/@iSCSI/LUN/"
@@ -64,9 +64,9 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
         {"$E entry $M -1", 2, "", "'-1': not a number"}, {"$E entry $M 1x", 2, "", "not a number"}, {"$E entry $M 3-2", 2, "", "backwards"},
         {"$E entry $M 18446744073709551616", 2, "", "out of range"}, {"$E entry $M ' 1'", 2, "", "not a number"}, {"$E entry $M", 2, "", "INDEX"},
         // maps
-        {"$E map five", 0, "0-1: mapped synced, pool 0, extents 0-1\n2-3: hole\n4: unmapped, pool 0, extent 1\n5 entries: 2 mapped, 2 synced, 2 holes, in 3 runs\n", ""},
-        {"$E map five --first 1 --count 2 --json", 0, "{\"file\":\"five\",\"first\":1,\"count\":1,\"extentAddress\":1,\"poolNumber\":0,\"mapped\":true,\"vpushed\":false,\"vpulled\":false,\"synced\":true}\n{\"file\":\"five\",\"first\":2,\"count\":1,\"hole\":true}\n{\"file\":\"five\",\"summary\":true,\"entries\":2,\"mapped\":1,\"synced\":1,\"holes\":1,\"runs\":2}\n", ""},
-        {"$E map five --chart", 0, "0 |##...|\nOne cell: 1 entry\nMapped: . none  - <1/3  + <2/3  * most  # all\n5 entries: 2 mapped, 2 synced, 2 holes, in 3 runs\n", ""},
+        {"$E map five", 0, "0: mapped synced, pool 0, extent 0\n1: mapped synced, pool 16, extent 1\n2-3: hole\n4: unmapped, pool 0, extent 1\n5 entries: 2 mapped, 2 synced, 2 holes, in 4 runs\n", ""},
+        {"$E map five --first 1 --count 2 --json", 0, "{\"file\":\"five\",\"first\":1,\"count\":1,\"extentAddress\":1,\"poolNumber\":16,\"mapped\":true,\"vpushed\":false,\"vpulled\":false,\"synced\":true}\n{\"file\":\"five\",\"first\":2,\"count\":1,\"hole\":true}\n{\"file\":\"five\",\"summary\":true,\"entries\":2,\"mapped\":1,\"synced\":1,\"holes\":1,\"runs\":2}\n", ""},
+        {"$E map five --chart", 0, "0 |##...|\nOne cell: 1 entry\nMapped: . none  - <1/3  + <2/3  * most  # all\n5 entries: 2 mapped, 2 synced, 2 holes, in 4 runs\n", ""},
         {"$E map $M --chart", 0, "   0 |####...\n3840 |########........................++++++++++++++++++++++++++++++++|\nOne cell: 4 entries\nMapped: . none  - <1/3  + <2/3  * most  # all\n4096 entries: 2256 mapped, 1200 synced, 1840 holes, in 402 runs\n", ""},
         {"$E map mapped", 0, "0 entries: 0 mapped, 0 synced, 0 holes, in 0 runs\n", ""},
         {"$E map $M --first 4096", 1, "", "entry 4096: cannot be read"}, {"$E map $S/volume1/@iSCSI/EP/EP_TBL", 1, "", "WRONG_FILE_TYPE"},
@@ -85,7 +85,6 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
         {"$E --root $S/ path tbl $M", 0, "/volume1/@iSCSI/EP/EP_TBL\n", ""}, {"$E path fri /volume2/x", 0, "/volume2/@iSCSI/EP/EP_FRI\n", ""}, {"$E path jnl x", 0, "/var/db/iscsi/EP_JNL\n", ""},
         {"$E path dat /volume3/x --extent-size 1M --extent-address 4194304", 0, "/volume3/@iSCSI/EP/EP_DAT_00001\n", ""}, {"$E path tbl $M", 1, "", "path names no volume (EP_ERR_NO_PATH, 18990401)"},
         {"$E path", 2, "", "subcommand"}, {"$E", 2, "", "subcommand"}, {"$E nonsense", 2, "", "nonsense"},
-        // the program itself, and an output that takes nothing
         {"$E --version", 0, "epinspect 1.0.0\n", ""}, {"$E --help", 0, "Shows what...", ""}, {"$E map --help", 0, "Show all...", ""},
         {"$E dump $M >/dev/full", 1, "", "epinspect: standard output: No space left on device\n"}, {"$E --help >/dev/full", 1, "", "standard output"},
         {"($E map big/volume1/@iSCSI/LUN/*; echo $? >status) 2>said | true; cat said status", 0, "1\n", ""},

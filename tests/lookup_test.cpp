@@ -32,8 +32,7 @@ void expectFailures(const Lookup& lookup, const EPFileBuilder& valid, Find find)
     const auto expectFailure = [&](File& file, std::uint64_t index, int code, int line, const std::string& message,
                                    Lines lines = {}) {
         EXPECT_EQ(code, find(file, index)) << index;
-        lines.push_back("ISCSIEPFile" + lookup.source + ":" + std::to_string(line) + ":" + lookup.operation + " " +
-                        message);
+        lines.push_back(lookup.source + ":" + std::to_string(line) + ":" + lookup.operation + " " + message);
         EXPECT_EQ(chain(file.path, lines), takeLog()) << index;
     };
     File missing(folder.path("missing"));
@@ -50,9 +49,8 @@ void expectFailures(const Lookup& lookup, const EPFileBuilder& valid, Find find)
     EPFileBuilder builder = valid;
     File file(folder.write("file", builder.resize(blockSize + 3 * lookup.itemSize - 1)));
     EXPECT_EQ(0, find(file, 1));
-    for (const std::uint64_t index : {std::uint64_t{2}, std::uint64_t{3}, std::uint64_t{0x100000001}}) {
-        expectFailure(file, index, 18990039, lookup.read, "Failed to read file.");
-    }
+    const std::uint64_t beyond[] = {2, 3, 0x100000001};
+    for (const auto index : beyond) expectFailure(file, index, 18990039, lookup.read, "Failed to read file.");
     for (const std::uint64_t position : {std::uint64_t{1} << 63, maximum - 2 * blockSize}) {
         expectFailure(file, position / lookup.itemSize, 18990041, lookup.seek, "Failed to seek to offset.");
     }
@@ -83,10 +81,11 @@ TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
         return code == 0 || data == "old" ? code : -1;
     };
     const EPFileBuilder map = EPFileBuilder::map();
-    expectFailures<ISCSIEPFileMAP>({"MAP.cpp", "getMapEntry", 172, 176, 180, 185, 189, 8}, map, getMapEntry);
-    expectFailures<ISCSIEPFileMAP>({"MAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8}, map, getMapEntries);
-    expectFailures<ISCSIEPFileDAT>({"DAT.cpp", "getExtentData", 69, 73, 77, 82, 87, 512}, EPFileBuilder::data(),
-                                   getExtentData);
+    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntry", 172, 176, 180, 185, 189, 8}, map, getMapEntry);
+    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8}, map,
+                                   getMapEntries);
+    expectFailures<ISCSIEPFileDAT>({"ISCSIEPFileDAT.cpp", "getExtentData", 69, 73, 77, 82, 87, 512},
+                                   EPFileBuilder::data(), getExtentData);
 }
 
 TEST(MapEntry, BitsBecomeMembersAndALine) {
