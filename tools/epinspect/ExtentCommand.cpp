@@ -39,12 +39,9 @@ void run(const ExtentOptions& options, Session& session) {
     std::string data;
     const int error = file.getExtentData(options.index, options.extentSize, data);
     if (!session.succeeded(error, options.file + ": extent " + std::to_string(options.index))) return;
-    if (options.raw) {
-        toBytes(data);
-    } else {
-        data.push_back('\n');
-    }
+    if (options.raw) toBytes(data);
     print(data);
+    if (!options.raw) print("\n");
 }
 
 }  // namespace
