@@ -35,19 +35,13 @@ void printEntry(const EntryOptions& options, std::uint64_t index, const tool::IS
 /// The entries of a range up to the first one that is not there.
 void printRange(const EntryOptions& options, Session& session, tool::ISCSIEPFileMAP& file, IndexRange range) {
     std::uint64_t next = range.first;
-    if (range.first < range.last) {
-        const auto count = range.last - range.first;  // the last one is left to the single lookup below
-        const int error = walkMap(file, range.first, count, [&](std::uint64_t index, const auto& entry) {
-            printEntry(options, index, entry);
-            next = index + 1;
-        });
-        if (error != 0 && error != tool::EP_ERR_READ_FAILED) {
-            session.succeeded(error, options.file);
-            return;
-        }
-    }
-    tool::ISCSIEPMapEntryInfo entry;
-    const int error = file.getMapEntry(next, entry);
+    int error = walkMap(file, range.first, range.last - range.first, [&](std::uint64_t index, const auto& found) {
+        printEntry(options, index, found);
+        next = index + 1;
+    });
+    tool::ISCSIEPMapEntryInfo entry;  // the last one, or the first that the walk has not met
+    if (error == 0) error = file.getMapEntry(next, entry);
+    if (error == 0 && next != range.last) error = tool::EP_ERR_READ_FAILED;  // the file grows while it is read
     if (session.succeeded(error, options.file + ": entry " + std::to_string(next))) printEntry(options, next, entry);
 }
 
