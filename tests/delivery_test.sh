@@ -20,15 +20,13 @@ cp -r "$source/examples/consumer" "$scratch/pkgconfig"
 make -s -C "$scratch/pkgconfig"
 cmake -S "$source/examples/consumer" -B "$scratch/cmake" -DCMAKE_PREFIX_PATH="$scratch/moved" >/dev/null
 cmake --build "$scratch/cmake" >/dev/null
-unset LD_LIBRARY_PATH
 "$scratch/moved/bin/epsample" "$scratch/store"
 map=$(echo "$scratch"/store/volume1/@iSCSI/LUN/*)
-for consumer in pkgconfig cmake; do
-  LD_LIBRARY_PATH=$scratch/moved/lib "$scratch/$consumer/consumer" "$map" >"$scratch/$consumer.txt"
-done
+consumed=$("$scratch/cmake/consumer" "$map")
+[ "$consumed" = "$("$scratch/pkgconfig/consumer" "$map")" ]
+unset LD_LIBRARY_PATH
 inspect=$scratch/moved/bin/epinspect
-{ "$inspect" dump "$map" && "$inspect" entry "$map" 0 | sed 's/^0: //'; } >"$scratch/expected.txt"
-diff "$scratch/expected.txt" "$scratch/pkgconfig.txt" && diff "$scratch/expected.txt" "$scratch/cmake.txt"
+[ "$consumed" = "$("$inspect" dump "$map" && "$inspect" entry "$map" 0 | sed 's/^0: //')" ] || fail "consumers differ"
 
 # Everything is opened for reading only, nothing is locked; a lookup makes four calls, a header block takes one read.
 command -v strace >/dev/null || exit 0

@@ -3,24 +3,20 @@
 
 using namespace ISCSI::TOOL;
 
-TEST(StringTools, BytesBecomeHexadecimalAndUUIDText) {
+TEST(StringTools, BytesBecomeHexadecimalAndUUIDTextAndNoBytesAreRefused) {
     const unsigned char bytes[] = {0x0a, 0xde, 0xad, 0xbe, 0xef, 0, 1, 2, 3, 4, 5, 6, 7, 0x80, 0xff, 0x9f};
-    std::string text = "old";
-    EXPECT_EQ(0, GetHexInString(bytes, 7, text));
-    EXPECT_EQ("0adeadbeef0001", text);
-    EXPECT_EQ(0, GetHexInString(bytes, 0, text));
-    EXPECT_EQ("", text);
-    EXPECT_EQ(0, GetUUIDInString(bytes, text));
-    EXPECT_EQ("0adeadbe-ef00-0102-0304-05060780ff9f", text);
-}
-
-TEST(StringTools, MissingInputIsRefusedAndLeavesTheText) {
     std::string text = "old";
     EXPECT_EQ(18990003, GetUUIDInString(nullptr, text));
     EXPECT_EQ(Lines(), takeLog());
     EXPECT_EQ(18990003, GetHexInString(nullptr, 0, text));
     EXPECT_EQ(Lines{"iSCSI:ISCSIQuorinStringTool.h:190:GetHexInString Input pointer is NULL."}, takeLog());
     EXPECT_EQ("old", text);
+    EXPECT_EQ(0, GetHexInString(bytes, 7, text));
+    EXPECT_EQ("0adeadbeef0001", text);
+    EXPECT_EQ(0, GetHexInString(bytes, 0, text));
+    EXPECT_EQ("", text);
+    EXPECT_EQ(0, GetUUIDInString(bytes, text));
+    EXPECT_EQ("0adeadbe-ef00-0102-0304-05060780ff9f", text);
 }
 
 TEST(StringTools, TimesFollowTheZoneAndAreSigned) {
