@@ -47,4 +47,4 @@ inspect extent /volume1/@iSCSI/EP/EP_DAT_00000 5200 --extent-size 1M | cut -c 1-
 inspect extent /volume1/@iSCSI/EP/EP_DAT_00000 5200 --extent-size 1M --raw | sed -n 2,3p
 
 say "JSON for scripts: the holes of the first 1024 entries, through jq"
-inspect map "$map" --count 1024 --json | sed 1d | jq -c 'select(.hole and .count > 1) | [.first, .count]'
+epinspect --root "$store" map "$map" --count 1024 --json | jq -c 'select(.hole and .count > 1) | [.first, .count]'

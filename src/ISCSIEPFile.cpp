@@ -1,7 +1,6 @@
 #include "ISCSIEPFile.h"
 
 #include <cstdlib>
-#include <cstring>
 #include <limits>
 #include <optional>
 #include <string_view>

@@ -22,10 +22,8 @@ std::string Session::targetPath(const std::string& name) const {
     return name.compare(0, 1, "/") == 0 ? name : "/" + name;
 }
 
-std::string Session::localPath(const std::string& name) const { return root_ + targetPath(name); }
-
 std::optional<std::string> Session::openablePath(const std::string& name) {
-    std::string path = localPath(name);
+    std::string path = root_ + targetPath(name);
     struct stat status = {};
     if (stat(path.c_str(), &status) == 0 && !S_ISREG(status.st_mode) && !S_ISBLK(status.st_mode)) {
         complain(name + ": neither a regular file nor a block device");

@@ -17,11 +17,9 @@ public:
     /// target.
     std::string targetPath(const std::string& name) const;
 
-    /// Where to open it here.
-    std::string localPath(const std::string& name) const;
-
-    /// localPath(), unless something lies there that is neither a regular file nor a block device: then complains,
-    /// marks the session as failed and returns nothing. What is missing is left to the library to report.
+    /// Where to open that file here, unless something lies there that is neither a regular file nor a block device:
+    /// then complains, marks the session as failed and returns nothing. What is missing is left to the library to
+    /// report.
     std::optional<std::string> openablePath(const std::string& name);
 
     /// Complains about `subject` and marks the session as failed when `error` is not 0; tells whether it is 0.
