@@ -21,7 +21,7 @@
 #include "EPFileBuilder.h"
 
 using namespace ISCSI::TOOL;
-using epsample::EPFileBuilder;
+using epbuilder::EPFileBuilder;
 
 namespace {
 
@@ -67,7 +67,7 @@ void headerFloor(benchmark::State& state) {
 const std::string& mapFile() {
     static const std::string path = [] {
         std::string entries;
-        for (std::uint64_t i = 0; i < mapEntries; ++i) entries += epsample::littleEndian(i | 1ULL << 63U, 8);
+        for (std::uint64_t i = 0; i < mapEntries; ++i) entries += epbuilder::littleEndian(i | 1ULL << 63U, 8);
         return write("map", EPFileBuilder::map().bytes(dataStart, entries));
     }();
     return path;
@@ -215,7 +215,7 @@ int main(int argc, char** argv) {
     add("header/journal", parseAndDump<ISCSIEPFileJNL>, EPFileBuilder::journal());
     add("header/map", parseAndDump<ISCSIEPFileMAP>, EPFileBuilder::map());
     add("header/map of 1024 pools", parseAndDump<ISCSIEPFileMAP>,
-        EPFileBuilder::map().set(epsample::map::seg0PoolCount, 1024));
+        EPFileBuilder::map().set(epbuilder::map::seg0PoolCount, 1024));
     add("entry/floor", singleLookupFloor);
     add("entry/single", singleLookup);
     add("entry/walk", wholeMapWalk);

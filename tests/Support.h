@@ -47,7 +47,7 @@ public:
     std::string path(const std::string& name) const { return path_ + "/" + name; }
 
     /// Writes the file `name` and returns its path.
-    std::string write(const std::string& name, const epsample::EPFileBuilder& builder) const {
+    std::string write(const std::string& name, const epbuilder::EPFileBuilder& builder) const {
         builder.write(path(name));
         return path(name);
     }

@@ -12,7 +12,7 @@
 #include "Support.h"
 
 using namespace ISCSI::TOOL;
-using epsample::EPFileBuilder;
+using epbuilder::EPFileBuilder;
 
 namespace {
 
@@ -66,10 +66,10 @@ struct Grouping : std::numpunct<char> {
 TEST(EPFile, EveryKindIsDecodedAndShownWhateverTheGlobalLocale) {
     const std::locale before = std::locale::global(std::locale(std::locale::classic(), new Grouping));
     expectKind<ISCSIEPFileTBL>(
-        EPFileBuilder::table().set(epsample::tbl::totalCount, 0xffffffffffffffff), "1", "10111213-1415-1617-1819-1a1b1c1d1e1f",
+        EPFileBuilder::table().set(epbuilder::tbl::totalCount, 0xffffffffffffffff), "1", "10111213-1415-1617-1819-1a1b1c1d1e1f",
         "================ HEAD[1] ================\nchecksum:\t\t0xa1\nextent size:\t\t1048576\nentry size:\t\t16\ntotal count:\t\t18446744073709551615\n", "ISCSIEPFileTBL.cpp:41");
     expectKind<ISCSIEPFileFRI>(
-        EPFileBuilder::freeIndex().set(epsample::head0::type, 0xffffffff), "4294967295", "20212223-2425-2627-2829-2a2b2c2d2e2f",
+        EPFileBuilder::freeIndex().set(epbuilder::head0::type, 0xffffffff), "4294967295", "20212223-2425-2627-2829-2a2b2c2d2e2f",
         "================ HEAD[1] ================\nchecksum:\t\t0xb1\nentry size:\t\t8\ntotal group count:\t0x100\n"
         "================ VAR[0]  ================\nchecksum:\t\t0xb2\ntotal free count:\t0x100000001\nindex head:\t\t77\n", "ISCSIEPFileFRI.cpp:45");
     expectKind<ISCSIEPFileDAT>(EPFileBuilder::data(), "3", "30313233-3435-3637-3839-3a3b3c3d3e3f",
@@ -103,11 +103,11 @@ TEST(EPFile, AnObjectKeepsItsSnapshotUntilReadAnew) {
     const TempDir folder;
     ISCSIEPFileTBL file(folder.write("file", EPFileBuilder::table()));
     EXPECT_EQ(0, file.parseFile());
-    folder.write("file", EPFileBuilder::table().set(epsample::tbl::entrySize, 32).resize(1000));
+    folder.write("file", EPFileBuilder::table().set(epbuilder::tbl::entrySize, 32).resize(1000));
     EXPECT_EQ(0, file.parseFile());
     EXPECT_EQ(18990039, file.readHeader());
     EXPECT_EQ(16U, file.entrySize);
-    folder.write("file", EPFileBuilder::table().set(epsample::tbl::entrySize, 33).set(epsample::head0::type, 0));
+    folder.write("file", EPFileBuilder::table().set(epbuilder::tbl::entrySize, 33).set(epbuilder::head0::type, 0));
     EXPECT_EQ(0, file.readHeader());
     EXPECT_EQ(0, file.parseFile());
     EXPECT_EQ(33U, file.entrySize);
@@ -122,8 +122,8 @@ TEST(EPFile, AnObjectKeepsItsSnapshotUntilReadAnew) {
 TEST(EPFile, PoolsAreReadAsFarAsTheBlockGoes) {
     const TempDir folder;
     for (const unsigned int stored : {0U, 3U, 1024U, 1025U, 4294967295U}) {
-        EPFileBuilder builder = EPFileBuilder::map().set(epsample::map::seg0PoolCount, stored);
-        ISCSIEPFileMAP file(folder.write("map", builder.set(epsample::map::poolUUID(1023), 0xe0)));
+        EPFileBuilder builder = EPFileBuilder::map().set(epbuilder::map::seg0PoolCount, stored);
+        ISCSIEPFileMAP file(folder.write("map", builder.set(epbuilder::map::poolUUID(1023), 0xe0)));
         EXPECT_EQ(0, file.parseFile());
         EXPECT_EQ(stored, file.seg0PoolCount);
         const std::string end = stored == 0   ? "================ SEG[0]  ================\n"

@@ -29,12 +29,12 @@ bool matches(const std::string& text, const std::string& pattern) {
 
 TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
     const TempDir folder;
-    folder.write("empty", epsample::EPFileBuilder::table().resize(0));
-    folder.write("plain", epsample::EPFileBuilder::table());
-    folder.write("mapped", epsample::EPFileBuilder::map().set(epsample::map::seg0PoolCount, 0));
+    folder.write("empty", epbuilder::EPFileBuilder::table().resize(0));
+    folder.write("plain", epbuilder::EPFileBuilder::table());
+    folder.write("mapped", epbuilder::EPFileBuilder::map().set(epbuilder::map::seg0PoolCount, 0));
     folder.write("five",
-                 epsample::EPFileBuilder::map().entry(0, 0x9000000000000000).entry(1, 0x9010000000000001).entry(4, 1));
-    folder.write("short", epsample::EPFileBuilder::map().resize(24575));
+                 epbuilder::EPFileBuilder::map().entry(0, 0x9000000000000000).entry(1, 0x9010000000000001).entry(4, 1));
+    folder.write("short", epbuilder::EPFileBuilder::map().resize(24575));
     std::ostringstream setup;
     setup << "E='" EPINSPECT_COMMAND "'; P='" EPSAMPLE_COMMAND "'; T=" << folder.path("")
           << "; S=$T/store; M=$S/volume1/@iSCSI/LUN/"

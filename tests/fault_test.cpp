@@ -13,7 +13,7 @@
 #include "Support.h"
 
 using namespace ISCSI::TOOL;
-using epsample::EPFileBuilder;
+using epbuilder::EPFileBuilder;
 
 namespace {
 

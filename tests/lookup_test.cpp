@@ -9,8 +9,8 @@
 #include "Support.h"
 
 using namespace ISCSI::TOOL;
-using epsample::EPFileBuilder;
-namespace head0 = epsample::head0;
+using epbuilder::EPFileBuilder;
+namespace head0 = epbuilder::head0;
 
 namespace {
 
@@ -121,7 +121,7 @@ TEST(MapEntry, RunsOfEntriesEndWithTheFile) {
     const TempDir folder;
     EPFileBuilder builder = EPFileBuilder::map();
     std::string content;
-    for (std::uint64_t i = 0; i < total; ++i) content += epsample::littleEndian(i, 8);
+    for (std::uint64_t i = 0; i < total; ++i) content += epbuilder::littleEndian(i, 8);
     ISCSIEPFileMAP file(folder.write("map", builder.bytes(blockSize, content + "rest")));
     using Case = std::array<std::uint64_t, 3>;
     // The last count once made the walk endless: eight times it is 0, modulo 2^64.

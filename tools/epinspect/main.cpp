@@ -8,8 +8,8 @@
 #include <exception>
 #include <system_error>
 
-#include "Commands.h"
 #include "Output.h"
+#include "commands/Commands.h"
 
 namespace {
 

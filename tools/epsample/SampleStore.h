@@ -8,6 +8,8 @@
 
 namespace epsample {
 
+using namespace epbuilder;
+
 /// Bytes of an extent of the sample store.
 inline constexpr std::uint32_t extentSize = 1048576;
 

@@ -1,4 +1,4 @@
-#include "MapRuns.h"
+#include "map/MapRuns.h"
 
 namespace epinspect {
 

@@ -5,9 +5,9 @@
 #include <memory>
 #include <string_view>
 
-#include "Commands.h"
 #include "Numbers.h"
 #include "Output.h"
+#include "commands/Commands.h"
 
 namespace epinspect {
 

@@ -4,13 +4,13 @@
 #include <limits>
 #include <memory>
 
-#include "Commands.h"
 #include "Json.h"
-#include "MapChart.h"
-#include "MapRuns.h"
-#include "MapWalk.h"
 #include "Numbers.h"
 #include "Output.h"
+#include "commands/Commands.h"
+#include "map/MapChart.h"
+#include "map/MapRuns.h"
+#include "map/MapWalk.h"
 
 namespace epinspect {
 

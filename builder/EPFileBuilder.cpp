@@ -8,7 +8,7 @@
 #include <fstream>
 #include <system_error>
 
-namespace epsample {
+namespace epbuilder {
 
 std::string littleEndian(std::uint64_t value, unsigned int width) {
     std::string bytes;
@@ -111,4 +111,4 @@ void EPFileBuilder::write(const std::string& path) const {
     }
 }
 
-}  // namespace epsample
+}  // namespace epbuilder

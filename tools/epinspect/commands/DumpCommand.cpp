@@ -4,9 +4,9 @@
 #include <string_view>
 #include <vector>
 
-#include "Commands.h"
 #include "Json.h"
 #include "Output.h"
+#include "commands/Commands.h"
 
 namespace epinspect {
 

@@ -3,11 +3,11 @@
 #include <memory>
 #include <vector>
 
-#include "Commands.h"
 #include "Json.h"
-#include "MapWalk.h"
 #include "Numbers.h"
 #include "Output.h"
+#include "commands/Commands.h"
+#include "map/MapWalk.h"
 
 namespace epinspect {
 

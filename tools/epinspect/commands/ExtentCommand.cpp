@@ -4,9 +4,9 @@
 #include <CLI/App.hpp>
 #include <memory>
 
-#include "Commands.h"
 #include "Numbers.h"
 #include "Output.h"
+#include "commands/Commands.h"
 
 namespace epinspect {
 

@@ -7,7 +7,7 @@
 #include <string>
 #include <string_view>
 
-namespace epsample {
+namespace epbuilder {
 
 /// Where a number lies in an EP file: byte offset and width (4 or 8).
 struct Field {
@@ -103,4 +103,4 @@ private:
 /// The `width` low bytes of `value`, least significant first.
 std::string littleEndian(std::uint64_t value, unsigned int width);
 
-}  // namespace epsample
+}  // namespace epbuilder

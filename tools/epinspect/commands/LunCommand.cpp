@@ -3,10 +3,10 @@
 #include <memory>
 #include <vector>
 
-#include "Commands.h"
 #include "Json.h"
 #include "Numbers.h"
 #include "Output.h"
+#include "commands/Commands.h"
 
 namespace epinspect {
 

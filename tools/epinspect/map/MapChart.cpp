@@ -1,4 +1,4 @@
-#include "MapChart.h"
+#include "map/MapChart.h"
 
 #include <langinfo.h>
 #include <sys/ioctl.h>
