@@ -22,6 +22,7 @@ struct Lookup {
     std::string source, operation;
     int header, type, open, seek, read;
     std::uint64_t itemSize;
+    bool failsAtEnd = true;
 };
 
 /// Drives one lookup into each of its failures. `find(file, index)` gives its code, or -1 when a failed call has
@@ -50,13 +51,15 @@ void expectFailures(const Lookup& lookup, const EPFileBuilder& valid, Find find)
     File file(folder.write("file", builder.resize(blockSize + 3 * lookup.itemSize - 1)));
     EXPECT_EQ(0, find(file, 1));
     const std::uint64_t beyond[] = {2, 3, 0x100000001};
-    for (const auto index : beyond) expectFailure(file, index, 18990039, lookup.read, "Failed to read file.");
+    for (const auto index : beyond) {
+        if (lookup.failsAtEnd) expectFailure(file, index, 18990039, lookup.read, "Failed to read file.");
+    }
     for (const std::uint64_t position : {std::uint64_t{1} << 63, maximum - 2 * blockSize}) {
         expectFailure(file, position / lookup.itemSize, 18990041, lookup.seek, "Failed to seek to offset.");
     }
     EXPECT_EQ(0, find(file, maximum / lookup.itemSize + 1 - blockSize / lookup.itemSize));  // position 0, modulo 2^64
     std::filesystem::resize_file(file.path, 100);                                           // HEAD[0] is known by now
-    expectFailure(file, 1, 18990039, lookup.read, "Failed to read file.");
+    if (lookup.failsAtEnd) expectFailure(file, 1, 18990039, lookup.read, "Failed to read file.");
     std::filesystem::remove(file.path);
     expectFailure(file, 1, 18990038, lookup.open, "Failed to open file.");
 }
@@ -82,7 +85,7 @@ TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
     };
     const EPFileBuilder map = EPFileBuilder::map();
     expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntry", 172, 176, 180, 185, 189, 8}, map, getMapEntry);
-    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8}, map,
+    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8, false}, map,
                                    getMapEntries);
     expectFailures<ISCSIEPFileDAT>({"ISCSIEPFileDAT.cpp", "getExtentData", 69, 73, 77, 82, 87, 512},
                                    EPFileBuilder::data(), getExtentData);
@@ -126,9 +129,10 @@ TEST(MapEntry, RunsOfEntriesEndWithTheFile) {
     using Case = std::array<std::uint64_t, 3>;
     // The last count once made the walk endless: eight times it is 0, modulo 2^64.
     for (const auto& [first, count, expected] :
-         {Case{0, 0, 0}, Case{total, 0, 0}, Case{0, 1, 1}, Case{0, 8192, 8192}, Case{5, 8193, 8193},
-          Case{0, total, total}, Case{0, total + 1, total}, Case{total - 1, maximum, 1}, Case{1, maximum, total - 1},
-          Case{total - 16384, 16385, 16384}, Case{0, std::uint64_t{1} << 63, total}}) {
+         {Case{0, 0, 0}, Case{total, 0, 0}, Case{total, 1, 0}, Case{total + 8192, maximum, 0}, Case{0, 1, 1},
+          Case{0, 8192, 8192}, Case{5, 8193, 8193}, Case{0, total, total}, Case{0, total + 1, total},
+          Case{total - 1, maximum, 1}, Case{1, maximum, total - 1}, Case{total - 16384, 16385, 16384},
+          Case{0, std::uint64_t{1} << 63, total}}) {
         std::vector<ISCSIEPMapEntryInfo> entries(7);
         EXPECT_EQ(0, file.getMapEntries(first, count, entries));
         ASSERT_EQ(expected, entries.size()) << first << ' ' << count;

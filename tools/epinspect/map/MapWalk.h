@@ -20,13 +20,11 @@ int walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, std::uint64_t first, std::uint64_
     std::vector<ISCSI::TOOL::ISCSIEPMapEntryInfo> entries;
     std::uint64_t walked = 0;
     while (walked < count) {
-        // A later block starts with the last entry of the one before, which is known to be there: so the end of the
-        // file, where nothing more comes, is told from a failed read.
-        const std::uint64_t seen = walked > 0 ? 1 : 0;
-        const std::uint64_t wanted = std::min(count - walked, blockSize) + seen;
-        const int error = file.getMapEntries(first + walked - seen, wanted, entries);
+        const std::uint64_t wanted = std::min(count - walked, blockSize);
+        const int error = file.getMapEntries(first + walked, wanted, entries);
         if (error != 0) return error;
-        for (auto i = static_cast<std::size_t>(seen); i < entries.size(); ++i) visit(first + walked++, entries[i]);
+        if (walked == 0 && entries.empty()) return ISCSI::TOOL::EP_ERR_READ_FAILED;
+        for (const auto& entry : entries) visit(first + walked++, entry);
         if (entries.size() < wanted) break;
         progress.show(walked);
     }
