@@ -103,7 +103,7 @@ void writeSampleStore(const std::string& root, std::uint64_t mapEntries) {
     const std::string volume = root + "/volume1/@iSCSI/";
     EPFileBuilder::journal().write(root + "/var/db/iscsi/EP_JNL");
     writeLunList(root + "/var/db/iscsi/luns.json");
-    EPFileBuilder::table().write(volume + "EP/EP_TBL");
+    EPFileBuilder::table().set(tbl::extentSize, extentSize).write(volume + "EP/EP_TBL");
     EPFileBuilder::freeIndex().write(volume + "EP/EP_FRI");
     writeDataFile(volume + "EP/EP_DAT_00000", 0);
     writeDataFile(volume + "EP/EP_DAT_00001", 1);
