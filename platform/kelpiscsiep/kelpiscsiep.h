@@ -8,6 +8,15 @@ extern "C" {
 /* Bytes of the LUN record that the caller provides. */
 #define KELPISCSI_LUN_RECORD_SIZE 4480
 
+/* Where its fields start; numbers are in the host's byte order, texts end with a NUL. The record may lie anywhere. */
+#define KELPISCSI_LUN_EXTENT_SIZE 20  /* 4 bytes, unsigned */
+#define KELPISCSI_LUN_SIZE 24         /* 8 bytes, unsigned */
+#define KELPISCSI_LUN_RESTORE_TIME 32 /* 4 bytes */
+#define KELPISCSI_LUN_TYPE 36         /* 4 bytes, signed */
+#define KELPISCSI_LUN_UUID 44
+#define KELPISCSI_LUN_ROOT_PATH 118
+#define KELPISCSI_LUN_NAME 4213
+
 /* Fills `record` (zeroed by the caller) with the configuration of the LUN `lid`; `reserved` is 0.
  * Returns 0, or an error code that KELPiSCSIStrError() has a text for. */
 int KELPiSCSILunGetByLid(unsigned int lid, int reserved, void* record);
