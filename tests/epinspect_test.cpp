@@ -45,7 +45,7 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
     // clang-format off
     const Case cases[] = {
         // kinds by name, by type, by choice; several files with a bad one in the middle
-        {"$E dump $S/var/db/iscsi/EP_JNL", 0, "...empty record start:\t8192\n", ""}, {"$E dump $D", 0, "...serial number:\t\t1\n", ""},
+        {"$E dump $S/var/db/iscsi/EP_JNL", 0, "...empty record start:\t6149198378188823388\n", ""}, {"$E dump $D", 0, "...serial number:\t\t1\n", ""},
         {"$E dump mapped", 0, "...================ SEG[0]  ================\n", ""}, {"$E dump plain", 0, "...create time:\t\tSun Sep 13 12:26:40 UTC 2020\n", ""},
         {"$E dump --as fri plain", 0, "...index head:\t\t0\n", ""},
         {"$E --root $S dump /volume1/@iSCSI/EP/EP_TBL $S/none $T volume1/@iSCSI/EP/EP_FRI", 1, "/volume1/@iSCSI/EP/EP_TBL:\n...index head:\t\t14830019118758024148\n", "store/none: cannot be opened (EP_ERR_OPEN_FAILED, 18990038)\nepinspect: "},
@@ -79,8 +79,8 @@ TEST(Epinspect, PrintsSaysAndExitsAsPromised) {
         {"$E extent $D 6144 --extent-size 1M", 1, "", "extent 6144: cannot be read"}, {"$E extent $D 0 --extent-size 0", 1, "", "EP_ERR_BAD_EXTENT_SIZE, 18990507"},
         {"$E extent $D 0", 2, "", "--extent-size"}, {"$E extent $D 0 --extent-size 4G", 2, "", "out of range"}, {"$E extent $D 0 --extent-size 1T", 2, "", "not a number"},
         // LUNs and paths
-        {"$E lun 1 --root $S", 0, "lid: 1 ,extent_size: 1048576 (1MB) ,size: 10737418240 (10GB) ,restore time: Sun Sep 13 12:28:40 UTC 2020 ,type: BLUN ,uuid: 6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11 ,rootpath: /volume1 ,name: lun1\n" + map, ""},
-        {"KELPISCSIEP_LUNS=$S/var/db/iscsi/luns.json $E lun --json 2 9", 1, "{\"file\":\"/volume1/@iSCSI/LUN/FILE0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000\",\"lid\":2,\"extentSize\":0,\"size\":1073741824,\"restoreTime\":0,\"type\":3,\"uuid\":\"0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522\",\"rootPath\":\"/volume1\",\"name\":\"lun2\"}\n", "epinspect: LUN 9: configuration cannot be loaded (code 9001)\n"},
+        {"$E lun 1 --root $S", 0, "lid: 1 ,extent_size: 1048576 (1MB) ,size: 4294967296 (4GB) ,restore time: Sun Sep 13 12:28:40 UTC 2020 ,type: BLUN ,uuid: 6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11 ,rootpath: /volume1 ,name: lun1\n" + map, ""},
+        {"KELPISCSIEP_LUNS=$S/var/db/iscsi/luns.json $E lun --json 2 9", 1, "{\"file\":\"/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000\",\"lid\":2,\"extentSize\":65536,\"size\":16777216,\"restoreTime\":0,\"type\":7,\"uuid\":\"0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522\",\"rootPath\":\"/volume2\",\"name\":\"lun2\"}\n", "epinspect: LUN 9: configuration cannot be loaded (code 9001)\n"},
         {"$E lun 4294967296", 2, "", "out of range"}, {"$E --root $S path map 1", 0, map, ""}, {"$E path map 1 --root $T", 1, "", "LUN 1: "},
         {"$E --root $S/ path tbl $M", 0, "/volume1/@iSCSI/EP/EP_TBL\n", ""}, {"$E path fri /volume2/x", 0, "/volume2/@iSCSI/EP/EP_FRI\n", ""}, {"$E path jnl x", 0, "/var/db/iscsi/EP_JNL\n", ""},
         {"$E path dat /volume3/x --extent-size 1M --extent-address 4194304", 0, "/volume3/@iSCSI/EP/EP_DAT_00001\n", ""}, {"$E path tbl $M", 1, "", "path names no volume (EP_ERR_NO_PATH, 18990401)"},

@@ -1,85 +1,30 @@
 #include "SampleStore.h"
 
+#include <algorithm>
+#include <array>
 #include <cerrno>
 #include <fstream>
 #include <system_error>
+
+#include "StoreFiles.h"
 
 namespace epsample {
 
 namespace {
 
-constexpr const char* lunUUID = "6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11";
+constexpr std::uint32_t extentSize1 = 1048576;
+constexpr std::uint64_t extentsPerDataFile = dataFileSpan / extentSize1;
 
-constexpr std::uint64_t extentsPerDataFile = std::uint64_t{1} << 22U;  // 4 TiB in extents of 1 MiB
+/// The entries of LUN 1 repeat after as many, but for extent addresses, which go on.
+constexpr std::uint64_t cycle = 4096;
 
-[[noreturn]] void failed(const std::string& path) { throw std::system_error(errno, std::generic_category(), path); }
-
-void appendMapEntries(const std::string& path, std::uint64_t count) {
-    std::ofstream file(path, std::ios::binary | std::ios::app);
-    std::string block;
-    for (std::uint64_t index = 0; index < count; ++index) {
-        block += littleEndian(sampleEntry(index).stored(), 8);
-        if (block.size() == 65536 || index + 1 == count) {
-            file << block;
-            block.clear();
-        }
-    }
-    file.close();
-    if (!file) failed(path);
-}
-
-void writeMapFile(const std::string& path, std::uint64_t count) {
-    std::uint64_t mapped = 0;
-    std::uint64_t synced = 0;
-    for (std::uint64_t index = 0; index < count; ++index) {
-        const MapEntry entry = sampleEntry(index);
-        mapped += entry.mapped ? 1 : 0;
-        synced += entry.synced ? 1 : 0;
-    }
-    EPFileBuilder::map()
-        .set(map::totalCount, count)
-        .set(map::mappedCount, mapped)
-        .set(map::syncCount, synced)
-        .write(path);
-    appendMapEntries(path, count);
-}
-
-/// A data file of 6 GiB of extents, a few of them with their own number as content, again and again.
-void writeDataFile(const std::string& path, unsigned int serialNumber) {
-    EPFileBuilder file = EPFileBuilder::data();
-    file.set(dat::serialNumber, serialNumber);
-    for (const std::uint64_t extent : {0U, 1U, 2047U, 2048U, 4095U, 4096U, 5200U}) {
-        std::string text = "file " + std::to_string(serialNumber) + " extent " + std::to_string(extent) + "\n";
-        text.resize(32, '.');
-        std::string content;
-        while (content.size() < 4096) content += text;
-        file.bytes(headerBlockSize + extent * extentSize, content);
-    }
-    file.resize(headerBlockSize + std::uint64_t{6144} * extentSize).write(path);
-}
-
-void writeLunList(const std::string& path) {
-    std::ofstream file(path, std::ios::trunc);
-    file << R"([
-  {"lid": 1, "extentSize": 1048576, "size": 10737418240, "restoreTime": 1600000120, "type": 263,
-   "uuid": ")"
-         << lunUUID << R"(", "rootPath": "/volume1", "name": "lun1"},
-  {"lid": 2, "extentSize": 0, "size": 1073741824, "restoreTime": 0, "type": 3,
-   "uuid": "0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522", "rootPath": "/volume1", "name": "lun2"}
-]
-)";
-    file.close();
-    if (!file) failed(path);
-}
-
-}  // namespace
-
-MapEntry sampleEntry(std::uint64_t index) {
-    const std::uint64_t period = index / 1024;
+/// The entry `index` of LUN 1: runs, holes and fragments. An extent address is the index itself, within a stretch of
+/// fragments the stretch counted from its end; those of pool 16 lie a data file further on. So none occurs twice.
+MapEntry entryOfLun1(std::uint64_t index) {
     const std::uint64_t place = index % 1024;
-    MapEntry entry;
     const bool fragment = place >= 896;
-    if (period % 4 == 2 || (place >= 400 && place < 512) || (place >= 800 && place < 896) ||
+    MapEntry entry;
+    if (index / 1024 % 4 == 2 || (place >= 400 && place < 512) || (place >= 800 && place < 896) ||
         (fragment && place % 2 == 1)) {
         return entry;
     }
@@ -87,27 +32,98 @@ MapEntry sampleEntry(std::uint64_t index) {
     entry.extentAddress = index;
     if (place < 400) {
         entry.synced = true;
-    } else if (place < 768) {
+    } else if (place < 512 + 256) {
         entry.poolNumber = 16;
         entry.extentAddress = extentsPerDataFile + index;
     } else if (place < 800) {
         entry.vpushed = true;
         entry.vpulled = place >= 784;
     } else {
-        entry.extentAddress = 2 * index;
+        entry.extentAddress = index - place + (896 + 1023 - place);
     }
     return entry;
 }
 
+EPFileBuilder mapHeaderOfLun1(std::uint64_t entries) {
+    std::uint64_t mapped = 0;
+    std::uint64_t synced = 0;
+    for (std::uint64_t index = 0; index < cycle; ++index) {
+        const std::uint64_t times = entries / cycle + (index < entries % cycle ? 1 : 0);
+        const MapEntry entry = entryOfLun1(index);
+        mapped += entry.mapped ? times : 0;
+        synced += entry.synced ? times : 0;
+    }
+    return mapFile(entries, mapped, synced);
+}
+
+/// Writes the entries of LUN 1 behind the header block, a cycle at a time.
+void writeEntriesOfLun1(const std::string& path, std::uint64_t entries) {
+    std::array<std::uint64_t, cycle> stored{};
+    std::array<std::uint64_t, cycle> step{};
+    for (std::size_t i = 0; i < cycle; ++i) {
+        const MapEntry entry = entryOfLun1(i);
+        stored[i] = entry.stored();
+        step[i] = entry.mapped ? cycle : 0;
+    }
+    std::ofstream file(path, std::ios::binary | std::ios::in | std::ios::out);
+    file.seekp(static_cast<std::streamoff>(headerBlockSize));
+    std::array<char, 8 * cycle> block{};
+    for (std::uint64_t first = 0; first < entries && file; first += cycle) {
+        char* byte = block.data();
+        for (std::size_t i = 0; i < cycle; ++i) {
+            for (unsigned int shift = 0; shift < 64; shift += 8) *byte++ = static_cast<char>(stored[i] >> shift);
+            stored[i] += step[i];
+        }
+        file.write(block.data(), static_cast<std::streamsize>(8 * std::min(entries - first, cycle)));
+    }
+    file.close();
+    if (!file) throw std::system_error(errno, std::generic_category(), path);
+}
+
+/// Writes volume 1, all for LUN 1.
+void writeVolume1(const std::string& root, const Lun& lun, std::uint64_t entries) {
+    const std::string folder = root + epFolder(1);
+    const std::uint64_t dataFiles = 2 + (entries > 0 ? (entries - 1) / extentsPerDataFile : 0);
+    tableFile(extentSize1, dataFiles).write(folder + "EP_TBL");
+    EPFileBuilder::freeIndex().write(folder + "EP_FRI");
+    for (std::uint64_t number = 0; number < dataFiles; ++number) {
+        const std::uint64_t used = number == 0 ? entries : entries - (number - 1) * extentsPerDataFile;
+        const std::uint64_t extents = std::clamp<std::uint64_t>(used, 6144, extentsPerDataFile);
+        dataFile(number, extentSize1, extents, {0, 1, 514, 2047, 2048, 4095, 4096, 5200})
+            .write(folder + dataFileName(number));
+    }
+    const std::string mapPath = root + mapFilePath(lun);
+    mapHeaderOfLun1(entries).write(mapPath);
+    writeEntriesOfLun1(mapPath, entries);
+}
+
+/// Writes volume 2, all for LUN 2: of its 256 entries some runs, and one backwards.
+void writeVolume2(const std::string& root, const Lun& lun) {
+    const std::string folder = root + epFolder(2);
+    constexpr std::uint64_t entries = 256;
+    tableFile(lun.extentSize, 1).write(folder + "EP_TBL");
+    EPFileBuilder::freeIndex().write(folder + "EP_FRI");
+    dataFile(0, lun.extentSize, 256, {16, 80, 128, 175}).write(folder + dataFileName(0));
+    EPFileBuilder map = mapFile(entries, 64 + 16 + 48, 64 + 48);
+    map.set(head0::uuid, 0x41);
+    for (std::uint64_t i = 0; i < 64; ++i) map.entry(i, MapEntry{16 + i, 32, true, false, false, true}.stored());
+    for (std::uint64_t i = 0; i < 16; ++i) map.entry(128 + i, MapEntry{95 - i, 32, true, false, true, false}.stored());
+    for (std::uint64_t i = 0; i < 48; ++i) map.entry(144 + i, MapEntry{128 + i, 0, true, true, false, true}.stored());
+    map.write(root + mapFilePath(lun));
+}
+
+}  // namespace
+
 void writeSampleStore(const std::string& root, std::uint64_t mapEntries) {
-    const std::string volume = root + "/volume1/@iSCSI/";
+    const std::vector<Lun> luns = {
+        {1, extentSize1, mapEntries * extentSize1, 1600000120, 263, "BLUN", "6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11",
+         "/volume1", "lun1"},
+        {2, 65536, 256 * 65536, 0, 7, "THIN", "0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522", "/volume2", "lun2"},
+    };
     EPFileBuilder::journal().write(root + "/var/db/iscsi/EP_JNL");
-    writeLunList(root + "/var/db/iscsi/luns.json");
-    EPFileBuilder::table().set(tbl::extentSize, extentSize).write(volume + "EP/EP_TBL");
-    EPFileBuilder::freeIndex().write(volume + "EP/EP_FRI");
-    writeDataFile(volume + "EP/EP_DAT_00000", 0);
-    writeDataFile(volume + "EP/EP_DAT_00001", 1);
-    writeMapFile(volume + "LUN/BLUN" + lunUUID + "lun1_00000", mapEntries);
+    writeLunList(root, luns);
+    writeVolume1(root, luns[0], mapEntries);
+    writeVolume2(root, luns[1]);
 }
 
 }  // namespace epsample
