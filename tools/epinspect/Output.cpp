@@ -134,14 +134,14 @@ std::string wrapped(std::string_view text, unsigned int width, unsigned int inde
     };
     std::string result;
     std::string line;
-    for (;;) {
+    for (bool first = true;; first = false) {
         const auto end = std::min(text.find(gap), text.size());
         const auto piece = text.substr(0, end);
-        if (!line.empty() && columns(line) + columns(gap) + columns(piece) > static_cast<std::ptrdiff_t>(width)) {
+        if (!first && columns(line) + columns(gap) + columns(piece) > static_cast<std::ptrdiff_t>(width)) {
             result.append(line).append("\n");
             line.assign(indent, ' ').append(piece);
         } else {
-            line.append(line.empty() ? "" : gap).append(piece);
+            line.append(first ? "" : gap).append(piece);
         }
         if (end == text.size()) return result + line + "\n";
         text.remove_prefix(end + gap.size());

@@ -3,6 +3,7 @@
 #include <sys/stat.h>
 
 #include <ISCSIEPFile.h>
+#include <cerrno>
 #include <cstdlib>
 #include <filesystem>
 #include <system_error>
@@ -111,6 +112,8 @@ std::optional<std::string> Session::openablePath(const std::string& name) {
     fail({name, ""}, refusal, tool::EP_ERR_OPEN_FAILED);
     return std::nullopt;
 }
+
+bool Session::succeeded(int error, const Subject& subject) { return succeeded(error, subject, errno); }
 
 bool Session::succeeded(int error, const Subject& subject, int reason) {
     if (error != 0) fail(subject, whatFailed(error, reason), error);

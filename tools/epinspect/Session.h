@@ -1,7 +1,6 @@
 // What holds for a whole run of epinspect: the options every subcommand takes, where files are, and how it went so far.
 #pragma once
 
-#include <cerrno>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -37,9 +36,12 @@ public:
     /// returns nothing. What is missing is left to the library to find.
     std::optional<std::string> openablePath(const std::string& name);
 
-    /// Reports the failure of a call of the library when `error` is not 0; `reason` is what it left in errno. Returns
-    /// whether `error` is 0.
-    bool succeeded(int error, const Subject& subject, int reason = errno);
+    /// Reports the failure of a call of the library, right after it (the system's reason is still in errno), when
+    /// `error` is not 0. Returns whether it is 0.
+    bool succeeded(int error, const Subject& subject);
+
+    /// The same later; `reason` is what the call left in errno.
+    bool succeeded(int error, const Subject& subject, int reason);
 
     /// Reports a failure of this program's own making, under the library's code that fits.
     void fail(const Subject& subject, std::string_view what, int error);

@@ -20,7 +20,7 @@ struct DumpOptions {
 
 /// The kind that the type in HEAD[0] of the file at `path` tells, and HEAD[0] alone when it tells none; null after a
 /// failure.
-const FileKind* kindByType(Session& session, const std::string& name, const std::string& path) {
+const FileKind* kindFromType(Session& session, const std::string& name, const std::string& path) {
     tool::ISCSIEPFile head(path);
     if (!session.succeeded(head.parseHead0(), {name, ""})) return nullptr;
     const FileKind* kind = kindByType(head.head0Type);
@@ -34,7 +34,7 @@ void dumpFile(const DumpOptions& options, Session& session, const std::string& n
     if (!path) return;
     const FileKind* byName = options.kind == nullptr ? kindByName(session.targetPath(name)) : nullptr;
     const FileKind* kind = options.kind != nullptr ? options.kind : byName;
-    if (kind == nullptr) kind = kindByType(session, name, *path);
+    if (kind == nullptr) kind = kindFromType(session, name, *path);
     if (kind == nullptr) return;
     const auto file = kind->make(*path);
     if (!session.succeeded(kind->parse(*file), {name, ""})) return;

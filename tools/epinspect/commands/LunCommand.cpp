@@ -24,13 +24,13 @@ void printLun(const Session& session, const Lun& lun) {
 }
 
 void printLuns(Session& session, Range range) {
+    const auto print = [&session](const Lun& lun) { printLun(session, lun); };
+    if (range.first < range.last && forEachLun(session, range, print)) return;
+    std::optional<QuietLog> quiet;
+    if (range.first < range.last) quiet.emplace();
+    // A single id; or none of the range exists, and the first one tells why.
     Lun lun;
-    if (range.first < range.last &&
-        forEachLun(session, range, [&session](const Lun& found) { printLun(session, found); })) {
-        return;
-    }
-    // A single id; or none of a range exists, and the first one tells why.
-    if (loadLun(session, static_cast<std::uint32_t>(range.first), lun)) printLun(session, lun);
+    if (session.succeeded(loadLun(static_cast<std::uint32_t>(range.first), lun), subjectOf(range))) print(lun);
 }
 
 }  // namespace

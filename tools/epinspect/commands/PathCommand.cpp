@@ -54,7 +54,9 @@ void addPath(Command& parent, Session& session) {
         .argument("LID", "LUN id", options->lid, parseNumber32)
         .action([options, &session] {
             Lun lun;
-            if (loadLun(session, options->lid, lun)) print(forReader(lun.mapPath) + "\n");
+            if (session.succeeded(loadLun(options->lid, lun), subjectOf({options->lid, options->lid}))) {
+                print(forReader(lun.mapPath) + "\n");
+            }
         });
     addKind(path, session, options, "dat", "The data file that holds an extent address",
             [options](const ISCSIEPFile& file, std::string& result) {

@@ -11,20 +11,14 @@ namespace epinspect {
 
 namespace tool = ISCSI::TOOL;
 
-namespace {
-
-Subject subjectOf(std::uint32_t lid) { return {"", "LUN " + std::to_string(lid)}; }
-
-int load(std::uint32_t lid, Lun& lun) {
+int loadLun(std::uint32_t lid, Lun& lun) {
     lun.record = tool::ISCSILUNConfInfo(lid);
     const int error = lun.record.loadFromConfig();
     return error != 0 ? error : tool::ISCSIEPFileMAP().getMAPFilePath(lid, lun.mapPath);
 }
 
-}  // namespace
-
-bool loadLun(Session& session, std::uint32_t lid, Lun& lun) {
-    return session.succeeded(load(lid, lun), subjectOf(lid));
+Subject subjectOf(Range lids) {
+    return {"", "LUN " + std::to_string(lids.first) + (lids.first == lids.last ? "" : "-" + std::to_string(lids.last))};
 }
 
 bool forEachLun(Session& session, Range range, const std::function<void(const Lun&)>& each) {
@@ -32,15 +26,15 @@ bool forEachLun(Session& session, Range range, const std::function<void(const Lu
     Progress progress("LUN ids", range.last - range.first + 1, Progress::Beside::listing);
     Lun lun;
     // Which code stands for "no such LUN" is the platform's secret; the largest id, which no LUN has, tells it.
-    const int noSuchLun = load(std::numeric_limits<std::uint32_t>::max(), lun);
+    const int noSuchLun = loadLun(std::numeric_limits<std::uint32_t>::max(), lun);
     bool met = false;
     for (std::uint64_t id = range.first; id <= range.last; ++id) {
         const auto lid = static_cast<std::uint32_t>(id);
-        const int error = load(lid, lun);
+        const int error = loadLun(lid, lun);
         progress.show(id - range.first);
         if (error == noSuchLun && error != 0) continue;
         met = true;
-        if (session.succeeded(error, subjectOf(lid))) each(lun);
+        if (session.succeeded(error, subjectOf({id, id}))) each(lun);
     }
     return met;
 }

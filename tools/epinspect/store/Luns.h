@@ -18,8 +18,11 @@ struct Lun {
     std::string mapPath;
 };
 
-/// Loads the LUN `lid`. Returns whether it exists; reports why not.
-bool loadLun(Session& session, std::uint32_t lid, Lun& lun);
+/// Loads the LUN `lid`. Returns 0 or the code of the platform's library.
+int loadLun(std::uint32_t lid, Lun& lun);
+
+/// How messages name LUNs.
+Subject subjectOf(Range lids);
 
 /// Calls each() for the LUNs whose ids are in `range`, lowest id first. Ids that no LUN has are passed over, other
 /// failures are reported. Returns whether there was a LUN or a failure.
