@@ -34,8 +34,8 @@ Json::Json(const std::string& file) : file_(",\"file\":" + (file.empty() ? "null
 
 Json& Json::begin(const char* kind) {
     line_.clear();
-    line_.add("{\"kind\":\"").add(kind).add("\"").add(file_);
-    separator_ = ",";
+    line_.add("{\"kind\":\"", kind, "\"", file_);
+    inner_ = true;
     return *this;
 }
 
@@ -53,42 +53,48 @@ Json& Json::text(std::string_view name, std::string_view value) {
 Json& Json::texts(std::string_view name, const std::vector<std::string>& values) {
     beginList(name);
     for (const std::string& value : values) {
-        line_.add(separator_).add(escaped(value));
-        separator_ = ",";
+        anyKey({});
+        line_.add(escaped(value));
     }
     return endList();
+}
+
+Json& Json::ready(std::string_view members) {
+    line_.add(inner_ ? "," : "", members);
+    inner_ = true;
+    return *this;
 }
 
 Json& Json::beginObject(std::string_view name) {
     anyKey(name);
     line_.add("{");
-    separator_ = "";
+    inner_ = false;
     return *this;
 }
 
 Json& Json::endObject() {
     line_.add("}");
-    separator_ = ",";
+    inner_ = true;
     return *this;
 }
 
 Json& Json::beginList(std::string_view name) {
     anyKey(name);
     line_.add("[");
-    separator_ = "";
+    inner_ = false;
     return *this;
 }
 
 Json& Json::endList() {
     line_.add("]");
-    separator_ = ",";
+    inner_ = true;
     return *this;
 }
 
 void Json::anyKey(std::string_view name) {
-    line_.add(separator_);
-    separator_ = ",";
-    if (!name.empty()) line_.add("\"").add(name).add("\":");
+    if (inner_) line_.add(",");
+    inner_ = true;
+    if (!name.empty()) line_.add("\"", name, "\":");
 }
 
 }  // namespace epinspect

@@ -63,6 +63,9 @@ public:
     Json& text(std::string_view name, std::string_view value);
     Json& texts(std::string_view name, const std::vector<std::string>& values);
 
+    /// Members that are JSON already: "name":value, and so on.
+    Json& ready(std::string_view members);
+
     /// Objects and lists inside the object; elements of a list are objects without a name.
     Json& beginObject(std::string_view name = {});
     Json& endObject();
@@ -72,15 +75,15 @@ public:
 private:
     template <std::size_t keySize>
     void key(const char (&name)[keySize]) {
-        line_.add(separator_).add("\"").add({name, keySize - 1}).add("\":");
-        separator_ = ",";
+        line_.add(inner_ ? ",\"" : "\"", std::string_view(name, keySize - 1), "\":");
+        inner_ = true;
     }
 
     void anyKey(std::string_view name);
 
     std::string file_;  ///< the member "file", and "fileHex" where it is needed, ready to be written
     Text line_;
-    std::string_view separator_;
+    bool inner_ = false;  ///< something precedes what comes next
 };
 
 }  // namespace epinspect

@@ -13,33 +13,48 @@ namespace epinspect {
 /// Appends to a buffer that stays from line to line; numbers do not follow the locale.
 class Text {
 public:
-    Text& add(std::string_view text) {
-        std::memcpy(room(text.size()), text.data(), text.size());
-        size_ += text.size();
-        return *this;
+    template <typename... Pieces>
+    Text& add(const Pieces&... pieces) {
+        return addViews(std::string_view(pieces)...);
     }
 
-    Text& decimal(std::uint64_t number) { return digits(number, 10); }
-    Text& hexadecimal(std::uint64_t number) { return add("0x").digits(number, 16); }
+    Text& decimal(std::uint64_t number) {
+        reserve(longestNumber);
+        return to(std::to_chars(end(), end() + longestNumber, number).ptr);
+    }
+
+    Text& hexadecimal(std::uint64_t number) {
+        add("0x").reserve(longestNumber);
+        return to(std::to_chars(end(), end() + longestNumber, number, 16).ptr);
+    }
 
     std::string_view view() const { return {buffer_.data(), size_}; }
     void clear() { size_ = 0; }
 
 private:
-    Text& digits(std::uint64_t number, int base) {
-        constexpr std::size_t longest = 20;
-        char* begin = room(longest);
-        size_ += static_cast<std::size_t>(std::to_chars(begin, begin + longest, number, base).ptr - begin);
+    static constexpr std::size_t longestNumber = 20;
+
+    template <typename... Views>
+    Text& addViews(const Views&... views) {
+        reserve((views.size() + ...));
+        ((std::memcpy(end(), views.data(), views.size()), size_ += views.size()), ...);
         return *this;
     }
 
-    /// Where the next `count` characters go.
-    char* room(std::size_t count) {
-        if (buffer_.size() - size_ < count) buffer_.resize(2 * (size_ + count));
-        return &buffer_[size_];
+    char* end() { return &buffer_[size_]; }
+
+    Text& to(const char* newEnd) {
+        size_ = static_cast<std::size_t>(newEnd - buffer_.data());
+        return *this;
     }
 
-    std::string buffer_ = std::string(256, '\0');
+    void reserve(std::size_t count) {
+        if (buffer_.size() - size_ < count) grow(count);
+    }
+
+    [[gnu::noinline]] void grow(std::size_t count) { buffer_.resize(2 * (size_ + count)); }
+
+    std::string buffer_ = std::string(512, '\0');
     std::size_t size_ = 0;
 };
 

@@ -1,6 +1,23 @@
 #include "map/MapOutput.h"
 
+#include <array>
+
 namespace epinspect {
+
+namespace {
+
+/// The members of the flags, for each value of flagsOf(): the same few texts by the million.
+std::array<std::string, 16> flagMembers() {
+    std::array<std::string, 16> texts;
+    for (unsigned int flags = 0; flags < texts.size(); ++flags) {
+        const auto value = [flags](unsigned int bit) { return (flags & bit) != 0 ? "true" : "false"; };
+        texts[flags] = std::string("\"mapped\":") + value(1) + ",\"vpushed\":" + value(2) + ",\"vpulled\":" + value(4) +
+                       ",\"synced\":" + value(8);
+    }
+    return texts;
+}
+
+}  // namespace
 
 void writeRange(Text& text, std::uint64_t first, std::uint64_t count) {
     text.decimal(first);
@@ -23,12 +40,10 @@ void writeRun(Text& text, const MapRun& run) {
 }
 
 void writeMembers(Json& object, const MapEntry& entry) {
+    static const auto flags = flagMembers();
     object.number("extentAddress", entry.extentAddress)
         .number("poolNumber", entry.poolNumber)
-        .boolean("mapped", entry.mapped)
-        .boolean("vpushed", entry.vpushed)
-        .boolean("vpulled", entry.vpulled)
-        .boolean("synced", entry.synced);
+        .ready(flags[flagsOf(entry)]);
 }
 
 void writeRun(Json& object, const MapRun& run, std::uint64_t entryOffset) {
