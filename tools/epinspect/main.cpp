@@ -23,6 +23,7 @@ int run(int argc, char** argv) {
     program.group("Entries of a map");
     addMap(program, session);
     addEntry(program, session);
+    addDiff(program, session);
     program.group("Bytes");
     addExtent(program, session);
     program.group("Configuration and paths");

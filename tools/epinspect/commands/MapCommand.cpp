@@ -7,8 +7,8 @@
 #include "commands/Commands.h"
 #include "map/MapChart.h"
 #include "map/MapOutput.h"
-#include "map/MapWalk.h"
-#include "store/Doubts.h"
+#include "map/RunWalk.h"
+#include "store/OpenMap.h"
 
 namespace epinspect {
 
@@ -50,38 +50,16 @@ void printSummary(Json& json, const MapSummary& summary) {
         .end();
 }
 
-/// Walks `range`, which the file held when its entries were counted, and gives the runs to each(run). Returns whether
-/// all entries were still there.
-template <typename Each>
-bool walkRuns(const MapOptions& options, Session& session, tool::ISCSIEPFileMAP& file, Range range, Each&& each) {
-    Progress progress("entries", range.last - range.first + 1,
-                      options.chart ? Progress::Beside::nothing : Progress::Beside::listing);
-    MapRuns runs;
-    const WalkEnd end = walkMap(file, range, progress,
-                                [&](std::uint64_t index, const auto& entries) { runs.add(index, entries, each); });
-    runs.finish(each);
-    const std::uint64_t next = range.first + end.met;
-    const Subject place = {options.file, "entry " + std::to_string(next)};
-    if (!session.succeeded(end.error, place, end.reason)) return false;
-    if (next - 1 == range.last) return true;
-    session.fail(place, "the file has become shorter while it was read", tool::EP_ERR_READ_FAILED);
-    return false;
-}
-
 void run(const MapOptions& options, Session& session) {
-    const std::optional<std::string> path = session.openablePath(options.file);
-    if (!path) return;
-    tool::ISCSIEPFileMAP file(*path);
-    unsigned long long total = 0;
-    if (!session.succeeded(file.parseHead0(), {options.file, ""})) return;
-    if (!session.succeeded(file.getEntryCount(total), {options.file, ""})) return;
-    sayDataStartDoubts(file, options.file);
-    sayPartialEntry(file, options.file);
+    const OpenedMap map = openMap(session, options.file);
+    if (!map.file) return;
+    tool::ISCSIEPFileMAP& file = *map.file;
+    const std::uint64_t total = map.entries;
     if (options.first > 0 && options.first >= total) {
         session.failBeyondEnd(options.file, "entry " + std::to_string(options.first), total);
         return;
     }
-    const std::uint64_t count = std::min<std::uint64_t>(options.count, total - options.first);
+    const std::uint64_t count = std::min(options.count, total - options.first);
     const unsigned int width = options.chart ? outputWidth() : std::numeric_limits<unsigned int>::max();
     MapChart chart(options.first, count, width);
     MapSummary summary;
@@ -100,7 +78,9 @@ void run(const MapOptions& options, Session& session) {
             print(line.view());
         }
     };
-    if (count > 0 && !walkRuns(options, session, file, {options.first, options.first + count - 1}, each)) return;
+    const auto beside = options.chart ? Progress::Beside::nothing : Progress::Beside::listing;
+    const Range range = {options.first, options.first + count - 1};
+    if (count > 0 && !walkRuns(session, options.file, file, range, beside, each)) return;
     if (options.chart) print(chart.draw(outputIsUnicode()));
     if (session.json) {
         printSummary(json, summary);
