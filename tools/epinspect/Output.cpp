@@ -127,6 +127,10 @@ std::string printable(std::string_view text) {
 
 std::string forReader(std::string_view text) { return outputIsTerminal() ? printable(text) : std::string(text); }
 
+std::string counted(std::uint64_t count, const char* one, const char* several) {
+    return std::to_string(count) + " " + (count == 1 ? one : several);
+}
+
 std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap) {
     const auto columns = [](std::string_view piece) {  // every character of our own texts is one column wide
         return std::count_if(piece.begin(), piece.end(),

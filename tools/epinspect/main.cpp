@@ -24,6 +24,7 @@ int run(int argc, char** argv) {
     addMap(program, session);
     addEntry(program, session);
     addDiff(program, session);
+    addFind(program, session);
     program.group("Bytes");
     addExtent(program, session);
     program.group("Configuration and paths");

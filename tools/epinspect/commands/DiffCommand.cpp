@@ -69,7 +69,7 @@ void printRun(Json& json, const std::string& otherFile, const DiffRun& run) {
 }
 
 void printSummary(const DiffSummary& summary) {
-    const std::string entries = std::to_string(summary.entries) + (summary.entries == 1 ? " entry: " : " entries: ");
+    const std::string entries = counted(summary.entries, "entry", "entries") + ": ";
     if (summary.same() == summary.entries) {
         print(entries + "no difference\n");
         return;

@@ -23,10 +23,6 @@ struct MapOptions {
     bool chart = false;
 };
 
-std::string counted(std::uint64_t count, const char* one, const char* several) {
-    return std::to_string(count) + " " + (count == 1 ? one : several);
-}
-
 void printSummary(const MapSummary& summary, unsigned int width) {
     const std::string text =
         counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
