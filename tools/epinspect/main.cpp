@@ -20,6 +20,7 @@ int run(int argc, char** argv) {
     Command& program = line.program();
     program.group("Files of a store");
     addDump(program, session);
+    addCheck(program, session);
     program.group("Entries of a map");
     addMap(program, session);
     addEntry(program, session);

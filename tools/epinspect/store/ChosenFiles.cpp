@@ -39,7 +39,7 @@ void ChosenFiles::forEach(const std::function<void(const StoreFile&)>& each) {
 
 const Lun* ChosenFiles::lunOf(const std::string& targetPath) const {
     for (const Lun& lun : luns_) {
-        if (fs::path("/" + lun.mapPath).lexically_normal() == targetPath) return &lun;
+        if (plainPath(lun.mapPath) == targetPath) return &lun;
     }
     return nullptr;
 }

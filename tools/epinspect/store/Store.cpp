@@ -10,6 +10,7 @@
 
 #include "SystemLog.h"
 #include "store/FileSize.h"
+#include "store/Folder.h"
 
 namespace epinspect {
 
@@ -20,9 +21,6 @@ namespace {
 
 constexpr std::uint64_t journalPlace = 0;
 constexpr std::uint64_t noVolumePlace = std::numeric_limits<std::uint64_t>::max();
-
-/// The path of the target as the folders lead there: absolute, without doubled slashes and dots.
-std::string plainPath(const std::string& path) { return fs::path("/" + path).lexically_normal().string(); }
 
 /// The number in the name of a volume's folder, 0 when it is not "volume" and a number in plain form.
 std::uint32_t volumeIn(std::string_view name) {
@@ -44,15 +42,10 @@ bool isUUID(std::string_view text) {
     return text.size() == 36;
 }
 
-/// Calls each(entry) for what lies in the folder at `path` of the target, which may be missing.
+/// Calls each(entry) for what lies in the folder at `path` of the target, which may be missing. Reports failures.
 template <typename Each>
-void listFolder(Session& session, const std::string& path, Each&& each) {
-    const std::optional<std::string> folder = session.openableFolder(path);
-    if (!folder) return;
-    std::error_code error;
-    fs::directory_iterator entry(*folder, error);
-    for (; !error && entry != fs::directory_iterator(); entry.increment(error)) each(*entry);
-    if (error == std::errc::no_such_file_or_directory) return;
+void visitFolder(Session& session, const std::string& path, Each&& each) {
+    const std::error_code error = listFolder(session, path, each);
     session.succeeded(error ? tool::EP_ERR_OPEN_FAILED : 0, {path, ""}, error.value());
 }
 
@@ -66,6 +59,8 @@ bool precedes(const std::string& one, const std::string& other) {
 }
 
 }  // namespace
+
+std::string plainPath(const std::string& path) { return fs::path("/" + path).lexically_normal().string(); }
 
 std::optional<MapName> mapNameIn(std::string_view fileName) {
     static constexpr std::string_view end = "_00000";
@@ -103,7 +98,7 @@ Store::Store(Session& session, Range lids) : session_(session) {
         if (file.getTBLFilePath(path) == 0) expect(path);
         if (file.getFRIFilePath(path) == 0) expect(path);
     }
-    listFolder(session, "/", [this](const fs::directory_entry& entry) {
+    visitFolder(session, "/", [this](const fs::directory_entry& entry) {
         const std::string name = entry.path().filename().string();
         const std::uint32_t volume = volumeIn(name);
         if (volume == 0) return;
@@ -119,7 +114,7 @@ void Store::expect(const std::string& path) {
 }
 
 std::vector<std::string> Store::namesIn(const std::string& folder, std::set<std::string> names) {
-    listFolder(session_, folder, [&](const fs::directory_entry& entry) {
+    visitFolder(session_, folder, [&](const fs::directory_entry& entry) {
         std::error_code error;
         std::string name = entry.path().filename().string();
         if (kindByName(folder + "/" + name) != nullptr && !entry.is_directory(error)) names.insert(std::move(name));

@@ -19,6 +19,9 @@
 
 namespace epinspect {
 
+/// The path of the target as the folders lead there: absolute, without doubled slashes and dots.
+std::string plainPath(const std::string& path);
+
 /// What the name of a LUN's map file is made of.
 struct MapName {
     std::string typeName;
