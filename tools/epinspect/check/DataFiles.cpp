@@ -48,7 +48,11 @@ void DataFiles::list() {
     const auto error = listFolder(session_, folder_, [this](const std::filesystem::directory_entry& entry) {
         const std::string name = entry.path().filename().string();
         const auto number = dataFileNumberIn(name);
-        if (number && name == nameOf(*number)) files_[*number];
+        if (!number || name != nameOf(*number)) return;
+        std::error_code unknown;
+        const bool canBeRead = entry.is_regular_file(unknown) || entry.is_block_file(unknown);
+        File& file = files_[*number];
+        if (!canBeRead && !reports_) file.state = State::unreadable;
     });
     listed_ = !error;
     if (error && reports_) session_.succeeded(tool::EP_ERR_OPEN_FAILED, {folder_, ""}, error.value());

@@ -45,13 +45,13 @@ bool checkKind(const StoreFile& file, const tool::ISCSIEPFile& content, Report& 
 void checkDataStart(const StoreFile& file, const tool::ISCSIEPFile& content, Report& report) {
     const Value stored = Value::hexadecimal(content.head0DataStartOffset);
     if (content.head0DataStartOffset < tool::EP_HEADER_BLOCK_SIZE) {
-        report.add({file.path, "data-start", stored, Value::number(tool::EP_HEADER_BLOCK_SIZE),
-                    stored.shown() + ", inside the header block of " + std::to_string(tool::EP_HEADER_BLOCK_SIZE) +
-                        " bytes"});
+        report.add(
+            {file.path, "data-start", stored, Value::number(tool::EP_HEADER_BLOCK_SIZE),
+             stored.shown() + ", inside the header block of " + std::to_string(tool::EP_HEADER_BLOCK_SIZE) + " bytes"});
     } else if (content.head0DataStartOffset > file.size) {
-        report.add({file.path, "data-start", stored, Value::number(file.size),
-                    stored.shown() + ", behind the end of the file, which has " + std::to_string(file.size) +
-                        " bytes"});
+        report.add(
+            {file.path, "data-start", stored, Value::number(file.size),
+             stored.shown() + ", behind the end of the file, which has " + std::to_string(file.size) + " bytes"});
     }
 }
 
@@ -69,11 +69,13 @@ void CommonValues::check(Report& report) const {
 }
 
 void CommonValues::checkMagic(Report& report) const {
-    checkAgainstMost(rows_, "magic", [](const Row& row) { return Value::hexadecimal(row.magic); }, report);
+    checkAgainstMost(
+        rows_, "magic", [](const Row& row) { return Value::hexadecimal(row.magic); }, report);
 }
 
 void CommonValues::checkVersion(Report& report) const {
-    checkAgainstMost(rows_, "version", [](const Row& row) { return Value::number(row.version); }, report);
+    checkAgainstMost(
+        rows_, "version", [](const Row& row) { return Value::number(row.version); }, report);
 }
 
 }  // namespace epinspect

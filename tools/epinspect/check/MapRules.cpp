@@ -106,9 +106,9 @@ void MapRules::checkSyncCount() const {
 
 void MapRules::checkPoolCount() const {
     if (content_.seg0PoolCount <= mostPools) return;
-    report_.add({file_.path, "pool-count", Value::number(content_.seg0PoolCount), Value::number(mostPools),
-                 std::to_string(content_.seg0PoolCount) + " stored, SEG[0] holds at most " +
-                     std::to_string(mostPools)});
+    report_.add(
+        {file_.path, "pool-count", Value::number(content_.seg0PoolCount), Value::number(mostPools),
+         std::to_string(content_.seg0PoolCount) + " stored, SEG[0] holds at most " + std::to_string(mostPools)});
 }
 
 void MapRules::checkPartialEntry() const {
@@ -185,11 +185,10 @@ void MapRules::checkDataFile(const MapRun& part, std::uint64_t number) {
 
 void MapRules::tellMissingDataFile(const MapRun& entries) const {
     const std::uint64_t address = entries.entry.extentAddress;
-    const std::string name = address > largest / extentSize_
-                                 ? "data file at all"
-                                 : DataFiles::nameOf(address * extentSize_ >> dataFileShift);
-    addFinding("missing-data-file", entries, Value::number(address), Value::text(name),
-               firstExtentOf(entries) + ", for which there is no " + name);
+    const bool fits = address <= largest / extentSize_;
+    const std::string found = "no " + (fits ? DataFiles::nameOf(address * extentSize_ >> dataFileShift) : "data file");
+    addFinding("missing-data-file", entries, Value::number(address), Value::text(found),
+               firstExtentOf(entries) + ", for which there is " + found);
 }
 
 void MapRules::tellBeyondDataFile(const MapRun& entries) const {

@@ -18,9 +18,15 @@ std::string rangeOf(const char* things, std::uint64_t first, std::uint64_t count
 template <std::size_t keySize>
 void write(Json& json, const char (&name)[keySize], const Value& value) {
     switch (value.form) {
-        case Value::Form::number: json.number(name, value.bits); break;
-        case Value::Form::hexadecimal: json.hexadecimal(name, value.bits); break;
-        case Value::Form::text: json.text(name, value.words); break;
+        case Value::Form::number:
+            json.number(name, value.bits);
+            break;
+        case Value::Form::hexadecimal:
+            json.hexadecimal(name, value.bits);
+            break;
+        case Value::Form::text:
+            json.text(name, value.words);
+            break;
     }
 }
 

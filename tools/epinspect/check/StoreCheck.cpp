@@ -87,8 +87,8 @@ void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) 
         rules.add(run);
         sharedExtents_.add(run);
     };
-    rules.finish(entries == 0 || walkRuns(session_, file.path, content, {0, entries - 1},
-                                          Progress::Beside::listing, each));
+    rules.finish(entries == 0 ||
+                 walkRuns(session_, file.path, content, {0, entries - 1}, Progress::Beside::listing, each));
 }
 
 /// Lets the entries be compared with data files, if that can be done.
@@ -123,10 +123,10 @@ void StoreCheck::checkExtentSizes() {
     }
 }
 
-/// The extent size in the table file at `path` of the target, which is read unless it has been checked.
+/// The extent size in the table file at `path` of the target, which is read unless it has been, with all of the store.
 std::optional<std::uint32_t> StoreCheck::tableExtentSize(const std::string& path) {
     const auto [row, added] = tables_.try_emplace(path);
-    if (!added || checked_.count(path) > 0) return row->second;
+    if (!added || !files_.areNamed() || checked_.count(path) > 0) return row->second;
     const std::optional<std::string> hostPath = session_.openablePath(path);
     if (!hostPath || (!sizeOf(*hostPath) && errno == ENOENT)) return std::nullopt;
     tool::ISCSIEPFileTBL table(*hostPath);

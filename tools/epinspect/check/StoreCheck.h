@@ -49,10 +49,10 @@ private:
     Report report_;
     CommonValues commonValues_;
     SharedExtents sharedExtents_;
-    std::set<std::string> checked_;                                ///< paths on the target
-    std::set<std::string> foldersWithoutVolume_;                   ///< with map files
-    std::map<std::uint32_t, DataFiles> dataFiles_;  ///< by volume
-    std::map<std::string, std::optional<std::uint32_t>> tables_;   ///< extent sizes of table files that could be read
+    std::set<std::string> checked_;                               ///< paths on the target
+    std::set<std::string> foldersWithoutVolume_;                  ///< with map files
+    std::map<std::uint32_t, DataFiles> dataFiles_;                ///< by volume
+    std::map<std::string, std::optional<std::uint32_t>> tables_;  ///< extent sizes of table files that could be read
 };
 
 }  // namespace epinspect

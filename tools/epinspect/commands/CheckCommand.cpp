@@ -1,8 +1,8 @@
 // epinspect check: what files say of themselves and of each other, compared.
 #include <memory>
 
-#include "commands/Commands.h"
 #include "check/StoreCheck.h"
+#include "commands/Commands.h"
 
 namespace epinspect {
 

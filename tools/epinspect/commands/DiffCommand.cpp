@@ -26,10 +26,14 @@ struct DifferenceName {
 
 DifferenceName nameOf(Difference difference) {
     switch (difference) {
-        case Difference::onlyFirst: return {"only in the first", "only-first"};
-        case Difference::onlySecond: return {"only in the second", "only-second"};
-        case Difference::moved: return {"moved", "moved"};
-        default: return {"flags changed", "flags"};
+        case Difference::onlyFirst:
+            return {"only in the first", "only-first"};
+        case Difference::onlySecond:
+            return {"only in the second", "only-second"};
+        case Difference::moved:
+            return {"moved", "moved"};
+        default:
+            return {"flags changed", "flags"};
     }
 }
 

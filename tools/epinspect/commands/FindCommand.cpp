@@ -78,8 +78,8 @@ void searchMap(const FindOptions& options, Session& session, const StoreFile& fi
 
 void printSummary(const FindSummary& summary) {
     print(counted(summary.entries, "entry", "entries") + " in " + counted(summary.files, "map", "maps") + ": " +
-          counted(summary.matches, "match", "matches") + " of " +
-          counted(summary.matchedEntries, "entry", "entries") + "\n");
+          counted(summary.matches, "match", "matches") + " of " + counted(summary.matchedEntries, "entry", "entries") +
+          "\n");
 }
 
 void printSummaryAsJson(const FindSummary& summary) {
