@@ -47,7 +47,7 @@ inline Lines chain(const std::string& path, Lines sources) {
 /// A folder of the test's own, gone at its end.
 class TempDir {
 public:
-    TempDir() { mkdtemp(path_.data()); }
+    TempDir() { EXPECT_NE(nullptr, mkdtemp(path_.data())); }
     ~TempDir() { std::filesystem::remove_all(path_); }
 
     std::string path(const std::string& name) const { return path_ + "/" + name; }
