@@ -34,7 +34,9 @@ constexpr std::size_t extentSize = 1048576;
 /// A folder that lives as long as the program.
 const std::string& folder() {
     static const struct Folder {
-        Folder() { mkdtemp(path.data()); }
+        Folder() {
+            if (mkdtemp(path.data()) == nullptr) std::abort();
+        }
         ~Folder() { std::filesystem::remove_all(path); }
         std::string path = (std::filesystem::temp_directory_path() / "epbenchXXXXXX").string();
     } made;
@@ -138,7 +140,7 @@ std::uint64_t mappedEntries(const std::string& path) {
     const int file = open(path.c_str(), O_RDONLY);
     lseek(file, dataStart, SEEK_SET);
     for (ssize_t got = 0; (got = read(file, block.data(), block.size())) > 0;) {
-        for (ssize_t i = 7; i < got; i += 8) mapped += block[static_cast<std::size_t>(i)] >> 7U;
+        for (ssize_t i = 7; i < got; i += 8) mapped += block[static_cast<std::size_t>(i)] >= 0x80 ? 1U : 0U;
     }
     close(file);
     return mapped;

@@ -84,6 +84,7 @@ namespace {
 
 constexpr std::uint64_t entryCount = 20000;  // three reads of getMapEntries
 constexpr int operationCount = 4;
+int reason = 0;  ///< what the last operation left in errno
 
 /// Performs one of the operations that read, on whole files. Tells its code, and whether it has delivered a result.
 /// Afterwards no more files may be open than before.
@@ -103,6 +104,7 @@ std::pair<int, bool> perform(int operation) {
                      : operation == 1 ? mapFile.getMapEntry(entryCount - 1, entry)
                      : operation == 2 ? mapFile.getMapEntries(0, entryCount, entries)
                                       : dataFile.getExtentData(1, 65536, text);
+    reason = errno;
     allocationsLeft = -1;
     // Pool UUIDs that were appended before a failure may stay.
     const bool delivered = mapFile.poolUUIDs.size() == 2 || entry.mapped || !entries.empty() || !text.empty();
@@ -127,6 +129,7 @@ TEST(Faults, ReadsThatFailComeShortOrMeetAShrunkFile) {
                 const bool cutShort = kind == Fault::SHRINK && operation == 2 && faultyRead > 1;
                 const bool succeeds = kind == Fault::COME_SHORT || kind == Fault::INTERRUPT || cutShort;
                 EXPECT_EQ(succeeds ? 0 : EP_ERR_READ_FAILED, code) << operation << " read " << faultyRead;
+                EXPECT_TRUE(succeeds || reason == (kind == Fault::FAIL ? EIO : 0)) << operation << ' ' << reason;
                 EXPECT_EQ(succeeds && (!cutShort || faultyRead > 2), delivered) << operation << " read " << faultyRead;
             }
             EXPECT_LT(1, faultyRead);
@@ -209,6 +212,7 @@ TEST(Faults, MemoryThatRunsOut) {
         for (allocationsAllowed = 0; outcome.first != 0; ++allocationsAllowed) {
             ASSERT_NO_THROW(outcome = perform(operation)) << operation;
             EXPECT_EQ(outcome.first == 0, outcome.second) << operation << ' ' << allocationsAllowed;
+            EXPECT_TRUE(outcome.first == 0 || reason == ENOMEM) << operation << ' ' << allocationsAllowed;
         }
     }
     allocationsAllowed = -1;

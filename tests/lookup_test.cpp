@@ -219,6 +219,7 @@ TEST(Extent, BytesComeOutInFileOrderAndSizesAreChecked) {
     EXPECT_EQ(0U, file.serialNumber);  // HEAD[1] is not decoded by a lookup
     ISCSIEPFileDAT missing(folder.path("missing"));
     EXPECT_EQ(18990507, missing.getExtentData(0, 0, data));
+    EXPECT_EQ(0, errno);
     EXPECT_EQ(chain(missing.path, {"ISCSIEPFileDAT.cpp:65:getExtentData Invaild LUN extent size: 0."}), takeLog());
     for (const unsigned int size : {0x7fffffffU, 0x80000000U, 0xffffffffU}) {
         EXPECT_EQ(18990038, missing.getExtentData(0, size, data));

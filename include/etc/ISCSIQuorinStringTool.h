@@ -37,12 +37,12 @@ inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* di
     // Sixteen bytes at a time, whatever the compiler makes of the loop below.
     using Bytes = signed char __attribute__((vector_size(16)));
     using Words = unsigned short __attribute__((vector_size(16)));
-    const auto digitsOf = [](Bytes values) { return values + (Bytes(values > 9) & ('a' - '9' - 1)) + '0'; };
+    const auto digitsOf = [](Bytes values) { return values + (Bytes(values > '9') & ('a' - '9' - 1)); };
     for (; i + sizeof(Bytes) <= count; i += sizeof(Bytes)) {
         Bytes block;
         std::memcpy(&block, bytes + i, sizeof block);
-        const Bytes high = digitsOf(Bytes(Words(block) >> 4) & 0xF);
-        const Bytes low = digitsOf(block & 0xF);
+        const Bytes high = digitsOf((Bytes(Words(block) >> 4) & 0xF) | '0');
+        const Bytes low = digitsOf((block & 0xF) | '0');
         const Bytes pairs[] = {
             __builtin_shufflevector(high, low, 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23),
             __builtin_shufflevector(high, low, 8, 24, 9, 25, 10, 26, 11, 27, 12, 28, 13, 29, 14, 30, 15, 31)};
