@@ -11,7 +11,8 @@ namespace epinspect {
 
 namespace tool = ISCSI::TOOL;
 
-int loadLun(std::uint32_t lid, Lun& lun) {
+int loadLun(Session& session, std::uint32_t lid, Lun& lun) {
+    session.prepareLuns();
     lun.record = tool::ISCSILUNConfInfo(lid);
     const int error = lun.record.loadFromConfig();
     return error != 0 ? error : tool::ISCSIEPFileMAP().getMAPFilePath(lid, lun.mapPath);
@@ -26,11 +27,11 @@ bool forEachLun(Session& session, Range range, const std::function<void(const Lu
     Progress progress("LUN ids", range.last - range.first + 1, Progress::Beside::listing);
     Lun lun;
     // Which code stands for "no such LUN" is the platform's secret; the largest id, which no LUN has, tells it.
-    const int noSuchLun = loadLun(std::numeric_limits<std::uint32_t>::max(), lun);
+    const int noSuchLun = loadLun(session, std::numeric_limits<std::uint32_t>::max(), lun);
     bool met = false;
     for (std::uint64_t id = range.first; id <= range.last; ++id) {
         const auto lid = static_cast<std::uint32_t>(id);
-        const int error = loadLun(lid, lun);
+        const int error = loadLun(session, lid, lun);
         progress.show(id - range.first);
         if (error == noSuchLun && error != 0) continue;
         met = true;

@@ -19,7 +19,7 @@ struct Lun {
 };
 
 /// Loads the LUN `lid`. Returns 0 or the code of the platform's library.
-int loadLun(std::uint32_t lid, Lun& lun);
+int loadLun(Session& session, std::uint32_t lid, Lun& lun);
 
 /// How messages name LUNs.
 Subject subjectOf(Range lids);
