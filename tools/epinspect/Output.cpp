@@ -41,7 +41,7 @@ void flushOutput() noexcept {
 }
 
 /// Characters that count as printable but show nothing, or change the direction of what follows.
-bool deceives(wchar_t character) {
+bool deceives(std::wint_t character) {
     struct Range {
         unsigned int first, last;
     };
@@ -53,10 +53,11 @@ bool deceives(wchar_t character) {
         {0x110BD, 0x110BD}, {0x110CD, 0x110CD}, {0x13430, 0x1343F}, {0x1BCA0, 0x1BCA3}, {0x1D173, 0x1D17A},
         {0xE0000, 0xE0FFF},
     };
-    const auto code = static_cast<unsigned int>(character);
     return std::any_of(std::begin(ranges), std::end(ranges),
-                       [code](const Range& range) { return range.first <= code && code <= range.last; });
+                       [character](const Range& range) { return range.first <= character && character <= range.last; });
 }
+
+bool isHarmful(std::wint_t character) { return std::iswprint(character) == 0 || deceives(character); }
 
 void appendEscaped(std::string& text, std::string_view bytes) {
     static constexpr char digits[] = "0123456789abcdef";
@@ -115,7 +116,7 @@ std::string printable(std::string_view text) {
             length = 1;
             state = {};
             appendEscaped(result, text.substr(0, 1));
-        } else if (std::iswprint(static_cast<std::wint_t>(character)) == 0 || deceives(character)) {
+        } else if (isHarmful(static_cast<std::wint_t>(character))) {
             appendEscaped(result, text.substr(0, length));
         } else {
             result.append(text.substr(0, length));
