@@ -128,7 +128,7 @@ void Command::checkWhole() const {
             }
         }
     }
-    const auto given = [this](const char* name) {
+    const auto given = [this](std::string_view name) {
         return std::any_of(options_.begin(), options_.end(),
                            [name](const Parameter& option) { return option.name == name && option.count > 0; });
     };

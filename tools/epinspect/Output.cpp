@@ -130,15 +130,15 @@ std::string forReader(std::string_view text) { return outputIsTerminal() ? print
 
 std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap) {
     const auto columns = [](std::string_view piece) {  // every character of our own texts is one column wide
-        return std::count_if(piece.begin(), piece.end(),
-                             [](char c) { return (static_cast<unsigned char>(c) & 0xC0U) != 0x80U; });
+        return static_cast<std::size_t>(std::count_if(
+            piece.begin(), piece.end(), [](char c) { return (static_cast<unsigned char>(c) & 0xC0U) != 0x80U; }));
     };
     std::string result;
     std::string line;
     for (bool first = true;; first = false) {
         const auto end = std::min(text.find(gap), text.size());
         const auto piece = text.substr(0, end);
-        if (!first && columns(line) + columns(gap) + columns(piece) > static_cast<std::ptrdiff_t>(width)) {
+        if (!first && columns(line) + columns(gap) + columns(piece) > width) {
             result.append(line).append("\n");
             line.assign(indent, ' ').append(piece);
         } else {
@@ -149,20 +149,23 @@ std::string wrapped(std::string_view text, unsigned int width, unsigned int inde
     }
 }
 
+void writeMessage(std::string_view text) noexcept {
+    static_cast<void>(writeAll(STDERR_FILENO, text.data(), text.size()));
+}
+
 void complain(std::string_view message) {
     const std::string line = "epinspect: " + printable(message) + "\n";
     flushOutput();
     Progress::erase();
-    static_cast<void>(writeAll(STDERR_FILENO, line.data(), line.size()));
+    writeMessage(line);
 }
 
 void complainPlainly(std::initializer_list<const char*> pieces) noexcept {
     flushOutput();
     Progress::erase();
-    const auto write = [](const char* text) { static_cast<void>(writeAll(STDERR_FILENO, text, std::strlen(text))); };
-    write("epinspect: ");
-    std::for_each(pieces.begin(), pieces.end(), write);
-    write("\n");
+    writeMessage("epinspect: ");
+    for (const char* piece : pieces) writeMessage(piece);
+    writeMessage("\n");
 }
 
 }  // namespace epinspect
