@@ -23,13 +23,11 @@ struct MapOptions {
     bool chart = false;
 };
 
-void printSummary(const MapSummary& summary, unsigned int width) {
-    const std::string text =
-        counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
-        std::to_string(summary.mapped) + " mapped, " + std::to_string(summary.unmapped) + " unmapped, " +
-        counted(summary.holes, "hole", "holes") + "; " + std::to_string(summary.vpushed) + " vpushed, " +
-        std::to_string(summary.vpulled) + " vpulled, " + std::to_string(summary.synced) + " synced";
-    print(wrapped(text, width, 0));
+std::string textOf(const MapSummary& summary) {
+    return counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
+           std::to_string(summary.mapped) + " mapped, " + std::to_string(summary.unmapped) + " unmapped, " +
+           counted(summary.holes, "hole", "holes") + "; " + std::to_string(summary.vpushed) + " vpushed, " +
+           std::to_string(summary.vpulled) + " vpulled, " + std::to_string(summary.synced) + " synced";
 }
 
 void printSummary(Json& json, const MapSummary& summary) {
@@ -56,8 +54,7 @@ void run(const MapOptions& options, Session& session) {
         return;
     }
     const std::uint64_t count = std::min(options.count, total - options.first);
-    const unsigned int width = options.chart ? outputWidth() : std::numeric_limits<unsigned int>::max();
-    MapChart chart(options.first, count, width);
+    MapChart chart(options.first, count, outputWidth());
     MapSummary summary;
     Json json(options.file);
     Text line;
@@ -77,11 +74,12 @@ void run(const MapOptions& options, Session& session) {
     const auto beside = options.chart ? Progress::Beside::nothing : Progress::Beside::listing;
     const Range range = {options.first, options.first + count - 1};
     if (count > 0 && !walkRuns(session, options.file, file, range, beside, each)) return;
-    if (options.chart) print(chart.draw(outputIsUnicode()));
     if (session.json) {
         printSummary(json, summary);
+    } else if (options.chart) {
+        print(chart.draw(outputIsUnicode()) + wrapped(textOf(summary), outputWidth(), 0));
     } else {
-        printSummary(summary, width);
+        print(textOf(summary) + "\n");
     }
 }
 

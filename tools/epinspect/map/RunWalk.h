@@ -1,4 +1,4 @@
-// The walk through a map file by runs, with its failures reported.
+// The walk through a map file, run by run.
 #pragma once
 
 #include <string>
@@ -19,8 +19,8 @@ inline bool allCame(Session& session, const std::string& name, std::uint64_t nex
     return false;
 }
 
-/// Walks `range`, which the file that the user called `name` held when its entries were counted, and gives the runs to
-/// each(run). Returns whether all entries were still there.
+/// Calls each(run) for the runs of `range` of the file that the user called `name`, all of which the file held when its
+/// entries were counted. Returns whether they were still there; reports what failed.
 template <typename Each>
 bool walkRuns(Session& session, const std::string& name, ISCSI::TOOL::ISCSIEPFileMAP& file, Range range,
               Progress::Beside beside, Each&& each) {
