@@ -172,9 +172,9 @@ void printPlaces(const Byte& byte) {
 void locate(const PlaceChoice& choice, Session& session, const LunMap& lun, DataFiles& files, std::uint64_t offset) {
     Byte byte{offset, offset / lun.extentSize, static_cast<std::uint32_t>(offset % lun.extentSize), {}};
     if (offset >= lun.size) return lun.failBeyondEnd(session, partOf(byte));
-    const std::string place = "entry " + std::to_string(byte.index);
-    if (byte.index >= lun.entries) return session.failBeyondEnd(lun.file, place, lun.entries);
-    if (!session.succeeded(lun.map->getMapEntry(byte.index, byte.entry), {lun.file, place})) return;
+    if (byte.index >= lun.entries) return lun.failBeyondMap(session, partOf(byte));
+    const Subject inMap = {lun.file, lun.subject(partOf(byte)).part};
+    if (!session.succeeded(lun.map->getMapEntry(byte.index, byte.entry), inMap)) return;
     if (!session.json) printEntry(lun, byte);
     if (byte.entry.mapped) {
         findCandidates(choice, session, lun, files, byte);

@@ -22,7 +22,8 @@ CountFrom parseCountFrom(const std::string& text) {
 }  // namespace
 
 void addLunArgument(Command& command, PlaceOptions& options) {
-    command.argument("LUN", "LUN id, or the path of a map file (then --extent-size is needed)", options.lun);
+    command.argument("LUN", "LUN id, or the path of a map file (then --extent-size is needed)", options.lun,
+                     parseLunName);
 }
 
 void addPlaceOptions(Command& command, PlaceOptions& options) {

@@ -3,15 +3,15 @@
 
 #include <cstdint>
 #include <optional>
-#include <string>
 
 #include "CommandLine.h"
 #include "store/ExtentPlace.h"
+#include "store/LunMap.h"
 
 namespace epinspect {
 
 struct PlaceOptions {
-    std::string lun;
+    LunName lun;
     std::optional<std::uint32_t> extentSize;
     PlaceChoice choice;
 };

@@ -16,20 +16,14 @@ namespace {
 
 constexpr std::uint64_t sizeLimit = std::uint64_t{1} << 63U;
 
-bool isNumber(const std::string& text) {
-    const std::string prefix = text.substr(0, 2);
-    return prefix == "0x" || prefix == "0X" ||
-           (!text.empty() && text.find_first_not_of("0123456789") == std::string::npos);
-}
-
 /// Finds out which map file is meant, and what the configuration tells of the LUN. Returns false after a failure.
-bool findMap(Session& session, const std::string& lun, LunMap& map) {
-    if (!isNumber(lun)) {
-        map.file = lun;
-        map.targetPath = session.targetPath(lun);
+bool findMap(Session& session, const LunName& lun, LunMap& map) {
+    map.lid = lun.lid;
+    if (!lun.lid) {
+        map.file = lun.file;
+        map.targetPath = session.targetPath(lun.file);
         return true;
     }
-    map.lid = parseNumber32(lun);
     Lun known;
     if (!session.succeeded(loadLun(*map.lid, known), map.subject(""))) return false;
     map.file = map.targetPath = known.mapPath;
@@ -54,8 +48,22 @@ void LunMap::failBeyondEnd(Session& session, const std::string& part) const {
                  tool::EP_ERR_READ_FAILED);
 }
 
-std::optional<LunMap> openLunMap(Session& session, const std::string& lun, std::optional<std::uint32_t> extentSize) {
-    if (!isNumber(lun) && !extentSize) throw UsageError{"--extent-size is missing, which a map file does not tell"};
+void LunMap::failBeyondMap(Session& session, const std::string& part) const {
+    session.fail({file, subject(part).part},
+                 "beyond the end, the map's entries stand for " + std::to_string(mappableSize()) + " bytes",
+                 tool::EP_ERR_READ_FAILED);
+}
+
+LunName parseLunName(const std::string& text) {
+    const std::string prefix = text.substr(0, 2);
+    const bool number = prefix == "0x" || prefix == "0X" ||
+                        (!text.empty() && text.find_first_not_of("0123456789") == std::string::npos);
+    if (number) return {parseNumber32(text), ""};
+    return {std::nullopt, text};
+}
+
+std::optional<LunMap> openLunMap(Session& session, const LunName& lun, std::optional<std::uint32_t> extentSize) {
+    if (!lun.lid && !extentSize) throw UsageError{"--extent-size is missing: a map file does not tell it"};
     LunMap map;
     if (!findMap(session, lun, map)) return std::nullopt;
     map.extentSize = extentSize.value_or(map.extentSize);

@@ -29,10 +29,22 @@ struct LunMap {
 
     /// Reports that `part` is behind the end of the LUN.
     void failBeyondEnd(Session& session, const std::string& part) const;
+
+    /// Reports that `part` is behind the last entry of the map.
+    void failBeyondMap(Session& session, const std::string& part) const;
 };
 
-/// Opens the map of the LUN that the user named, by its id or by the path of its map file; that lacks an extent size,
-/// which else is that of the configuration unless one is given. Reports what fails; throws UsageError.
-std::optional<LunMap> openLunMap(Session& session, const std::string& lun, std::optional<std::uint32_t> extentSize);
+/// The name of a LUN as it is typed: its id, or the path of its map file.
+struct LunName {
+    std::optional<std::uint32_t> lid;
+    std::string file;
+};
+
+/// Throws UsageError for a number that is no LUN id.
+LunName parseLunName(const std::string& text);
+
+/// Opens the map of a LUN. The extent size is that of the configuration unless one is given, which a LUN named by its
+/// map file lacks otherwise. Reports what fails; throws UsageError.
+std::optional<LunMap> openLunMap(Session& session, const LunName& lun, std::optional<std::uint32_t> extentSize);
 
 }  // namespace epinspect

@@ -18,9 +18,10 @@ namespace {
 constexpr std::uint32_t pieceSize = 1U << 20U;      ///< of a read
 constexpr std::uint32_t smallestPiece = 1U << 12U;  ///< of a read in the neighbourhood of what cannot be read
 
-/// "bytes FROM-TO", without `end`.
+/// How messages name the bytes from `begin` up to `end`, without that one.
 std::string bytesText(std::uint64_t begin, std::uint64_t end) {
-    return "bytes " + std::to_string(begin) + "-" + std::to_string(end - 1);
+    const std::string first = std::to_string(begin);
+    return end - begin == 1 ? "byte " + first : "bytes " + first + "-" + std::to_string(end - 1);
 }
 
 }  // namespace
@@ -41,15 +42,17 @@ LunReader::LunReader(Session& session, const LunMap& lun, const PlaceChoice& cho
 
 void LunReader::print() {
     const std::uint64_t mapEnd = std::clamp(lun_.mappableSize(), first_, end_);
-    if (mapEnd < end_) {  // said first: what follows may be long
-        session_.fail({lun_.file, lun_.subject(bytesText(mapEnd, end_)).part},
-                      "beyond the end, the file holds " + std::to_string(lun_.entries) + " entries",
-                      tool::EP_ERR_READ_FAILED);
+    // Said first: what follows may be long.
+    if (mapEnd < end_) lun_.failBeyondMap(session_, bytesText(mapEnd, end_));
+    try {
+        if (first_ < mapEnd) printMap(mapEnd);
+        reportMissing();
+        missing_ += end_ - mapEnd;
+        printZeros(end_ - mapEnd);
+    } catch (const OutputFailure&) {
+        reportMissing();
+        throw;
     }
-    if (first_ < mapEnd) printMap(mapEnd);
-    reportMissing();
-    missing_ += end_ - mapEnd;
-    printZeros(end_ - mapEnd);
     if (missing_ == 0) return;
     const Subject subject = lun_.subject("");
     complain(subject.file + subject.part + ": " + std::to_string(missing_) + " of " + std::to_string(end_ - first_) +
