@@ -80,6 +80,11 @@ void prepareStreams() {
 
 void print(std::string_view text) {
     static const bool terminal = outputIsTerminal();
+    if (text.size() >= bufferSize) {  // nothing is won by copying it
+        flushOutput();
+        if (outputError == 0) outputError = writeAll(STDOUT_FILENO, text.data(), text.size());
+        text = {};
+    }
     while (!text.empty()) {
         const auto part = text.substr(0, bufferSize - buffered);
         std::memcpy(buffer + buffered, part.data(), part.size());

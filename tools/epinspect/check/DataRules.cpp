@@ -1,6 +1,6 @@
 #include "check/DataRules.h"
 
-#include "check/DataFiles.h"
+#include "check/VolumeData.h"
 
 namespace epinspect {
 

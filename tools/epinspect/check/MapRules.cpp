@@ -1,7 +1,8 @@
 #include "check/MapRules.h"
 
 #include <algorithm>
-#include <limits>
+
+#include "Output.h"
 
 namespace epinspect {
 
@@ -9,10 +10,6 @@ namespace {
 
 constexpr std::uint64_t entrySize = 8;
 constexpr std::uint32_t mostPools = 1024;
-constexpr std::uint64_t largest = std::numeric_limits<std::uint64_t>::max();
-
-/// Bits 48 to 51.
-unsigned int openBitsOf(const MapEntry& entry) { return entry.poolNumber & 0xFU; }
 
 /// The entries of `run` from the one that is `skipped` behind the first on.
 MapRun partOf(const MapRun& run, std::uint64_t skipped, std::uint64_t count) {
@@ -29,13 +26,13 @@ std::uint64_t bitsOf(const MapEntry& entry) {
 }
 
 /// The entries need not be one run.
-std::string firstExtentOf(const MapRun& entries) {
-    return extentsOf(entries.entry.extentAddress, 1) + (entries.count == 1 ? "" : " in the first");
+std::string firstExtentText(const MapRun& entries) {
+    return extentsText(entries.entry.extentAddress, 1) + (entries.count == 1 ? "" : " in the first");
 }
 
 }  // namespace
 
-void MapRules::useDataFiles(DataFiles& dataFiles, std::uint32_t extentSize) {
+void MapRules::useDataFiles(VolumeData& dataFiles, std::uint32_t extentSize) {
     dataFiles_ = &dataFiles;
     extentSize_ = extentSize;
 }
@@ -82,7 +79,7 @@ void MapRules::end(Stretch& stretch) {
 
 void MapRules::addFinding(const char* rule, const MapRun& entries, const Value& stored, const Value& found,
                           const std::string& message) const {
-    report_.add({file_.path, rule, stored, found, placeOf(entries.first, entries.count) + ": " + message,
+    report_.add({file_.path, rule, stored, found, entriesText(entries.first, entries.count) + ": " + message,
                  Finding::Entries{&file_.path, entries.first, entries.count}});
 }
 
@@ -132,73 +129,63 @@ void MapRules::tellUnmappedBits(const MapRun& entries) const {
 }
 
 void MapRules::checkAddressBits(const MapRun& run) {
-    if (openBitsOf(run.entry) != 0) take(addressBits_, run);
+    if (hasOpenBits(run.entry)) take(addressBits_, run);
 }
 
 void MapRules::tellAddressBits(const MapRun& entries) const {
     const Value stored = Value::hexadecimal(bitsOf(entries.entry));
-    const Value found = Value::hexadecimal(openBitsOf(entries.entry));
+    const Value found = Value::hexadecimal(entries.entry.poolNumber & 0xFU);
     addFinding("address-bits", entries, stored, found,
                stored.shown() + (entries.count == 1 ? "" : " in the first") + ", of which bits 48 to 51 are " +
                    found.shown() + ": they count in extent address and pool number");
 }
 
 void MapRules::checkDataFiles(const MapRun& run) {
-    if (openBitsOf(run.entry) != 0) {
+    if (hasOpenBits(run.entry)) {
         openBits_ = true;
         return;
     }
     for (std::uint64_t done = 0; done < run.count;) {
         const std::uint64_t address = run.entry.extentAddress + done;
-        if (address > largest / extentSize_) {  // further on than any data file
-            return take(missingDataFile_, partOf(run, done, run.count - done));
-        }
-        const std::uint64_t number = address * extentSize_ >> dataFileShift;
-        const std::uint64_t last = ((number + 1) << dataFileShift) - 1;  // byte of the data file; 2^64 - 1 at most
-        const std::uint64_t count = std::min(run.count - done, last / extentSize_ - address + 1);
-        checkDataFile(partOf(run, done, count), number);
+        const auto place = placeOf(address, extentSize_);
+        if (!place) return take(missingDataFile_, partOf(run, done, run.count - done));
+        const std::uint64_t count = std::min(run.count - done, place->next - address);
+        checkDataFile(partOf(run, done, count), *place);
         done += count;
     }
 }
 
-/// Compares entries whose extents start in data file `number`. Where the extent address counts from the data file's
-/// start of 4 TiB, the extent lies nearer to the file's start than where it counts from the volume's: an extent beyond
-/// the end by that reading is beyond it by both.
-void MapRules::checkDataFile(const MapRun& part, std::uint64_t number) {
+/// Compares entries whose extents start in one data file, the first one at `place`. Counted from the volume's start an
+/// extent lies further on than counted within the data file: beyond the end by that reading, it is so by both.
+void MapRules::checkDataFile(const MapRun& part, const ExtentPlace& place) {
     std::uint64_t bytes = 0;
-    const DataFiles::State state = dataFiles_->find(number, bytes);
-    if (state == DataFiles::State::missing) return take(missingDataFile_, part);
-    if (state == DataFiles::State::unreadable) {
+    const VolumeData::State state = dataFiles_->find(place.dataFile, bytes);
+    if (state == VolumeData::State::missing) return take(missingDataFile_, part);
+    if (state == VolumeData::State::unreadable) {
         unreadableFiles_ = true;
         return;
     }
-    const std::uint64_t start = number << dataFileShift;
-    const std::uint64_t span = (std::uint64_t{1} << dataFileShift) - 1;
-    const std::uint64_t first = part.entry.extentAddress;
-    std::uint64_t inside = 0;  // how many of the entries
-    if (bytes >= extentSize_) {
-        const std::uint64_t last = (start + std::min(bytes - extentSize_, span)) / extentSize_;
-        if (last >= first) inside = std::min(part.count, last - first + 1);
-    }
+    const std::uint64_t held = bytes / extentSize_;
+    const std::uint64_t inside = held > place.inFile ? std::min(part.count, held - place.inFile) : 0;
     if (inside < part.count) take(beyondDataFile_, partOf(part, inside, part.count - inside));
 }
 
 void MapRules::tellMissingDataFile(const MapRun& entries) const {
     const std::uint64_t address = entries.entry.extentAddress;
-    const bool fits = address <= largest / extentSize_;
-    const std::string found = "no " + (fits ? DataFiles::nameOf(address * extentSize_ >> dataFileShift) : "data file");
+    const auto place = placeOf(address, extentSize_);
+    const std::string found = "no " + (place ? VolumeData::nameOf(place->dataFile) : "data file");
     addFinding("missing-data-file", entries, Value::number(address), Value::text(found),
-               firstExtentOf(entries) + ", for which there is " + found);
+               firstExtentText(entries) + ", for which there is " + found);
 }
 
 void MapRules::tellBeyondDataFile(const MapRun& entries) const {
     const std::uint64_t address = entries.entry.extentAddress;
-    const std::uint64_t number = address * extentSize_ >> dataFileShift;
+    const std::uint64_t number = placeOf(address, extentSize_)->dataFile;
     std::uint64_t bytes = 0;
     dataFiles_->find(number, bytes);
     addFinding("beyond-data-file", entries, Value::number(address), Value::number(bytes / extentSize_),
-               firstExtentOf(entries) + ", behind the end of " + DataFiles::nameOf(number) + ", which holds " +
-                   std::to_string(bytes / extentSize_) + " extents");
+               firstExtentText(entries) + ", behind the end of " + VolumeData::nameOf(number) + ", which holds " +
+                   counted(bytes / extentSize_, "extent", "extents"));
 }
 
 }  // namespace epinspect

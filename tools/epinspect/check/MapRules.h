@@ -5,9 +5,10 @@
 
 #include <cstdint>
 
-#include "check/DataFiles.h"
 #include "check/Report.h"
+#include "check/VolumeData.h"
 #include "map/MapRuns.h"
+#include "store/ExtentPlace.h"
 #include "store/Store.h"
 
 namespace epinspect {
@@ -20,7 +21,7 @@ public:
         : file_(file), content_(content), report_(report) {}
 
     /// Compares entries with the data files too, where extents of `extentSize` bytes lie, not 0.
-    void useDataFiles(DataFiles& dataFiles, std::uint32_t extentSize);
+    void useDataFiles(VolumeData& dataFiles, std::uint32_t extentSize);
 
     void add(const MapRun& run);
 
@@ -48,7 +49,7 @@ private:
     void checkUnmappedBits(const MapRun& run);
     void checkAddressBits(const MapRun& run);
     void checkDataFiles(const MapRun& run);
-    void checkDataFile(const MapRun& part, std::uint64_t number);
+    void checkDataFile(const MapRun& part, const ExtentPlace& place);
 
     void tellUnmappedBits(const MapRun& entries) const;
     void tellAddressBits(const MapRun& entries) const;
@@ -59,8 +60,8 @@ private:
     const ISCSI::TOOL::ISCSIEPFileMAP& content_;
     Report& report_;
     MapSummary summary_;
-    DataFiles* dataFiles_ = nullptr;
-    std::uint64_t extentSize_ = 0;
+    VolumeData* dataFiles_ = nullptr;
+    std::uint32_t extentSize_ = 0;
     bool openBits_ = false;         ///< some entries were not compared with data files: bits 48 to 51 are set
     bool unreadableFiles_ = false;  ///< nor others, whose data file could not be read
     Stretch unmappedBits_ = {&MapRules::tellUnmappedBits};

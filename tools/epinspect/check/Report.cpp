@@ -43,11 +43,11 @@ std::string Value::shown() const {
     return std::string(text.view());
 }
 
-std::string placeOf(std::uint64_t first, std::uint64_t count) {
+std::string entriesText(std::uint64_t first, std::uint64_t count) {
     return rangeOf(count == 1 ? "entry " : "entries ", first, count);
 }
 
-std::string extentsOf(std::uint64_t first, std::uint64_t count) {
+std::string extentsText(std::uint64_t first, std::uint64_t count) {
     return rangeOf(count == 1 ? "extent " : "extents ", first, count);
 }
 

@@ -83,9 +83,9 @@ private:
 };
 
 /// "entry 3" or "entries 3-5".
-std::string placeOf(std::uint64_t first, std::uint64_t count);
+std::string entriesText(std::uint64_t first, std::uint64_t count);
 
 /// "extent 3" or "extents 3-5".
-std::string extentsOf(std::uint64_t first, std::uint64_t count);
+std::string extentsText(std::uint64_t first, std::uint64_t count);
 
 }  // namespace epinspect

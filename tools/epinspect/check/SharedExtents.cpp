@@ -74,10 +74,11 @@ void SharedExtents::tell(const Use& earlier, const Use& later, Report& report) c
     const std::string& file = files_[later.map];
     const std::string& otherFile = files_[earlier.map];
     const std::uint64_t address = later.extent & addressMask;
-    const std::string extents = "pool " + std::to_string(later.extent >> poolShift) + ", " + extentsOf(address, count);
+    const std::string extents =
+        "pool " + std::to_string(later.extent >> poolShift) + ", " + extentsText(address, count);
     report.add({file, "shared-extents", Value::number(address), Value::text(otherFile),
-                placeOf(later.first, count) + ": " + extents + ", used by " + placeOf(otherFirst, count) + " of " +
-                    (later.map == earlier.map ? "this map" : otherFile) + " too",
+                entriesText(later.first, count) + ": " + extents + ", used by " + entriesText(otherFirst, count) +
+                    " of " + (later.map == earlier.map ? "this map" : otherFile) + " too",
                 Finding::Entries{&file, later.first, count}, Finding::Entries{&otherFile, otherFirst, count}});
 }
 

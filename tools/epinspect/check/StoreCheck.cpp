@@ -101,7 +101,7 @@ void StoreCheck::useDataFiles(const StoreFile& file, MapRules& rules) {
     if (*extentSize == 0) return giveUp("the extent size is 0");
     if (file.volume == 0) return giveUp("the path names no volume");
     const std::string path = session_.targetPath(file.path);
-    DataFiles& dataFiles = dataFiles_.try_emplace(file.volume, session_, path, files_.areNamed()).first->second;
+    VolumeData& dataFiles = dataFiles_.try_emplace(file.volume, session_, path, files_.areNamed()).first->second;
     if (!dataFiles.areListed()) return giveUp("the data files of the volume cannot be listed");
     rules.useDataFiles(dataFiles, *extentSize);
 }

@@ -11,11 +11,11 @@
 #include <vector>
 
 #include "Session.h"
-#include "check/DataFiles.h"
 #include "check/HeadRules.h"
 #include "check/MapRules.h"
 #include "check/Report.h"
 #include "check/SharedExtents.h"
+#include "check/VolumeData.h"
 #include "store/ChosenFiles.h"
 
 namespace epinspect {
@@ -51,7 +51,7 @@ private:
     SharedExtents sharedExtents_;
     std::set<std::string> checked_;                               ///< paths on the target
     std::set<std::string> foldersWithoutVolume_;                  ///< with map files
-    std::map<std::uint32_t, DataFiles> dataFiles_;                ///< by volume
+    std::map<std::uint32_t, VolumeData> dataFiles_;               ///< by volume
     std::map<std::string, std::optional<std::uint32_t>> tables_;  ///< extent sizes of table files that could be read
 };
 

@@ -5,10 +5,10 @@
 #include "Output.h"
 #include "commands/Commands.h"
 #include "map/MapOutput.h"
-#include "map/RunSearch.h"
 #include "map/RunWalk.h"
 #include "store/ChosenFiles.h"
 #include "store/OpenMap.h"
+#include "store/RunSearch.h"
 
 namespace epinspect {
 

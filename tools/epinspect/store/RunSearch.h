@@ -7,13 +7,9 @@
 
 #include "Numbers.h"
 #include "map/MapRuns.h"
+#include "store/ExtentPlace.h"
 
 namespace epinspect {
-
-/// The extent address in the lowest 48 bits, as it is read where bits 48 to 51 belong to the pool number alone.
-inline std::uint64_t lowAddressOf(const MapEntry& entry) {
-    return entry.extentAddress & ((std::uint64_t{1} << 48U) - 1);
-}
 
 /// Entries of a run that fit a search.
 struct RunMatch {
@@ -33,7 +29,8 @@ struct RunSearch {
         if (isHole(run.entry) || (pool && run.entry.poolNumber != *pool)) return;
         if (!extents) return emit(RunMatch{run, std::nullopt});
         std::uint64_t next = 0;
-        for (const std::uint64_t address : {std::uint64_t{run.entry.extentAddress}, lowAddressOf(run.entry)}) {
+        for (const std::uint64_t address :
+             {readAs(run.entry, AddressBits::bits52).extent, readAs(run.entry, AddressBits::bits48).extent}) {
             const bool asShown = address == run.entry.extentAddress;
             const std::uint64_t last = address + run.count - 1;
             if (extents->last < address || extents->first > last) continue;

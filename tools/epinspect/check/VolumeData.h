@@ -11,19 +11,17 @@
 
 namespace epinspect {
 
-/// Bytes of a volume that one data file holds.
-inline constexpr unsigned int dataFileShift = 42;
-
 /// The number in the name of a data file, without or with folders; nothing where there is none.
 std::optional<std::uint64_t> dataFileNumberIn(std::string_view path);
 
-class DataFiles {
+/// Knows the data files of one volume by their numbers.
+class VolumeData {
 public:
     enum class State { missing, unreadable, readable };
 
     /// Of the volume on which the file at `path` of the target lies. With `reports`, what cannot be read is reported;
     /// else it has been, or will be.
-    DataFiles(Session& session, const std::string& path, bool reports);
+    VolumeData(Session& session, const std::string& path, bool reports);
 
     /// Whether the path names a volume, and whether its data files could be listed.
     bool haveVolume() const { return !folder_.empty(); }

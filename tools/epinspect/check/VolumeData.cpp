@@ -1,4 +1,4 @@
-#include "check/DataFiles.h"
+#include "check/VolumeData.h"
 
 #include <ISCSIEPFileDAT.h>
 
@@ -17,9 +17,10 @@ namespace {
 
 /// The path of the data file `number` of the volume on which `path` lies, empty where that names none.
 std::string dataFilePath(const std::string& path, std::uint64_t number) {
+    constexpr unsigned int shift = 42;  // a data file for each 4 TiB
     const QuietLog quiet;
     std::string result;
-    tool::ISCSIEPFile(path).getDATFilePath(1, number << dataFileShift, result);
+    tool::ISCSIEPFile(path).getDATFilePath(1, number << shift, result);
     return result;
 }
 
@@ -38,13 +39,13 @@ std::optional<std::uint64_t> dataFileNumberIn(std::string_view path) {
     return number;
 }
 
-DataFiles::DataFiles(Session& session, const std::string& path, bool reports) : session_(session), reports_(reports) {
+VolumeData::VolumeData(Session& session, const std::string& path, bool reports) : session_(session), reports_(reports) {
     const std::string first = dataFilePath(path, 0);
     folder_ = first.substr(0, first.rfind('/') + 1);
     if (haveVolume()) list();
 }
 
-void DataFiles::list() {
+void VolumeData::list() {
     const auto error = listFolder(session_, folder_, [this](const std::filesystem::directory_entry& entry) {
         const std::string name = entry.path().filename().string();
         const auto number = dataFileNumberIn(name);
@@ -58,9 +59,9 @@ void DataFiles::list() {
     if (error && reports_) session_.succeeded(tool::EP_ERR_OPEN_FAILED, {folder_, ""}, error.value());
 }
 
-std::string DataFiles::nameOf(std::uint64_t number) { return std::string(lastName(dataFilePath("/volume1", number))); }
+std::string VolumeData::nameOf(std::uint64_t number) { return std::string(lastName(dataFilePath("/volume1", number))); }
 
-DataFiles::State DataFiles::find(std::uint64_t number, std::uint64_t& bytes) {
+VolumeData::State VolumeData::find(std::uint64_t number, std::uint64_t& bytes) {
     const auto file = files_.find(number);
     if (file == files_.end()) return State::missing;
     if (!file->second.state) look(number, file->second);
@@ -68,7 +69,7 @@ DataFiles::State DataFiles::find(std::uint64_t number, std::uint64_t& bytes) {
     return *file->second.state;
 }
 
-void DataFiles::look(std::uint64_t number, File& file) {
+void VolumeData::look(std::uint64_t number, File& file) {
     file.state = State::unreadable;
     const std::string name = folder_ + nameOf(number);
     const std::optional<std::string> path = session_.openablePath(name);
