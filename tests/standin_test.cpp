@@ -34,7 +34,7 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
     const std::string path = folder.path("luns.json");
     const std::string list =
         R"([{"lid": 7, "extentSize": 4294967295, "size": 9223372036854775809, "restoreTime": -2147483648, "type": -5,)"
-        R"( "uuid": "U", "rootPath": "R", "name": "N"}])";
+        R"( "uuid": "U", "rootPath": "R", "name": "N"}, {"lid": 8, "name": "M"}])";
     std::string memory;
     const auto ask = [&memory] {  // the record does not lie on a multiple of 8, and what lies around it is spared
         memory.assign(KELPISCSI_LUN_RECORD_SIZE + 2, 'x');
@@ -45,18 +45,18 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
     setenv("KELPISCSIEP_LUNS", path.c_str(), 1);
     // clang-format off
     const std::tuple<int, std::string, Lines> cases[] = {  // the code, and what stands in the list instead of a text
-        {0, "9223372036854775809", {"18446744073709551615"}}, {bad, "9223372036854775809", {"18446744073709551616"}},
-        {0, "-5", {"2147483647"}}, {bad, "-5", {"2147483648", "1.5", "[1]", "null"}},
-        {bad, "-2147483648", {"-2147483649"}}, {bad, "4294967295", {"4294967296", "-1"}},
-        {0, "\"U\"", {quoted(73)}}, {bad, "\"U\"", {quoted(74), "3", "null"}}, {bad, "\"name\"", {"\"other\""}},
-        {0, "\"R\"", {quoted(4094)}}, {bad, "\"R\"", {quoted(4095)}},
+        {0, "9223372036854775809", {"18446744073709551615"}}, {0, "-5", {"2147483647"}},
+        {bad, "9223372036854775809", {"18446744073709551616", "-1"}}, {bad, "-2147483648", {"-2147483649"}},
+        {bad, "-5", {"2147483648", "18446744073709551611", "1.5", "[1]", R"(1, "type": null)"}},
+        {bad, "4294967295", {"4294967296", "-1"}}, {bad, "\"name\"", {"\"other\""}}, {0, "\"U\"", {quoted(73)}},
+        {bad, "\"U\"", {quoted(74), "3", "null"}}, {0, "\"R\"", {quoted(4094)}}, {bad, "\"R\"", {quoted(4095)}},
         {0, "\"N\"", {quoted(266), R"(3, "name": "N")", R"("N", "more": {"lid": 8, "list": [{"name": 3}]})"}},
         {bad, "\"N\"", {quoted(267), R"("\u0000")", R"("N", "name": 3)"}},
         // before the LUN stand LUNs with an id, behind it may stand anything
-        {0, "[{", {R"([{"lid": 8}, {)"}}, {bad, "[{", {"[3, {", "[{}, {", R"([{"lid": "8"}, {)"}},
+        {0, "[{", {R"([{"lid": 8}, {)"}}, {bad, "[{", {"[3, {", R"([{"lid": 8}, {}, {)", R"([{"lid": "8"}, {)"}},
         {0, "}]", {"}, 3, {}]"}}, {malformed, "}]", {"}", "}, 3", "}] 3", "}, \"\xff\"]"}},
         {malformed, "[{", {R"({"luns": [{)", std::string(100000, '[')}},
-        {malformed, list, {list.substr(1, list.size() - 2), ""}}, {unknown, "7", {"8"}}, {0, "7", {"7"}}};
+        {malformed, list, {list.substr(1, list.find("}, ")), ""}}, {unknown, "7", {"8"}}, {0, "7", {"7"}}};
     const std::pair<int, const char*> texts[] = {
         {0, "Success"}, {1, "Unknown error"}, {9001, "No such LUN"},
         {9002, "The LUN list is missing or cannot be read"}, {9003, "The LUN list is not a JSON array"},

@@ -115,9 +115,9 @@ public:
     bool binary(const nlohmann::json::binary_t& /*value*/) { return take(OtherValue()); }
 
     bool start_array(std::size_t /*size*/) {
-        const bool proper = depth_ == 0 || take(OtherValue());
+        take(OtherValue());
         ++depth_;
-        return proper;
+        return true;
     }
 
     bool end_array() {
@@ -134,7 +134,7 @@ public:
     }
 
     bool key(const std::string& name) {
-        if (depth_ == inLun) key_ = keyOf(name);
+        key_ = keyOf(name);
         return true;
     }
 
