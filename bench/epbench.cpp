@@ -13,6 +13,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
 #include <map>
 #include <memory>
 #include <string>
@@ -27,12 +28,15 @@ namespace {
 
 constexpr off_t dataStart = 24576;
 constexpr std::uint64_t mapEntries = 10000000;
+constexpr std::uint64_t longMapEntries = 67108864;
 constexpr std::size_t extentSize = 1048576;
 
 /// A folder that lives as long as the program.
 const std::string& folder() {
     static const struct Folder {
-        Folder() { mkdtemp(path.data()); }
+        Folder() {
+            if (mkdtemp(path.data()) == nullptr) std::abort();
+        }
         ~Folder() { std::filesystem::remove_all(path); }
         std::string path = (std::filesystem::temp_directory_path() / "epbenchXXXXXX").string();
     } made;
@@ -53,6 +57,14 @@ void parseAndDump(benchmark::State& state, const EPFileBuilder& builder) {
         benchmark::DoNotOptimize(file.toString());
     }
 }
+
+void readHeader(benchmark::State& state) {
+    ISCSIEPFileTBL file(write("file", EPFileBuilder::table()));
+    for (auto _ : state) {
+        if (file.readHeader() != 0) state.SkipWithError("read failed");
+    }
+}
+
 void headerFloor(benchmark::State& state) {
     const std::string path = write("file", EPFileBuilder::table());
     unsigned char block[dataStart];
@@ -64,12 +76,49 @@ void headerFloor(benchmark::State& state) {
     }
 }
 
+/// 1024 UUID texts, formatted one by one.
+void uuidFloor(benchmark::State& state) {
+    unsigned char b[16] = {0xa0, 0xb1, 0xc2};
+    char text[37];
+    for (auto _ : state) {
+        for (int i = 0; i < 1024; ++i) {
+            b[15] = static_cast<unsigned char>(i);
+            std::snprintf(text, sizeof text, "%02x%02x%02x%02x-%02x%02x-%02x%02x-%02x%02x-%02x%02x%02x%02x%02x%02x",
+                          b[0], b[1], b[2], b[3], b[4], b[5], b[6], b[7], b[8], b[9], b[10], b[11], b[12], b[13], b[14],
+                          b[15]);
+            benchmark::DoNotOptimize(text);
+        }
+    }
+}
+
+/// A map file of `count` mapped entries, whose extent addresses advance by `step`: by 1 they are one run, by 2 as many
+/// runs as entries.
+std::string writeMap(const std::string& name, std::uint64_t count, std::uint64_t step) {
+    const std::string path = write(name, EPFileBuilder::map().resize(dataStart));
+    std::ofstream file(path, std::ios::binary | std::ios::app);
+    std::string block;
+    for (std::uint64_t i = 0; i < count; ++i) {
+        block += epbuilder::littleEndian(i * step | 1ULL << 63U, 8);
+        if (block.size() == 1U << 20U || i + 1 == count) {
+            file << block;
+            block.clear();
+        }
+    }
+    return path;
+}
+
 const std::string& mapFile() {
-    static const std::string path = [] {
-        std::string entries;
-        for (std::uint64_t i = 0; i < mapEntries; ++i) entries += epbuilder::littleEndian(i | 1ULL << 63U, 8);
-        return write("map", EPFileBuilder::map().bytes(dataStart, entries));
-    }();
+    static const std::string path = writeMap("map", mapEntries, 1);
+    return path;
+}
+
+const std::string& longMapFile() {
+    static const std::string path = writeMap("long map", longMapEntries, 1);
+    return path;
+}
+
+const std::string& fragmentedMapFile() {
+    static const std::string path = writeMap("fragmented map", mapEntries, 2);
     return path;
 }
 
@@ -82,6 +131,35 @@ void singleLookup(benchmark::State& state) {
         index = (index + 7919) % mapEntries;
     }
     state.SetItemsProcessed(state.iterations());
+}
+
+/// Reads blocks of 64 KiB and looks at the top bit of each entry.
+std::uint64_t mappedEntries(const std::string& path) {
+    std::vector<unsigned char> block(65536);
+    std::uint64_t mapped = 0;
+    const int file = open(path.c_str(), O_RDONLY);
+    lseek(file, dataStart, SEEK_SET);
+    for (ssize_t got = 0; (got = read(file, block.data(), block.size())) > 0;) {
+        for (ssize_t i = 7; i < got; i += 8) mapped += block[static_cast<std::size_t>(i)] >= 0x80 ? 1U : 0U;
+    }
+    close(file);
+    return mapped;
+}
+
+void wholeMapFloor(benchmark::State& state, const std::string& (*path)(), std::uint64_t entries) {
+    for (auto _ : state) {
+        if (mappedEntries(path()) != entries) state.SkipWithError("read failed");
+    }
+    state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(entries));
+}
+
+/// The program on a whole map, its start included.
+void mapProgram(benchmark::State& state, const std::string& (*path)(), std::uint64_t entries, const char* option) {
+    const std::string command = std::string(EPINSPECT) + " map " + option + " '" + path() + "' > /dev/null";
+    for (auto _ : state) {
+        if (std::system(command.c_str()) != 0) state.SkipWithError("program failed");
+    }
+    state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(entries));
 }
 
 void singleLookupFloor(benchmark::State& state) {
@@ -209,6 +287,8 @@ int main(int argc, char** argv) {
         benchmark::RegisterBenchmark(name, inputs...)->UseRealTime();
     };
     add("header/floor", headerFloor);
+    add("header/read", readHeader);
+    add("header/1024 UUIDs", uuidFloor);
     add("header/table", parseAndDump<ISCSIEPFileTBL>, EPFileBuilder::table());
     add("header/free-index", parseAndDump<ISCSIEPFileFRI>, EPFileBuilder::freeIndex());
     add("header/data", parseAndDump<ISCSIEPFileDAT>, EPFileBuilder::data());
@@ -219,6 +299,12 @@ int main(int argc, char** argv) {
     add("entry/floor", singleLookupFloor);
     add("entry/single", singleLookup);
     add("entry/walk", wholeMapWalk);
+    add("entry/walk floor", wholeMapFloor, mapFile, mapEntries);
+    add("map/floor", wholeMapFloor, longMapFile, longMapEntries);
+    add("map/one run", mapProgram, longMapFile, longMapEntries, "");
+    add("map/fragments", mapProgram, fragmentedMapFile, mapEntries, "");
+    add("map/fragments as JSON", mapProgram, fragmentedMapFile, mapEntries, "--json");
+    add("map/fragments as a chart", mapProgram, fragmentedMapFile, mapEntries, "--chart");
     add("extent/floor", extentFloor);
     add("extent/library", extent);
     add("extent/basenc", extentProgram, std::string("basenc --base16 -w0"));
@@ -233,8 +319,16 @@ int main(int argc, char** argv) {
         reporter.printRatio(std::string("parse and dump, ") + kind + ": time against open, read, close",
                             std::string("header/") + kind, "header/floor");
     }
+    reporter.printRatio("header block: time against open, read, close", "header/read", "header/floor");
+    reporter.printRatio("parse and dump, map of 1024 pools: time against 1024 snprintf", "header/map of 1024 pools",
+                        "header/1024 UUIDs");
     reporter.printRatio("single lookup: time against the bare four system calls", "entry/single", "entry/floor");
     reporter.printRatio("whole-map walk: speed per entry against single lookups", "entry/single", "entry/walk");
+    reporter.printRatio("whole-map walk: time against looking at the top bits", "entry/walk", "entry/walk floor");
+    for (const char* map : {"one run", "fragments", "fragments as JSON", "fragments as a chart"}) {
+        reporter.printRatio(std::string("epinspect map, ") + map + ": time per entry against looking at the top bits",
+                            std::string("map/") + map, "map/floor");
+    }
     reporter.printRatio("extents of 1 MiB: speed against the copy floor", "extent/floor", "extent/library");
     for (const char* program : {"basenc", "xxd", "od"}) {
         reporter.printRatio(std::string("extents of 1 MiB: speed against ") + program, std::string("extent/") + program,

@@ -69,7 +69,8 @@ struct MapEntry {
 /// A file in the making: pieces at positions, and a size. It is written sparse.
 class EPFileBuilder {
 public:
-    /// A valid file of each kind, every field with a value of its own, nothing after the header block.
+    /// A valid file of each kind, nothing after the header block. Every byte of every field has a value of its own (but
+    /// for the type, the data start offset and the pool count), so that a field read too short or beside itself shows.
     static EPFileBuilder table();
     static EPFileBuilder map();
     static EPFileBuilder data();

@@ -23,9 +23,16 @@ public:
     /// head0DataStartOffset + `index` * `extentSize`, modulo 2^64.
     /// Returns 0, or in the order of the checks: EP_ERR_BAD_EXTENT_SIZE when `extentSize` is 0, a parseHead0() code,
     /// EP_ERR_WRONG_FILE_TYPE, EP_ERR_OPEN_FAILED, EP_ERR_SEEK_FAILED, EP_ERR_BAD_EXTENT_SIZE when memory cannot hold
-    /// the extent or its text, EP_ERR_READ_FAILED when the file ends before the extent does. `data` then keeps its
-    /// content.
+    /// the text, EP_ERR_READ_FAILED when the file ends before the extent does. `data` then keeps its content.
     int getExtentData(unsigned long long index, unsigned int extentSize, std::string& data);
+
+    /// Reads `length` bytes of extent number `index`, from `offset` in it, into `bytes` as they are; the extent lies
+    /// where getExtentData() finds it. Needs no memory of its own.
+    /// Returns 0, or in the order of the checks: EP_ERR_BAD_EXTENT_SIZE when `extentSize` is 0, EP_ERR_BAD_ARGUMENT
+    /// when the part is not inside the extent or `bytes` is null with a length, then as getExtentData(). `bytes` keep
+    /// their content, but may be partly filled after EP_ERR_READ_FAILED.
+    int getExtentBytes(unsigned long long index, unsigned int extentSize, unsigned int offset, unsigned int length,
+                       unsigned char* bytes);
 
     std::string toString() const override;
 

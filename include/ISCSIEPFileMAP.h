@@ -30,11 +30,15 @@ public:
     int getMapEntry(unsigned long long index, ISCSIEPMapEntryInfo& entry);
 
     /// Replaces `entries` by the run of `count` entries that starts at index `first`, or by fewer where the file ends
-    /// before. Reads with one open, one seek and large reads; allocates by what the file holds, not by `count`, which
-    /// may be anything. A `count` of 0 gives an empty list and touches no file.
-    /// Returns 0, or as getMapEntry() does when the entry of `first` is not there; EP_ERR_READ_FAILED also when memory
+    /// before: by none at or beyond its end. Reads with one open, one seek and large reads; allocates by what the file
+    /// holds, not by `count`, which may be anything. A `count` of 0 gives an empty list and touches no file.
+    /// Returns 0, or in the order of the checks as getMapEntry(), EP_ERR_READ_FAILED only when a read fails or memory
     /// cannot hold the run. `entries` then keeps its content.
     int getMapEntries(unsigned long long first, unsigned long long count, std::vector<ISCSIEPMapEntryInfo>& entries);
+
+    /// Puts into `count` how many whole entries the file or device holds behind its data start offset, 0 when that lies
+    /// at or beyond the end. Returns 0, or in the order of the checks as getMapEntry(); `count` then keeps its value.
+    int getEntryCount(unsigned long long& count);
 
     std::string toString() const override;
 

@@ -7,16 +7,23 @@
 
 namespace ISCSI::TOOL {
 
-/// The decoded map entry of one index: a plain value.
+/// The decoded map entry of one index: a plain value, whose small members are inline so that lists of entries cost
+/// nothing extra.
 class ISCSI_EP_EXPORT ISCSIEPMapEntryInfo {
 public:
     /// An entry of all zero bits.
-    ISCSIEPMapEntryInfo();
+    ISCSIEPMapEntryInfo() = default;
     ISCSIEPMapEntryInfo(unsigned long long entryExtentAddress, unsigned int entryPoolNumber, bool isMapped,
-                        bool isVPushed, bool isVPulled, bool isSynced);
+                        bool isVPushed, bool isVPulled, bool isSynced)
+        : extentAddress(entryExtentAddress),
+          poolNumber(entryPoolNumber),
+          mapped(isMapped),
+          vpushed(isVPushed),
+          vpulled(isVPulled),
+          synced(isSynced) {}
     ISCSIEPMapEntryInfo(const ISCSIEPMapEntryInfo&) = default;
     ISCSIEPMapEntryInfo& operator=(const ISCSIEPMapEntryInfo&) = default;
-    virtual ~ISCSIEPMapEntryInfo();
+    virtual ~ISCSIEPMapEntryInfo() = default;
 
     /// The entry as one line, its line feed included. Throws nothing but std::bad_alloc.
     std::string toString() const;

@@ -24,9 +24,10 @@ public:
         text_.reserve(text_.size() + expected);
     }
 
-    /// A line of 41 characters with the section's name in it.
+    /// A line of 41 characters with the section's name in it; longer where the name has more than 7.
     DumpText& section(std::string_view name) {
-        text_.append(16, '=').append(1, ' ').append(name).append(8 - name.size(), ' ').append(16, '=');
+        const auto blanks = name.size() < 8 ? 8 - name.size() : 1;
+        text_.append(16, '=').append(1, ' ').append(name).append(blanks, ' ').append(16, '=');
         return endLine();
     }
 
@@ -57,10 +58,10 @@ public:
     std::string str() { return std::move(text_); }
 
 private:
-    /// The label with as many tabs as bring what follows to column 24.
+    /// The label with as many tabs as bring what follows to column 24; one where the label reaches that far itself.
     std::string& label(std::string_view name) {
         const auto columns = name.size() + 1;
-        return text_.append(name).append(1, ':').append((24 - columns + 7) / 8, '\t');
+        return text_.append(name).append(1, ':').append(columns < 24 ? (24 - columns + 7) / 8 : 1, '\t');
     }
 
     DumpText& endLine() {

@@ -1,32 +1,60 @@
 #include "EPFileStream.h"
 
-#include <exception>
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+
+#include "etc/ISCSIEPLog.h"
 
 namespace ISCSI::TOOL {
 
-EPFileStream::EPFileStream(const std::string& path) noexcept {
-    try {
-        file_.pubsetbuf(nullptr, 0);
-        file_.open(path, std::ios::in | std::ios::binary);
-    } catch (const std::exception&) {  // no memory: the file stays closed
-    }
+static_assert(sizeof(off_t) == 8, "positions of files have 64 bits on every target");
+
+EPFileStream::EPFileStream(const std::string& path) noexcept
+    : descriptor_(::open(path.c_str(), O_RDONLY | O_CLOEXEC)), openError_(descriptor_ < 0 ? errno : 0) {}
+
+EPFileStream::~EPFileStream() {
+    const ErrnoKeeper keeper;
+    if (descriptor_ >= 0) ::close(descriptor_);
+}
+
+bool EPFileStream::isOpen() const noexcept {
+    if (descriptor_ < 0) errno = openError_;
+    return descriptor_ >= 0;
 }
 
 bool EPFileStream::seek(std::uint64_t position) noexcept {
-    try {
-        const auto offset = static_cast<std::streamoff>(position);
-        return file_.pubseekoff(offset, std::ios::beg, std::ios::in) != std::filebuf::pos_type(std::streamoff{-1});
-    } catch (const std::exception&) {
-        return false;
-    }
+    return ::lseek(descriptor_, static_cast<off_t>(position), SEEK_SET) >= 0;
 }
 
-std::streamsize EPFileStream::readUpTo(unsigned char* bytes, std::streamsize size) noexcept {
-    try {
-        return file_.sgetn(reinterpret_cast<char*>(bytes), size);
-    } catch (const std::exception&) {
-        return -1;
+std::optional<std::uint64_t> EPFileStream::seekToEnd() noexcept {
+    const off_t end = ::lseek(descriptor_, 0, SEEK_END);
+    if (end < 0) return std::nullopt;
+    return static_cast<std::uint64_t>(end);
+}
+
+std::optional<std::size_t> EPFileStream::readUpTo(unsigned char* bytes, std::size_t size) noexcept {
+    constexpr std::size_t largestRequest = std::size_t{1}
+                                           << 30U;  // of which the system tells the result on every target
+    std::size_t got = 0;
+    while (got < size) {
+        const ssize_t arrived = ::read(descriptor_, bytes + got, std::min(size - got, largestRequest));
+        if (arrived == 0) break;
+        if (arrived > 0) {
+            got += static_cast<std::size_t>(arrived);
+        } else if (errno != EINTR) {
+            return std::nullopt;
+        }
     }
+    return got;
+}
+
+bool EPFileStream::read(unsigned char* bytes, std::size_t size) noexcept {
+    const std::optional<std::size_t> got = readUpTo(bytes, size);
+    if (got && *got < size) errno = 0;
+    return got == size;
 }
 
 }  // namespace ISCSI::TOOL

@@ -8,20 +8,40 @@
 
 namespace ISCSI::TOOL {
 
-/// How one lookup names itself in the log, and the type of file it insists on.
-struct EPLookup {
+/// The identity of a lookup in the log: the source file and the name it goes by, and the line of each of its failures;
+/// and the type of file it insists on.
+struct EPLookupIdentity {
     const char* sourceFile;
     const char* operation;
     unsigned int fileType;
-    int headerLine, typeLine, openLine, seekLine, readLine;
+    int parseLine = 0, typeLine = 0, openLine = 0, seekLine = 0, readLine = 0;
+
+    constexpr EPLookupIdentity(const char* inFile, const char* name, unsigned int type)
+        : sourceFile(inFile), operation(name), fileType(type) {}
+
+    constexpr EPLookupIdentity parseFailsAt(int line) const { return with(&EPLookupIdentity::parseLine, line); }
+    constexpr EPLookupIdentity typeFailsAt(int line) const { return with(&EPLookupIdentity::typeLine, line); }
+    constexpr EPLookupIdentity openFailsAt(int line) const { return with(&EPLookupIdentity::openLine, line); }
+    constexpr EPLookupIdentity seekFailsAt(int line) const { return with(&EPLookupIdentity::seekLine, line); }
+    constexpr EPLookupIdentity readFailsAt(int line) const { return with(&EPLookupIdentity::readLine, line); }
+
+private:
+    constexpr EPLookupIdentity with(int EPLookupIdentity::*member, int line) const {
+        EPLookupIdentity changed = *this;
+        changed.*member = line;
+        return changed;
+    }
 };
 
 /// Decodes HEAD[0] of `file` unless that is done, tests its type, then whether `stream` (opened by the caller on the
-/// same path) is open, and goes to item `index` of `itemSize` bytes. Returns 0 or the code of the failure it logged.
-int seekToItem(ISCSIEPFile& file, EPFileStream& stream, const EPLookup& lookup, std::uint64_t index,
-               std::uint32_t itemSize);
+/// same path) is open. Returns 0 or the code of the failure it logged.
+int openForLookup(ISCSIEPFile& file, const EPFileStream& stream, const EPLookupIdentity& lookup);
 
-/// Logs the failed read of a lookup and returns its code.
-int readFailed(const ISCSIEPFile& file, const EPLookup& lookup);
+/// openForLookup(), then goes to `offset` (modulo 2^64) behind the data start offset.
+int seekToItem(ISCSIEPFile& file, EPFileStream& stream, const EPLookupIdentity& lookup, std::uint64_t offset);
+
+/// Each logs the failed step of a lookup and returns its code.
+int seekFailed(const ISCSIEPFile& file, const EPLookupIdentity& lookup);
+int readFailed(const ISCSIEPFile& file, const EPLookupIdentity& lookup);
 
 }  // namespace ISCSI::TOOL

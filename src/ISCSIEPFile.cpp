@@ -3,15 +3,14 @@
 #include <cstdlib>
 #include <limits>
 #include <optional>
-#include <string_view>
 
 #include "DumpText.h"
 #include "EPFileStream.h"
 #include "EPLayout.h"
-#include "EPLog.h"
 #include "ISCSILUNConfInfo.h"
 #include "ISCSILUNText.h"
 #include "LittleEndian.h"
+#include "etc/ISCSIEPLog.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
 namespace ISCSI::TOOL {
@@ -76,40 +75,20 @@ namespace {
 std::optional<int> volumeIdIn(const std::string& path) {
     static constexpr char prefix[] = "/volume";
     constexpr auto prefixLength = sizeof prefix - 1;
+    errno = 0;  // the system is not to blame
     if (path.compare(0, prefixLength, prefix) != 0) return std::nullopt;
     const char* digits = path.c_str() + prefixLength;
     char* end = nullptr;
     const long long id = std::strtoll(digits, &end, 10);  // ends at its own limits when there are too many digits
+    errno = 0;                                            // of those too
     if (end == digits || id < std::numeric_limits<int>::min() || id > std::numeric_limits<int>::max()) {
         return std::nullopt;
     }
     return static_cast<int>(id);
 }
 
-/// How one of the operations for the files of a volume names itself in the log.
-struct VolumeFileLookup {
-    const char* operation;
-    const char* kind;
-    int missingLine, invalidLine;
-};
-
-/// Puts the path of `fileName` in the EP folder of the volume that `path` names into `filePath`.
-int volumeFilePath(const std::string& path, const VolumeFileLookup& lookup, std::string_view fileName,
-                   std::string& filePath) {
-    static constexpr const char* sourceFile = GetSourceFileName(__FILE__);
-    const std::optional<int> id = volumeIdIn(path);
-    if (!id) {
-        EP_LOG_ERR_FOR(sourceFile, lookup.operation, lookup.missingLine, "Failed to get %s file path. path: %s",
-                       lookup.kind, path.c_str());
-        return EP_ERR_NO_PATH;
-    }
-    if (*id <= 0) {
-        EP_LOG_ERR_FOR(sourceFile, lookup.operation, lookup.invalidLine, "Failed to get volume ID. path: %s",
-                       path.c_str());
-        return EP_ERR_NO_PATH;
-    }
-    filePath = "/volume" + std::to_string(*id) + "/@iSCSI/EP/" + std::string(fileName);
-    return 0;
+std::string volumeFile(int volumeId, const std::string& name) {
+    return "/volume" + std::to_string(volumeId) + "/@iSCSI/EP/" + name;
 }
 
 }  // namespace
@@ -120,19 +99,49 @@ int ISCSIEPFile::getJNLFilePath(std::string& filePath) const {
 }
 
 int ISCSIEPFile::getTBLFilePath(std::string& filePath) const {
-    return volumeFilePath(path, {"getTBLFilePath", "TBL", 106, 110}, "EP_TBL", filePath);
+    const std::optional<int> id = volumeIdIn(path);
+    if (!id) {
+        EP_LOG_ERR(106, "Failed to get TBL file path. path: %s", path.c_str());
+        return EP_ERR_NO_PATH;
+    }
+    if (*id <= 0) {
+        EP_LOG_ERR(110, "Failed to get volume ID. path: %s", path.c_str());
+        return EP_ERR_NO_PATH;
+    }
+    filePath = volumeFile(*id, "EP_TBL");
+    return 0;
 }
 
 int ISCSIEPFile::getFRIFilePath(std::string& filePath) const {
-    return volumeFilePath(path, {"getFRIFilePath", "FRI", 129, 133}, "EP_FRI", filePath);
+    const std::optional<int> id = volumeIdIn(path);
+    if (!id) {
+        EP_LOG_ERR(129, "Failed to get FRI file path. path: %s", path.c_str());
+        return EP_ERR_NO_PATH;
+    }
+    if (*id <= 0) {
+        EP_LOG_ERR(133, "Failed to get volume ID. path: %s", path.c_str());
+        return EP_ERR_NO_PATH;
+    }
+    filePath = volumeFile(*id, "EP_FRI");
+    return 0;
 }
 
 int ISCSIEPFile::getDATFilePath(unsigned int extentSize, unsigned long long extentAddress,
                                 std::string& filePath) const {
     constexpr unsigned int bitsPerFile = 42;  // each data file holds 4 TiB
+    const std::optional<int> id = volumeIdIn(path);
+    if (!id) {
+        EP_LOG_ERR(153, "Failed to get DAT file path. path: %s", path.c_str());
+        return EP_ERR_NO_PATH;
+    }
+    if (*id <= 0) {
+        EP_LOG_ERR(157, "Failed to get volume ID. path: %s", path.c_str());
+        return EP_ERR_NO_PATH;
+    }
     const std::string number = std::to_string((extentSize * extentAddress) >> bitsPerFile);
     const std::string zeros(number.size() < 5 ? 5 - number.size() : 0, '0');
-    return volumeFilePath(path, {"getDATFilePath", "DAT", 153, 157}, "EP_DAT_" + zeros + number, filePath);
+    filePath = volumeFile(*id, "EP_DAT_" + zeros + number);
+    return 0;
 }
 
 int ISCSIEPFile::getMAPFilePath(unsigned int lid, std::string& filePath) const {

@@ -1,28 +1,64 @@
 #include "ISCSIEPFileDAT.h"
 
-#include <memory>
+#include <algorithm>
+#include <exception>
 #include <new>
 
 #include "DumpText.h"
 #include "EPLayout.h"
-#include "EPLog.h"
 #include "EPLookup.h"
 #include "LittleEndian.h"
+#include "etc/ISCSIEPLog.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
 namespace ISCSI::TOOL {
 
 namespace {
 
-constexpr EPLookup extentLookup = {
-    GetSourceFileName(__FILE__), "getExtentData", EP_FILE_TYPE_DAT, 69, 73, 77, 82, 87,
-};
+constexpr EPLookupIdentity extentLookup = EPLookupIdentity(__FILE_NAME__, "getExtentData", EP_FILE_TYPE_DAT)
+                                              .parseFailsAt(69)
+                                              .typeFailsAt(73)
+                                              .openFailsAt(77)
+                                              .seekFailsAt(82)
+                                              .readFailsAt(87);
+constexpr EPLookupIdentity bytesLookup = EPLookupIdentity(__FILE_NAME__, "getExtentBytes", EP_FILE_TYPE_DAT)
+                                             .parseFailsAt(102)
+                                             .typeFailsAt(103)
+                                             .openFailsAt(104)
+                                             .seekFailsAt(105)
+                                             .readFailsAt(106);
 
 /// Logs an extent size that cannot be used and returns its code.
-int unusableExtentSize(const ISCSIEPFile& file, unsigned int extentSize) {
-    EP_LOG_ERR_FOR(extentLookup.sourceFile, extentLookup.operation, 65, "Invaild LUN extent size: %d. path: %s",
+int unusableExtentSize(const ISCSIEPFile& file, const EPLookupIdentity& lookup, int line, unsigned int extentSize) {
+    EP_LOG_ERR_FOR(lookup.sourceFile, lookup.operation, line, "Invaild LUN extent size: %d. path: %s",
                    static_cast<int>(extentSize), file.path.c_str());
     return EP_ERR_BAD_EXTENT_SIZE;
+}
+
+/// Reads `size` bytes from `stream` and makes their hexadecimal digits the content of `text`, which is empty. False
+/// when the read fails. Throws when memory cannot hold the digits.
+bool readDigits(EPFileStream& stream, std::size_t size, std::string& text) {
+#ifdef __cpp_lib_string_resize_and_overwrite
+    // The bytes arrive in the second half of the room for the digits, which nothing has filled before.
+    text.resize_and_overwrite(2 * size, [&stream, size](char* digits, std::size_t /*room*/) -> std::size_t {
+        auto* bytes = reinterpret_cast<unsigned char*>(digits + size);
+        if (!stream.read(bytes, size)) return 0;
+        PutHexDigits(bytes, size, digits);
+        return 2 * size;
+    });
+    return !text.empty();
+#else
+    text.reserve(2 * size);
+    unsigned char block[EP_HEADER_BLOCK_SIZE];
+    for (std::size_t done = 0; done < size;) {
+        const std::size_t count = std::min(size - done, sizeof block);
+        if (!stream.read(block, count)) return false;
+        text.append(2 * count, '0');
+        PutHexDigits(block, count, &text[2 * done]);
+        done += count;
+    }
+    return true;
+#endif
 }
 
 }  // namespace
@@ -46,15 +82,38 @@ int ISCSIEPFileDAT::parseFile() {
 }
 
 int ISCSIEPFileDAT::getExtentData(unsigned long long index, unsigned int extentSize, std::string& data) {
+    constexpr int extentSizeLine = 65;
     EPFileStream stream(path);
-    if (extentSize == 0) return unusableExtentSize(*this, extentSize);
-    const int error = seekToItem(*this, stream, extentLookup, index, extentSize);
+    if (extentSize == 0) {
+        errno = 0;
+        return unusableExtentSize(*this, extentLookup, extentSizeLine, extentSize);
+    }
+    const int error = seekToItem(*this, stream, extentLookup, index * extentSize);
     if (error != 0) return error;
-    if (2ULL * extentSize > data.max_size()) return unusableExtentSize(*this, extentSize);
-    const std::unique_ptr<unsigned char[]> extent(new (std::nothrow) unsigned char[extentSize]);
-    if (extent == nullptr) return unusableExtentSize(*this, extentSize);
-    if (!stream.read(extent.get(), static_cast<std::streamsize>(extentSize))) return readFailed(*this, extentLookup);
-    return GetHexInString(extent.get(), extentSize, data) == 0 ? 0 : unusableExtentSize(*this, extentSize);
+    std::string text;
+    try {
+        if (2ULL * extentSize > text.max_size()) throw std::bad_alloc();
+        if (!readDigits(stream, extentSize, text)) return readFailed(*this, extentLookup);
+    } catch (const std::exception&) {
+        errno = ENOMEM;
+        return unusableExtentSize(*this, extentLookup, extentSizeLine, extentSize);
+    }
+    data.swap(text);
+    return 0;
+}
+
+int ISCSIEPFileDAT::getExtentBytes(unsigned long long index, unsigned int extentSize, unsigned int offset,
+                                   unsigned int length, unsigned char* bytes) {
+    EPFileStream stream(path);
+    errno = 0;
+    if (extentSize == 0) return unusableExtentSize(*this, bytesLookup, 101, extentSize);
+    if (offset > extentSize || length > extentSize - offset || (bytes == nullptr && length > 0)) {
+        EP_LOG_ERR(107, "Invalid part of an extent: %u bytes from %u. path: %s", length, offset, path.c_str());
+        return EP_ERR_BAD_ARGUMENT;
+    }
+    const int error = seekToItem(*this, stream, bytesLookup, index * extentSize + offset);
+    if (error != 0) return error;
+    return stream.read(bytes, length) ? 0 : readFailed(*this, bytesLookup);
 }
 
 std::string ISCSIEPFileDAT::toString() const {

@@ -3,6 +3,7 @@
 #include "DumpText.h"
 #include "EPLayout.h"
 #include "LittleEndian.h"
+#include "etc/ISCSIEPLog.h"
 
 namespace ISCSI::TOOL {
 

@@ -1,30 +1,45 @@
 #include "ISCSIEPFileMAP.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <cstdint>
 #include <exception>
+#include <iterator>
 #include <memory>
+#include <optional>
 #include <utility>
 
 #include "DumpText.h"
 #include "EPLayout.h"
 #include "EPLookup.h"
 #include "LittleEndian.h"
+#include "etc/ISCSIEPLog.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
 namespace ISCSI::TOOL {
 
 namespace {
 
-constexpr unsigned int maxPoolCount = (EP_HEADER_BLOCK_SIZE - EP_SEG0) / EP_UUID_SIZE;
-constexpr unsigned int entriesPerRead = 8192;
+constexpr std::size_t entriesPerRead = 8192;
 
-constexpr EPLookup entryLookup = {
-    GetSourceFileName(__FILE__), "getMapEntry", EP_FILE_TYPE_MAP, 172, 176, 180, 185, 189,
-};
-constexpr EPLookup entriesLookup = {
-    GetSourceFileName(__FILE__), "getMapEntries", EP_FILE_TYPE_MAP, 201, 202, 203, 204, 205,
-};
+constexpr EPLookupIdentity entryLookup = EPLookupIdentity(__FILE_NAME__, "getMapEntry", EP_FILE_TYPE_MAP)
+                                             .parseFailsAt(172)
+                                             .typeFailsAt(176)
+                                             .openFailsAt(180)
+                                             .seekFailsAt(185)
+                                             .readFailsAt(189);
+constexpr EPLookupIdentity entriesLookup = EPLookupIdentity(__FILE_NAME__, "getMapEntries", EP_FILE_TYPE_MAP)
+                                               .parseFailsAt(201)
+                                               .typeFailsAt(202)
+                                               .openFailsAt(203)
+                                               .seekFailsAt(204)
+                                               .readFailsAt(205);
+constexpr EPLookupIdentity countLookup = EPLookupIdentity(__FILE_NAME__, "getEntryCount", EP_FILE_TYPE_MAP)
+                                             .parseFailsAt(211)
+                                             .typeFailsAt(212)
+                                             .openFailsAt(213)
+                                             .seekFailsAt(214)
+                                             .readFailsAt(215);
 
 // Bits 48 to 51 count in both fields until the program that writes map files settles to which they belong.
 constexpr std::uint64_t extentAddressMask = 0x000FFFFFFFFFFFFF;
@@ -49,24 +64,46 @@ int appendUUID(const unsigned char* bytes, std::vector<std::string>& list) {
     if (error != 0) return error;
     try {
         list.push_back(std::move(text));
-    } catch (const std::exception&) {  // no memory
+    } catch (const std::exception&) {
+        errno = ENOMEM;
         return EP_ERR_BAD_UUID;
     }
     return 0;
 }
 
+/// Goes through the entries that stored bytes hold.
+class StoredEntries {
+public:
+    using iterator_category = std::forward_iterator_tag;
+    using value_type = ISCSIEPMapEntryInfo;
+    using difference_type = std::ptrdiff_t;
+    using pointer = const value_type*;
+    using reference = value_type;
+
+    explicit StoredEntries(const unsigned char* bytes) : bytes_(bytes) {}
+    value_type operator*() const { return decodeEntry(bytes_); }
+    StoredEntries& operator++() {
+        bytes_ += EP_MAP_ENTRY_SIZE;
+        return *this;
+    }
+    bool operator!=(const StoredEntries& other) const { return bytes_ != other.bytes_; }
+    bool operator==(const StoredEntries& other) const { return bytes_ == other.bytes_; }
+
+private:
+    const unsigned char* bytes_;
+};
+
 /// Appends entries from `stream` to `run` until it holds `count`, or all up to the end of the file. False on an error.
 bool readEntries(EPFileStream& stream, std::uint64_t count, std::vector<ISCSIEPMapEntryInfo>& run) {
-    const auto blockEntries = std::min<std::uint64_t>(count, entriesPerRead);
-    const std::unique_ptr<unsigned char[]> block(
-        new unsigned char[static_cast<std::size_t>(blockEntries * EP_MAP_ENTRY_SIZE)]);
+    const auto blockEntries = static_cast<std::size_t>(std::min<std::uint64_t>(count, entriesPerRead));
+    const std::unique_ptr<unsigned char[]> block(new unsigned char[blockEntries * EP_MAP_ENTRY_SIZE]);
     while (run.size() < count) {
-        const auto wanted = std::min(count - run.size(), blockEntries);
-        const auto got = stream.readUpTo(block.get(), static_cast<std::streamsize>(wanted * EP_MAP_ENTRY_SIZE));
-        if (got < 0) return false;
-        const auto arrived = static_cast<std::size_t>(got) / EP_MAP_ENTRY_SIZE;
-        if (run.empty()) run.reserve(arrived);
-        for (std::size_t i = 0; i < arrived; ++i) run.push_back(decodeEntry(block.get() + i * EP_MAP_ENTRY_SIZE));
+        const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(count - run.size(), blockEntries));
+        const std::optional<std::size_t> got = stream.readUpTo(block.get(), wanted * EP_MAP_ENTRY_SIZE);
+        if (!got) return false;
+        const std::size_t arrived = *got / EP_MAP_ENTRY_SIZE;
+        const unsigned char* end = block.get() + arrived * EP_MAP_ENTRY_SIZE;
+        run.insert(run.end(), StoredEntries(block.get()), StoredEntries(end));
         if (arrived < wanted) break;
     }
     return true;
@@ -92,10 +129,7 @@ int ISCSIEPFileMAP::parseFile() {
     logicBlockSize = le32(head1 + 8);
     totalCount = le64(head1 + 12);
     error = GetUUIDInString(head1 + 20, parentUUID);
-    if (error != 0) {
-        EP_LOG_ERR(84, "Failed to get HEAD[1] parent UUID. path: %s", path.c_str());
-        return error;
-    }
+    if (error != 0) return EP_LOG_ERR(84, "Failed to get HEAD[1] parent UUID. path: %s", path.c_str()), error;
     parentTotalCount = le64(head1 + 36);
 
     const unsigned char* var0 = headerBlock + EP_VAR0;
@@ -107,10 +141,7 @@ int ISCSIEPFileMAP::parseFile() {
     seg0Checksum = le32(var1 + 4);
     seg0PoolCount = le32(var1 + 8);
     error = GetUUIDInString(var1 + 12, sessionUUID);
-    if (error != 0) {
-        EP_LOG_ERR(114, "Failed to get VAR[1] session UUID. path: %s", path.c_str());
-        return error;
-    }
+    if (error != 0) return EP_LOG_ERR(114, "Failed to get VAR[1] session UUID. path: %s", path.c_str()), error;
     promoteTime = le32(var1 + 28);
 
     const unsigned char* var2 = headerBlock + EP_VAR2;
@@ -118,22 +149,13 @@ int ISCSIEPFileMAP::parseFile() {
     syncCount = le64(var2 + 4);
     childAttribute = le32(var2 + 12);
     error = GetUUIDInString(var2 + 16, trackUUID);
-    if (error != 0) {
-        EP_LOG_ERR(136, "Failed to get VAR[2] track UUID. path: %s", path.c_str());
-        return error;
-    }
+    if (error != 0) return EP_LOG_ERR(136, "Failed to get VAR[2] track UUID. path: %s", path.c_str()), error;
     error = GetUUIDInString(var2 + 32, previousTrackUUID);
-    if (error != 0) {
-        EP_LOG_ERR(140, "Failed to get VAR[2] previous track UUID. path: %s", path.c_str());
-        return error;
-    }
+    if (error != 0) return EP_LOG_ERR(140, "Failed to get VAR[2] previous track UUID. path: %s", path.c_str()), error;
     error = GetUUIDInString(var2 + 48, currentTrackUUID);
-    if (error != 0) {
-        EP_LOG_ERR(144, "Failed to get VAR[2] current track UUID. path: %s", path.c_str());
-        return error;
-    }
+    if (error != 0) return EP_LOG_ERR(144, "Failed to get VAR[2] current track UUID. path: %s", path.c_str()), error;
 
-    const std::size_t poolCount = std::min(seg0PoolCount, maxPoolCount);
+    const std::size_t poolCount = std::min(seg0PoolCount, EP_POOL_COUNT_MAX);
     for (std::size_t i = 0; i < poolCount; ++i) {
         error = appendUUID(headerBlock + EP_SEG0 + i * EP_UUID_SIZE, poolUUIDs);
         if (error != 0) {
@@ -146,7 +168,7 @@ int ISCSIEPFileMAP::parseFile() {
 
 int ISCSIEPFileMAP::getMapEntry(unsigned long long index, ISCSIEPMapEntryInfo& entry) {
     EPFileStream stream(path);
-    const int error = seekToItem(*this, stream, entryLookup, index, EP_MAP_ENTRY_SIZE);
+    const int error = seekToItem(*this, stream, entryLookup, index * EP_MAP_ENTRY_SIZE);
     if (error != 0) return error;
     unsigned char bytes[EP_MAP_ENTRY_SIZE];
     if (!stream.read(bytes, sizeof bytes)) return readFailed(*this, entryLookup);
@@ -159,15 +181,26 @@ int ISCSIEPFileMAP::getMapEntries(unsigned long long first, unsigned long long c
     std::vector<ISCSIEPMapEntryInfo> run;
     if (count > 0) {
         EPFileStream stream(path);
-        const int error = seekToItem(*this, stream, entriesLookup, first, EP_MAP_ENTRY_SIZE);
+        const int error = seekToItem(*this, stream, entriesLookup, first * EP_MAP_ENTRY_SIZE);
         if (error != 0) return error;
         try {
-            if (!readEntries(stream, count, run) || run.empty()) return readFailed(*this, entriesLookup);
-        } catch (const std::exception&) {  // no memory
+            if (!readEntries(stream, count, run)) return readFailed(*this, entriesLookup);
+        } catch (const std::exception&) {
+            errno = ENOMEM;
             return readFailed(*this, entriesLookup);
         }
     }
     entries.swap(run);
+    return 0;
+}
+
+int ISCSIEPFileMAP::getEntryCount(unsigned long long& count) {
+    EPFileStream stream(path);
+    const int error = openForLookup(*this, stream, countLookup);
+    if (error != 0) return error;
+    const std::optional<std::uint64_t> end = stream.seekToEnd();
+    if (!end) return seekFailed(*this, countLookup);
+    count = *end > head0DataStartOffset ? (*end - head0DataStartOffset) / EP_MAP_ENTRY_SIZE : 0;
     return 0;
 }
 

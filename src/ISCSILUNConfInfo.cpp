@@ -3,18 +3,20 @@
 #include <kelpiscsiep.h>
 
 #include <algorithm>
+#include <cstddef>
 #include <cstring>
 
-#include "DumpText.h"
 #include "ISCSILUNText.h"
+#include "LineText.h"
+#include "etc/ISCSIEPLog.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
 namespace ISCSI::TOOL {
 
 namespace {
 
-/// The record that the platform library fills. Its numbers are in the host's byte order; what is not read here is
-/// unknown.
+/// The record that the platform library fills, aligned as the structure that it is to that library. Its numbers are in
+/// the host's byte order; what is not read here is unknown.
 class LUNRecord {
 public:
     unsigned char* bytes() { return bytes_; }
@@ -33,7 +35,7 @@ public:
     }
 
 private:
-    unsigned char bytes_[KELPISCSI_LUN_RECORD_SIZE] = {};
+    alignas(std::max_align_t) unsigned char bytes_[KELPISCSI_LUN_RECORD_SIZE] = {};
 };
 
 }  // namespace
@@ -46,19 +48,22 @@ ISCSILUNConfInfo::~ISCSILUNConfInfo() = default;
 
 int ISCSILUNConfInfo::loadFromConfig() {
     LUNRecord record;
+    errno = 0;
     const int error = KELPiSCSILunGetByLid(lid, 0, record.bytes());
     if (error != 0) {
+        const ErrnoKeeper keeper;
+        const char* text = KELPiSCSIStrError(error);
         EP_LOG_ERR(43, "Failed to get LUN config by LUN ID. info: %s. error: %d (%s)", toString().c_str(), error,
-                   KELPiSCSIStrError(error));
+                   text != nullptr ? text : "no text");
         return error;
     }
-    std::string newUUID = record.text(44);
-    std::string newRootPath = record.text(118);
-    std::string newName = record.text(4213);
-    extentSize = record.number<std::uint32_t>(20);
-    size = record.number<std::uint64_t>(24);
-    restoreTime = record.number<std::uint32_t>(32);
-    type = record.number<std::int32_t>(36);
+    std::string newUUID = record.text(KELPISCSI_LUN_UUID);
+    std::string newRootPath = record.text(KELPISCSI_LUN_ROOT_PATH);
+    std::string newName = record.text(KELPISCSI_LUN_NAME);
+    extentSize = record.number<std::uint32_t>(KELPISCSI_LUN_EXTENT_SIZE);
+    size = record.number<std::uint64_t>(KELPISCSI_LUN_SIZE);
+    restoreTime = record.number<std::uint32_t>(KELPISCSI_LUN_RESTORE_TIME);
+    type = record.number<std::int32_t>(KELPISCSI_LUN_TYPE);
     uuid.swap(newUUID);
     rootPath.swap(newRootPath);
     name.swap(newName);
@@ -66,18 +71,16 @@ int ISCSILUNConfInfo::loadFromConfig() {
 }
 
 std::string ISCSILUNConfInfo::toString() const {
-    std::string text = "lid: ";
-    appendNumber(text, lid);
-    appendNumber(text.append(" ,extent_size: "), extentSize);
-    text.append(" (").append(GetSizeInString(extentSize)).append(")");
-    appendNumber(text.append(" ,size: "), size);
-    text.append(" (").append(GetSizeInString(size)).append(")");
-    text.append(" ,restore time: ").append(GetTimeInString(restoreTime));
-    text.append(" ,type: ").append(GetLUNTypeInString(type));
-    text.append(" ,uuid: ").append(uuid);
-    text.append(" ,rootpath: ").append(rootPath);
-    text.append(" ,name: ").append(name);
-    return text;
+    return LineText()
+        .dec("lid", lid)
+        .dec("extent_size", extentSize, GetSizeInString(extentSize))
+        .dec("size", size, GetSizeInString(size))
+        .text("restore time", GetTimeInString(restoreTime))
+        .text("type", GetLUNTypeInString(type))
+        .text("uuid", uuid)
+        .text("rootpath", rootPath)
+        .text("name", name)
+        .str();
 }
 
 }  // namespace ISCSI::TOOL

@@ -2,9 +2,11 @@
 #pragma once
 
 #include <gtest/gtest.h>
-#include <syslog.h>
 
+#include <cerrno>
 #include <cstdarg>
+#include <cstdio>
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <string>
@@ -14,19 +16,23 @@
 
 using Lines = std::vector<std::string>;
 
-inline Lines logLines;
+inline Lines logLines, logFormats;
 inline bool logging = false;  ///< syslog() is at work: a test that makes memory scarce spares it
 
-/// What the library writes to the system log; a line that was not at LOG_ERR says so.
-extern "C" __attribute__((visibility("default"))) void syslog(int priority, const char* format, ...) {
+/// syslog() itself, whatever a hardened build makes of that name: keeps what the library writes to the system log. A
+/// line that was not at LOG_ERR says so. Disturbs errno, as the real one may.
+void keepLogLine(int priority, const char* format, ...) __asm__("syslog");
+__attribute__((visibility("default"), format(printf, 2, 3))) void keepLogLine(int priority, const char* format, ...) {
     char text[8192];
     va_list arguments;
     va_start(arguments, format);
     std::vsnprintf(text, sizeof text, format, arguments);
     va_end(arguments);
     logging = true;
-    logLines.push_back(priority == LOG_ERR ? text : "not LOG_ERR: " + std::string(text));
+    logFormats.emplace_back(format);
+    logLines.push_back(priority == 3 ? text : "not LOG_ERR: " + std::string(text));
     logging = false;
+    errno = EDOM;
 }
 
 /// The lines logged since the last call.
@@ -41,7 +47,7 @@ inline Lines chain(const std::string& path, Lines sources) {
 /// A folder of the test's own, gone at its end.
 class TempDir {
 public:
-    TempDir() { mkdtemp(path_.data()); }
+    TempDir() { EXPECT_NE(nullptr, mkdtemp(path_.data())); }
     ~TempDir() { std::filesystem::remove_all(path_); }
 
     std::string path(const std::string& name) const { return path_ + "/" + name; }

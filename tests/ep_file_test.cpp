@@ -4,10 +4,15 @@
 #include <ISCSIEPFileJNL.h>
 #include <ISCSIEPFileMAP.h>
 #include <ISCSIEPFileTBL.h>
+#include <ISCSILUNConfInfo.h>
+#include <unistd.h>
 
+#include <algorithm>
+#include <cerrno>
 #include <cstring>
 #include <future>
 #include <locale>
+#include <new>
 
 #include "Support.h"
 
@@ -16,28 +21,49 @@ using epbuilder::EPFileBuilder;
 
 namespace {
 
-/// A valid file of kind `File` is shown as HEAD[0] with `type` and `uuid`, then `sections`; an unreadable one leaves
-/// the object as it was, and a chain of lines that ends with `line` of the class.
+constexpr const char* freshHead0 =
+    "================ HEAD[0] ================\nchecksum:\t\t0x0\nversion:\t\t0\nmagic code:\t\t0x0\n"
+    "type:\t\t\t0\nUUID:\t\t\t\ndata start offset:\t0x0\ncreate time:\t\tThu Jan 01 00:00:00 UTC 1970\n";
+
+/// What a new object shows, made where memory holds something else.
 template <typename File>
-void expectKind(const EPFileBuilder& builder, const std::string& type, const std::string& uuid,
-                const std::string& sections, const std::string& line) {
+std::string freshDump() {
+    alignas(File) unsigned char memory[sizeof(File)];
+    std::memset(memory, 0xaa, sizeof memory);
+    auto* file = new (memory) File();
+    const std::string dump = file->toString();
+    file->~File();
+    return dump;
+}
+
+/// One kind of file as the builder makes it: type and UUID in HEAD[0], the further sections of a new object and of the
+/// parsed file, and the source and line of the class's own message.
+struct Kind {
+    std::string type, uuid, freshSections, sections, source;
+};
+
+/// The file is shown as promised; an unreadable one leaves the object as it was, and a chain of lines.
+template <typename File>
+void expectKind(const EPFileBuilder& builder, const Kind& kind) {
     const TempDir folder;
     const std::string path = folder.write("file", builder);
     File file(path);
-    const std::string fresh = file.toString();
+    const std::string fresh = freshHead0 + kind.freshSections;
+    EXPECT_EQ(fresh, freshDump<File>());
     EXPECT_EQ(0, file.parseFile());
     const std::string head0 =
-        "================ HEAD[0] ================\nchecksum:\t\t0xa1b2c3d\nversion:\t\t2\n"
+        "================ HEAD[0] ================\nchecksum:\t\t0xa1b2c3d\nversion:\t\t33752069\n"
         "magic code:\t\t0x1122334455667788\ntype:\t\t\t" +
-        type + "\nUUID:\t\t\t" + uuid + "\ndata start offset:\t0x6000\ncreate time:\t\tSun Sep 13 12:26:40 UTC 2020\n";
-    EXPECT_EQ(head0 + sections, static_cast<const ISCSIEPFile&>(file).toString());
+        kind.type + "\nUUID:\t\t\t" + kind.uuid +
+        "\ndata start offset:\t0x6162636465666768\ncreate time:\t\tSun Sep 13 12:26:40 UTC 2020\n";
+    EXPECT_EQ(head0 + kind.sections, static_cast<const ISCSIEPFile&>(file).toString());
     EXPECT_EQ(head0, file.ISCSIEPFile::toString());
 
     const auto expectFailure = [&](const std::string& unreadable, int code, const std::string& first) {
         File other(unreadable);
         EXPECT_EQ(code, other.parseFile()) << unreadable;
         EXPECT_EQ(chain(unreadable, {first, "ISCSIEPFile.cpp:59:parseHead0 Failed to read header.",
-                                     line + ":parseFile Failed to get parse HEAD[0]."}),
+                                     kind.source + ":parseFile Failed to get parse HEAD[0]."}),
                   takeLog());
         EXPECT_EQ(fresh, other.toString());
     };
@@ -46,11 +72,9 @@ void expectKind(const EPFileBuilder& builder, const std::string& type, const std
     const std::string failedRead = "ISCSIEPFile.cpp:42:readHeader Failed to read file.";
     expectFailure(folder.path(""), 18990039, failedRead);
     expectFailure("/dev/null", 18990039, failedRead);
-    for (std::uintmax_t size = 24576; size-- > 0;) {
+    for (const unsigned int size : {24575U, 20000U, 4096U, 47U, 1U, 0U}) {
         std::filesystem::resize_file(path, size);
-        if (size % 1000 == 575 || size < 5) expectFailure(path, 18990039, failedRead);
-        ASSERT_EQ(18990039, ISCSIEPFile(path).readHeader()) << size;
-        takeLog();
+        expectFailure(path, 18990039, failedRead);
     }
 }
 
@@ -65,54 +89,108 @@ struct Grouping : std::numpunct<char> {
 // clang-format off
 TEST(EPFile, EveryKindIsDecodedAndShownWhateverTheGlobalLocale) {
     const std::locale before = std::locale::global(std::locale(std::locale::classic(), new Grouping));
-    expectKind<ISCSIEPFileTBL>(
-        EPFileBuilder::table().set(epbuilder::tbl::totalCount, 0xffffffffffffffff), "1", "10111213-1415-1617-1819-1a1b1c1d1e1f",
-        "================ HEAD[1] ================\nchecksum:\t\t0xa1\nextent size:\t\t1048576\nentry size:\t\t16\ntotal count:\t\t18446744073709551615\n", "ISCSIEPFileTBL.cpp:41");
-    expectKind<ISCSIEPFileFRI>(
-        EPFileBuilder::freeIndex().set(epbuilder::head0::type, 0xffffffff), "4294967295", "20212223-2425-2627-2829-2a2b2c2d2e2f",
-        "================ HEAD[1] ================\nchecksum:\t\t0xb1\nentry size:\t\t8\ntotal group count:\t0x100\n"
-        "================ VAR[0]  ================\nchecksum:\t\t0xb2\ntotal free count:\t0x100000001\nindex head:\t\t77\n", "ISCSIEPFileFRI.cpp:45");
-    expectKind<ISCSIEPFileDAT>(EPFileBuilder::data(), "3", "30313233-3435-3637-3839-3a3b3c3d3e3f",
-        "================ HEAD[1] ================\nchecksum:\t\t0xc1\nserial number:\t\t5\n", "ISCSIEPFileDAT.cpp:38");
-    expectKind<ISCSIEPFileMAP>(EPFileBuilder::map(), "4", "40414243-4445-4647-4849-4a4b4c4d4e4f",
-        "================ HEAD[1] ================\nchecksum:\t\t0xd1\nattribute:\t\t0x3f\nlogic block size:\t512\ntotal count:\t\t4096\nparent UUID:\t\t50515253-5455-5657-5859-5a5b5c5d5e5f\n"
-        "parent total count:\t2048\n================ VAR[0]  ================\nchecksum:\t\t0xd2\nmapped count:\t\t3000\n"
-        "================ VAR[1]  ================\nchecksum:\t\t0xd3\nseg0 checksum:\t\t0xd4\nseg0 pool count:\t2\n"
-        "session UUID:\t\t60616263-6465-6667-6869-6a6b6c6d6e6f\npromote time:\t\tSun Sep 13 12:27:40 UTC 2020\n"
-        "================ VAR[2]  ================\nchecksum:\t\t0xd5\nsync count:\t\t1000\nchild attribute:\t0x1c\n"
-        "track UUID:\t\t70717273-7475-7677-7879-7a7b7c7d7e7f\nprevious track UUID:\t80818283-8485-8687-8889-8a8b8c8d8e8f\n"
-        "current track UUID:\t90919293-9495-9697-9899-9a9b9c9d9e9f\n================ SEG[0]  ================\n"
-        "pool #1: a0a1a2a3-a4a5-a6a7-a8a9-aaabacadaeaf\npool #2: b0b1b2b3-b4b5-b6b7-b8b9-babbbcbdbebf\n", "ISCSIEPFileMAP.cpp:63");
-    expectKind<ISCSIEPFileJNL>(EPFileBuilder::journal(), "5", "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf",
-        "================ HEAD[1] ================\nchecksum:\t\t0xe1\ntotal count:\t\t65536\n"
-        "================ VAR[0]  ================\nchecksum:\t\t0xe2\nshutdown tag:\t\t0x5afe\nsync count:\t\t12\n"
-        "================ VAR[1]  ================\nchecksum:\t\t0xe3\nlast trans ID:\t\t4711\nlast record start:\t4294967296\n"
-        "last flush errno:\t4294967291\nlast recovery error:\t0\nempty record start:\t8192\n", "ISCSIEPFileJNL.cpp:55");
+    const auto valid = [](EPFileBuilder builder) { return builder.set(epbuilder::head0::dataStartOffset, 0x6162636465666768); };
+    expectKind<ISCSIEPFileTBL>(valid(EPFileBuilder::table()), {"1", "10111213-1415-1617-1819-1a1b1c1d1e1f",
+        "================ HEAD[1] ================\nchecksum:\t\t0x0\nextent size:\t\t0\nentry size:\t\t0\ntotal count:\t\t0\n",
+        "================ HEAD[1] ================\nchecksum:\t\t0xa1a2a3a4\nextent size:\t\t2779162536\nentry size:\t\t2846534572\n"
+        "total count:\t\t12515133587939570612\n", "ISCSIEPFileTBL.cpp:41"});
+    expectKind<ISCSIEPFileFRI>(valid(EPFileBuilder::freeIndex().set(epbuilder::head0::type, 0xffffffff)),
+        {"4294967295", "20212223-2425-2627-2829-2a2b2c2d2e2f",
+        "================ HEAD[1] ================\nchecksum:\t\t0x0\nentry size:\t\t0\ntotal group count:\t0x0\n"
+        "================ VAR[0]  ================\nchecksum:\t\t0x0\ntotal free count:\t0x0\nindex head:\t\t0\n",
+        "================ HEAD[1] ================\nchecksum:\t\t0xb1b2b3b4\nentry size:\t\t3048650680\ntotal group count:\t0xb9babbbcbdbebfc0\n"
+        "================ VAR[0]  ================\nchecksum:\t\t0xc1c2c3c4\ntotal free count:\t0xc5c6c7c8c9cacbcc\n"
+        "index head:\t\t14830019118758024148\n", "ISCSIEPFileFRI.cpp:45"});
+    expectKind<ISCSIEPFileDAT>(valid(EPFileBuilder::data()), {"3", "30313233-3435-3637-3839-3a3b3c3d3e3f",
+        "================ HEAD[1] ================\nchecksum:\t\t0x0\nserial number:\t\t0\n",
+        "================ HEAD[1] ================\nchecksum:\t\t0xc1c2c3c4\nserial number:\t\t3318138824\n", "ISCSIEPFileDAT.cpp:38"});
+    expectKind<ISCSIEPFileMAP>(valid(EPFileBuilder::map()), {"4", "40414243-4445-4647-4849-4a4b4c4d4e4f",
+        "================ HEAD[1] ================\nchecksum:\t\t0x0\nattribute:\t\t0x0\nlogic block size:\t0\ntotal count:\t\t0\n"
+        "parent UUID:\t\t\nparent total count:\t0\n================ VAR[0]  ================\nchecksum:\t\t0x0\nmapped count:\t\t0\n"
+        "================ VAR[1]  ================\nchecksum:\t\t0x0\nseg0 checksum:\t\t0x0\nseg0 pool count:\t0\nsession UUID:\t\t\n"
+        "promote time:\t\tThu Jan 01 00:00:00 UTC 1970\n================ VAR[2]  ================\nchecksum:\t\t0x0\nsync count:\t\t0\n"
+        "child attribute:\t0x0\ntrack UUID:\t\t\nprevious track UUID:\t\ncurrent track UUID:\t\n================ SEG[0]  ================\n",
+        "================ HEAD[1] ================\nchecksum:\t\t0xd1d2d3d4\nattribute:\t\t0xd5d6d7d8\nlogic block size:\t3654999004\n"
+        "total count:\t\t15987461884167250916\nparent UUID:\t\t50515253-5455-5657-5859-5a5b5c5d5e5f\n"
+        "parent total count:\t16566183266871864300\n================ VAR[0]  ================\nchecksum:\t\t0x1122334\n"
+        "mapped count:\t\t1302406798037686297\n================ VAR[1]  ================\nchecksum:\t\t0x21222324\n"
+        "seg0 checksum:\t\t0x25262728\nseg0 pool count:\t2\nsession UUID:\t\t60616263-6465-6667-6869-6a6b6c6d6e6f\n"
+        "promote time:\t\tSun Sep 13 12:27:40 UTC 2020\n================ VAR[2]  ================\nchecksum:\t\t0x31323334\n"
+        "sync count:\t\t3834312847370369852\nchild attribute:\t0x3d3e3f40\ntrack UUID:\t\t70717273-7475-7677-7879-7a7b7c7d7e7f\n"
+        "previous track UUID:\t80818283-8485-8687-8889-8a8b8c8d8e8f\ncurrent track UUID:\t90919293-9495-9697-9899-9a9b9c9d9e9f\n"
+        "================ SEG[0]  ================\npool #1: a0a1a2a3-a4a5-a6a7-a8a9-aaabacadaeaf\n"
+        "pool #2: b0b1b2b3-b4b5-b6b7-b8b9-babbbcbdbebf\n", "ISCSIEPFileMAP.cpp:63"});
+    expectKind<ISCSIEPFileJNL>(valid(EPFileBuilder::journal()), {"5", "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf",
+        "================ HEAD[1] ================\nchecksum:\t\t0x0\ntotal count:\t\t0\n"
+        "================ VAR[0]  ================\nchecksum:\t\t0x0\nshutdown tag:\t\t0x0\nsync count:\t\t0\n"
+        "================ VAR[1]  ================\nchecksum:\t\t0x0\nlast trans ID:\t\t0\nlast record start:\t0\nlast flush errno:\t0\n"
+        "last recovery error:\t0\nempty record start:\t0\n",
+        "================ HEAD[1] ================\nchecksum:\t\t0xe1e2e3e4\ntotal count:\t\t16566183266871864300\n"
+        "================ VAR[0]  ================\nchecksum:\t\t0xf1f2f3f4\nshutdown tag:\t\t0xf5f6f7f8\nsync count:\t\t4193975292\n"
+        "================ VAR[1]  ================\nchecksum:\t\t0x41424344\nlast trans ID:\t\t1162233672\n"
+        "last record start:\t5281116304131903312\nlast flush errno:\t4227661310\nlast recovery error:\t1364349780\n"
+        "empty record start:\t6149198378188823388\n", "ISCSIEPFileJNL.cpp:55"});
     std::locale::global(before);
-}
-
-TEST(EPFile, AFreshObjectShowsZeros) {
-    EXPECT_EQ(
-        "================ HEAD[0] ================\nchecksum:\t\t0x0\nversion:\t\t0\nmagic code:\t\t0x0\n"
-        "type:\t\t\t0\nUUID:\t\t\t\ndata start offset:\t0x0\ncreate time:\t\tThu Jan 01 00:00:00 UTC 1970\n"
-        "================ HEAD[1] ================\nchecksum:\t\t0x0\nserial number:\t\t0\n", ISCSIEPFileDAT().toString());
 }
 // clang-format on
 
+TEST(EPFile, TheSystemsReasonIsLeftInErrno) {
+    const TempDir folder;
+    const std::string path = folder.write("closed", EPFileBuilder::table());
+    std::filesystem::permissions(path, std::filesystem::perms::none);
+    std::filesystem::create_symlink("loop", folder.path("loop"));
+    const std::pair<std::string, int> reasons[] = {
+        {folder.path("missing"), ENOENT},
+        {path, EACCES},
+        {folder.path("loop"), ELOOP},
+        {folder.path(""), EISDIR},
+        {folder.path(std::string(300, 'x')), ENAMETOOLONG},
+        {path + "/below", ENOTDIR},
+        {folder.write("short", EPFileBuilder::table().resize(24575)), 0},
+    };
+    for (const auto& [name, reason] : reasons) {
+        const uid_t self = geteuid();
+        EXPECT_EQ(0, seteuid(reason == EACCES && self == 0 ? 65534 : self));
+        ISCSIEPFileTBL file(name);
+        EXPECT_NE(0, file.parseFile()) << name;
+        EXPECT_EQ(reason, errno) << name;
+        EXPECT_EQ(0, seteuid(self));
+    }
+    std::string text;
+    ISCSIEPMapEntryInfo entry;
+    ISCSIEPFileMAP table(folder.write("table", EPFileBuilder::table()));
+    EXPECT_EQ(18990400, table.getMapEntry(0, entry));
+    EXPECT_EQ(0, errno);
+    ISCSIEPFileMAP map(folder.write("map", EPFileBuilder::map()));
+    EXPECT_EQ(18990039, map.getMapEntry(0, entry));
+    EXPECT_EQ(0, errno);
+    EXPECT_EQ(18990041, map.getMapEntry(std::uint64_t{1} << 60U, entry));
+    EXPECT_EQ(EINVAL, errno);
+    EXPECT_EQ(18990401, ISCSIEPFile("/volume99999999999999999999").getTBLFilePath(text));
+    EXPECT_EQ(0, errno);
+    takeLog();
+}
+
 TEST(EPFile, AnObjectKeepsItsSnapshotUntilReadAnew) {
     const TempDir folder;
-    ISCSIEPFileTBL file(folder.write("file", EPFileBuilder::table()));
+    const auto write = [&folder](unsigned int entrySize, unsigned int type, std::uint64_t size) {
+        auto table = EPFileBuilder::table().set(epbuilder::tbl::entrySize, entrySize).set(epbuilder::head0::type, type);
+        return folder.write("file", table.resize(size));
+    };
+    ISCSIEPFileTBL file(write(16, 1, 24576));
     EXPECT_EQ(0, file.parseFile());
-    folder.write("file", EPFileBuilder::table().set(epbuilder::tbl::entrySize, 32).resize(1000));
+    write(32, 1, 1000);
     EXPECT_EQ(0, file.parseFile());
     EXPECT_EQ(18990039, file.readHeader());
     EXPECT_EQ(16U, file.entrySize);
-    folder.write("file", EPFileBuilder::table().set(epbuilder::tbl::entrySize, 33).set(epbuilder::head0::type, 0));
+    write(33, 0, 24576);
     EXPECT_EQ(0, file.readHeader());
     EXPECT_EQ(0, file.parseFile());
+    const std::string before = file.toString();
     EXPECT_EQ(33U, file.entrySize);
     std::filesystem::remove(file.path);
     EXPECT_EQ(18990038, file.parseFile());  // type 0 is read at each parse
+    EXPECT_EQ(before, file.toString());
     ISCSIEPFileJNL zeros("/dev/zero");
     EXPECT_EQ(0, zeros.parseFile());
     EXPECT_EQ("00000000-0000-0000-0000-000000000000", zeros.head0UUID);
@@ -156,9 +234,33 @@ TEST(EPFile, SlotsAndMembersStandInTheDocumentedOrder) {
     std::memcpy(&word, &operation, sizeof word);
     EXPECT_EQ(2U, word / sizeof(void*));
     const ISCSIEPFileMAP m;
-    const void* const members[] = {
-        &m.path,       &m.headerBlock,  &m.head0Checksum,        &m.head0Version,    &m.head0MagicCode,
-        &m.head0Type,  &m.head0UUID,    &m.head0DataStartOffset, &m.head0CreateTime, &m.attribute,
-        &m.parentUUID, &m.var0Checksum, &m.sessionUUID,          &m.syncCount,       &m.poolUUIDs};
-    EXPECT_TRUE(std::is_sorted(std::begin(members), std::end(members)));
+    const ISCSIEPFileJNL j;
+    const ISCSIEPMapEntryInfo e;
+    const ISCSILUNConfInfo l;
+    const std::vector<const void*> members[] = {
+        {&m.path,
+         &m.headerBlock,
+         &m.head0Checksum,
+         &m.head0Version,
+         &m.head0MagicCode,
+         &m.head0Type,
+         &m.head0UUID,
+         &m.head0DataStartOffset,
+         &m.head0CreateTime,
+         &m.head1Checksum,
+         &m.attribute,
+         &m.totalCount,
+         &m.parentUUID,
+         &m.var0Checksum,
+         &m.seg0Checksum,
+         &m.sessionUUID,
+         &m.var2Checksum,
+         &m.syncCount,
+         &m.trackUUID,
+         &m.poolUUIDs},
+        {&j.head1Checksum, &j.totalCount, &j.var0Checksum, &j.shutdownTag, &j.syncCount, &j.var1Checksum,
+         &j.lastTransID, &j.lastRecordStart, &j.lastFlushErrno, &j.lastRecoveryError, &j.emptyRecordStart},
+        {&e.extentAddress, &e.poolNumber, &e.mapped, &e.vpushed, &e.vpulled, &e.synced},
+        {&l.lid, &l.extentSize, &l.size, &l.restoreTime, &l.type, &l.uuid, &l.rootPath, &l.name}};
+    for (const auto& ofClass : members) EXPECT_TRUE(std::is_sorted(ofClass.begin(), ofClass.end()));
 }

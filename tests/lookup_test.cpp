@@ -22,6 +22,8 @@ struct Lookup {
     std::string source, operation;
     int header, type, open, seek, read;
     std::uint64_t itemSize;
+    bool failsAtEnd = true;  ///< at or beyond the end of the file
+    bool seeks = true;       ///< to a position that may be out of range
 };
 
 /// Drives one lookup into each of its failures. `find(file, index)` gives its code, or -1 when a failed call has
@@ -50,13 +52,16 @@ void expectFailures(const Lookup& lookup, const EPFileBuilder& valid, Find find)
     File file(folder.write("file", builder.resize(blockSize + 3 * lookup.itemSize - 1)));
     EXPECT_EQ(0, find(file, 1));
     const std::uint64_t beyond[] = {2, 3, 0x100000001};
-    for (const auto index : beyond) expectFailure(file, index, 18990039, lookup.read, "Failed to read file.");
+    for (const auto index : beyond) {
+        if (lookup.failsAtEnd) expectFailure(file, index, 18990039, lookup.read, "Failed to read file.");
+    }
     for (const std::uint64_t position : {std::uint64_t{1} << 63, maximum - 2 * blockSize}) {
+        if (!lookup.seeks) continue;
         expectFailure(file, position / lookup.itemSize, 18990041, lookup.seek, "Failed to seek to offset.");
     }
     EXPECT_EQ(0, find(file, maximum / lookup.itemSize + 1 - blockSize / lookup.itemSize));  // position 0, modulo 2^64
     std::filesystem::resize_file(file.path, 100);                                           // HEAD[0] is known by now
-    expectFailure(file, 1, 18990039, lookup.read, "Failed to read file.");
+    if (lookup.failsAtEnd) expectFailure(file, 1, 18990039, lookup.read, "Failed to read file.");
     std::filesystem::remove(file.path);
     expectFailure(file, 1, 18990038, lookup.open, "Failed to open file.");
 }
@@ -75,6 +80,15 @@ TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
         const int code = file.getMapEntries(index, 1, entries);
         return code == 0 || entries.size() == 3 ? code : -1;
     };
+    const auto getEntryCount = [](ISCSIEPFileMAP& file, std::uint64_t /*index*/) {
+        unsigned long long count = 7;
+        const int code = file.getEntryCount(count);
+        return code == 0 || count == 7 ? code : -1;
+    };
+    const auto getExtentBytes = [](ISCSIEPFileDAT& file, std::uint64_t index) {
+        unsigned char bytes[512];
+        return file.getExtentBytes(index, 512, 0, 512, bytes);
+    };
     const auto getExtentData = [](ISCSIEPFileDAT& file, std::uint64_t index) {
         std::string data = "old";
         const int code = file.getExtentData(index, 512, data);
@@ -82,8 +96,12 @@ TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
     };
     const EPFileBuilder map = EPFileBuilder::map();
     expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntry", 172, 176, 180, 185, 189, 8}, map, getMapEntry);
-    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8}, map,
+    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getMapEntries", 201, 202, 203, 204, 205, 8, false}, map,
                                    getMapEntries);
+    expectFailures<ISCSIEPFileMAP>({"ISCSIEPFileMAP.cpp", "getEntryCount", 211, 212, 213, 214, 215, 8, false, false},
+                                   map, getEntryCount);
+    expectFailures<ISCSIEPFileDAT>({"ISCSIEPFileDAT.cpp", "getExtentBytes", 102, 103, 104, 105, 106, 512},
+                                   EPFileBuilder::data(), getExtentBytes);
     expectFailures<ISCSIEPFileDAT>({"ISCSIEPFileDAT.cpp", "getExtentData", 69, 73, 77, 82, 87, 512},
                                    EPFileBuilder::data(), getExtentData);
 }
@@ -126,15 +144,31 @@ TEST(MapEntry, RunsOfEntriesEndWithTheFile) {
     using Case = std::array<std::uint64_t, 3>;
     // The last count once made the walk endless: eight times it is 0, modulo 2^64.
     for (const auto& [first, count, expected] :
-         {Case{0, 0, 0}, Case{total, 0, 0}, Case{0, 1, 1}, Case{0, 8192, 8192}, Case{5, 8193, 8193},
-          Case{0, total, total}, Case{0, total + 1, total}, Case{total - 1, maximum, 1}, Case{1, maximum, total - 1},
-          Case{total - 16384, 16385, 16384}, Case{0, std::uint64_t{1} << 63, total}}) {
+         {Case{0, 0, 0}, Case{total, 0, 0}, Case{total, 1, 0}, Case{total + 8192, maximum, 0}, Case{0, 1, 1},
+          Case{0, 8192, 8192}, Case{5, 8193, 8193}, Case{0, total, total}, Case{0, total + 1, total},
+          Case{total - 1, maximum, 1}, Case{1, maximum, total - 1}, Case{total - 16384, 16385, 16384},
+          Case{0, std::uint64_t{1} << 63, total}}) {
         std::vector<ISCSIEPMapEntryInfo> entries(7);
         EXPECT_EQ(0, file.getMapEntries(first, count, entries));
         ASSERT_EQ(expected, entries.size()) << first << ' ' << count;
         if (entries.empty()) continue;
         EXPECT_EQ(first, entries.front().extentAddress);
         EXPECT_EQ(first + expected - 1, entries.back().extentAddress);
+    }
+}
+
+TEST(MapEntry, TheCountFollowsTheEndOfTheFileAndTheDataStart) {
+    const TempDir folder;
+    using Case = std::array<std::uint64_t, 3>;  // data start offset, size of the file, whole entries
+    for (const auto& [start, size, expected] :
+         {Case{blockSize, blockSize + 8 * 678 + 7, 678}, Case{blockSize, blockSize, 0},
+          Case{blockSize, blockSize + 7, 0}, Case{0, blockSize, 3072}, Case{blockSize + 1, blockSize, 0},
+          Case{maximum, blockSize + 8, 0}, Case{0x100000008, 0x100000028, 4}, Case{0x100000008, blockSize + 80, 0}}) {
+        EPFileBuilder builder = EPFileBuilder::map().set(head0::dataStartOffset, start);
+        ISCSIEPFileMAP file(folder.write("map", builder.resize(size)));
+        unsigned long long count = 7;
+        EXPECT_EQ(0, file.getEntryCount(count));
+        EXPECT_EQ(expected, count) << start << ' ' << size;
     }
 }
 
@@ -163,9 +197,29 @@ TEST(Extent, BytesComeOutInFileOrderAndSizesAreChecked) {
     EXPECT_EQ("000fa0ff", data);
     EXPECT_EQ(0, file.getExtentData(1, 3, data));
     EXPECT_EQ("ff1234", data);
+    std::string part(3, 'x');
+    auto* to = reinterpret_cast<unsigned char*>(part.data());
+    EXPECT_EQ(0, file.getExtentBytes(1, 3, 1, 2, to));
+    EXPECT_EQ("\x12\x34x", part);
+    EXPECT_EQ(0, file.getExtentBytes(0, 4294967295, 3, 3, to));
+    EXPECT_EQ("\xff\x12\x34", part);
+    EXPECT_EQ(0, file.getExtentBytes(0, 3, 3, 0, nullptr));
+    using Part = std::array<unsigned int, 2>;
+    for (const auto& [offset, length] : {Part{0, 4}, Part{4, 0}, Part{3, 1}, Part{2, 0xffffffff}}) {
+        EXPECT_EQ(18990003, file.getExtentBytes(0, 3, offset, length, to));
+        EXPECT_EQ(chain(file.path, {"ISCSIEPFileDAT.cpp:107:getExtentBytes Invalid part of an extent: " +
+                                    std::to_string(length) + " bytes from " + std::to_string(offset) + "."}),
+                  takeLog());
+    }
+    EXPECT_EQ(18990003, file.getExtentBytes(0, 3, 0, 1, nullptr));
+    EXPECT_EQ(18990507, ISCSIEPFileDAT("none").getExtentBytes(0, 0, 9, 9, nullptr));
+    EXPECT_EQ(chain("none", {"ISCSIEPFileDAT.cpp:101:getExtentBytes Invaild LUN extent size: 0."}),
+              Lines{takeLog()[1]});
+    EXPECT_EQ("\xff\x12\x34", part);
     EXPECT_EQ(0U, file.serialNumber);  // HEAD[1] is not decoded by a lookup
     ISCSIEPFileDAT missing(folder.path("missing"));
     EXPECT_EQ(18990507, missing.getExtentData(0, 0, data));
+    EXPECT_EQ(0, errno);
     EXPECT_EQ(chain(missing.path, {"ISCSIEPFileDAT.cpp:65:getExtentData Invaild LUN extent size: 0."}), takeLog());
     for (const unsigned int size : {0x7fffffffU, 0x80000000U, 0xffffffffU}) {
         EXPECT_EQ(18990038, missing.getExtentData(0, size, data));

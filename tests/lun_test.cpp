@@ -3,6 +3,8 @@
 #include <ISCSIEPFileMAP.h>
 #include <ISCSILUNConfInfo.h>
 
+#include <algorithm>
+#include <cerrno>
 #include <cstring>
 #include <map>
 #include <tuple>
@@ -23,7 +25,8 @@ void answer(unsigned int extentSize, unsigned long long size, int type) {
     record.assign(4480, '\0');
     std::memcpy(&record[20], &extentSize, 4);
     std::memcpy(&record[24], &size, 8);
-    record[32] = 60;  // restore time
+    const unsigned int restoreTime = 0x9122333c;
+    std::memcpy(&record[32], &restoreTime, 4);
     std::memcpy(&record[36], &type, 4);
     record.replace(44, 3, "abc").replace(118, 8, "/volume1").replace(4213, 4, "lun3");
     result = 0;
@@ -34,13 +37,15 @@ void answer(unsigned int extentSize, unsigned long long size, int type) {
 extern "C" __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsigned int lid, int reserved, void* to) {
     askedLid = lid;
     EXPECT_EQ(0, reserved);
+    EXPECT_EQ(0U, reinterpret_cast<std::uintptr_t>(to) % 8);  // as the structure that it is to that library
     EXPECT_EQ(std::string(4480, '\0'), std::string(static_cast<const char*>(to), 4480));
     std::memcpy(to, record.data(), 4480);  // a failed call may leave anything in the record
+    errno = EIO;
     return result;
 }
 
 extern "C" __attribute__((visibility("default"))) const char* KELPiSCSIStrError(int code) {
-    return code == -77 ? "no such thing" : "?";
+    return code == -77 ? "no such thing" : nullptr;
 }
 
 TEST(LunConf, ARecordIsLoadedWholeOrNotAtAll) {
@@ -49,7 +54,7 @@ TEST(LunConf, ARecordIsLoadedWholeOrNotAtAll) {
     EXPECT_EQ(0, lun.loadFromConfig());
     EXPECT_EQ(3U, askedLid);
     const std::string line =
-        "lid: 3 ,extent_size: 1048576 (1MB) ,size: 10737418240 (10GB) ,restore time: Thu Jan 01 00:01:00 UTC 1970 "
+        "lid: 3 ,extent_size: 1048576 (1MB) ,size: 10737418240 (10GB) ,restore time: Sun Jan 22 21:06:04 UTC 1911 "
         ",type: BLUN ,uuid: abc ,rootpath: /volume1 ,name: lun3";
     EXPECT_EQ(line, lun.toString());
     answer(4, 5, 15);
@@ -59,6 +64,13 @@ TEST(LunConf, ARecordIsLoadedWholeOrNotAtAll) {
     EXPECT_EQ(Lines{"iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig Failed to get LUN config by LUN ID. info: " + line +
                     ". error: -77 (no such thing)"},
               takeLog());
+    EXPECT_EQ(EIO, errno);
+    answer(0xa1b2c3d4, 0xf1e2d3c4b5a69788, -0x0e1d2c3c);
+    EXPECT_EQ(0, lun.loadFromConfig());
+    EXPECT_EQ(0xa1b2c3d4, lun.extentSize);
+    EXPECT_EQ(0xf1e2d3c4b5a69788, lun.size);
+    EXPECT_EQ(0x9122333cU, lun.restoreTime);
+    EXPECT_EQ(-0x0e1d2c3c, lun.type);
     EXPECT_EQ(
         "lid: 0 ,extent_size: 0 (0bytes) ,size: 0 (0bytes) ,restore time: Thu Jan 01 00:00:00 UTC 1970 "
         ",type: UNKNOWN ,uuid:  ,rootpath:  ,name: ",
@@ -114,6 +126,7 @@ TEST(Locations, SiblingsLieOnTheVolumeThatThePathNames) {
     // clang-format on
     std::string own;
     int volume = 0;
+    logFormats.clear();
     const auto expect = [&](int code, const std::string& path, const std::string& kind, const char* name, int line) {
         const bool found = volume > 0;
         EXPECT_EQ(found ? 0 : 18990401, code) << own;
@@ -130,6 +143,14 @@ TEST(Locations, SiblingsLieOnTheVolumeThatThePathNames) {
         expect(file.getFRIFilePath(freeIndex), freeIndex, "FRI", "EP_FRI", 129);
         expect(file.getDATFilePath(0, 9, data), data, "DAT", "EP_DAT_00000", 153);
     }
+    // Who watches syslog() sees each message whole, its arguments aside.
+    std::sort(logFormats.begin(), logFormats.end());
+    logFormats.erase(std::unique(logFormats.begin(), logFormats.end()), logFormats.end());
+    EXPECT_EQ((Lines{"iSCSI:%s:%d:%s Failed to get DAT file path. path: %s",
+                     "iSCSI:%s:%d:%s Failed to get FRI file path. path: %s",
+                     "iSCSI:%s:%d:%s Failed to get TBL file path. path: %s",
+                     "iSCSI:%s:%d:%s Failed to get volume ID. path: %s"}),
+              logFormats);
 }
 
 TEST(Locations, DataFilesHoldFourTebibytesEach) {
@@ -161,6 +182,7 @@ TEST(Locations, TheMapFileFollowsTheConfigurationAndTheJournalNothing) {
     const Lines log = takeLog();
     ASSERT_EQ(2U, log.size());
     EXPECT_EQ(0U, log[0].find("iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig "));
+    EXPECT_NE(std::string::npos, log[0].find(" error: 4 (no text)"));
     EXPECT_EQ("iSCSI:ISCSIEPFile.cpp:180:getMAPFilePath Failed to get LUN conf info. path: /own%s", log[1]);
     EXPECT_EQ(0, ISCSIEPFileJNL().getJNLFilePath(path));
     EXPECT_EQ("/var/db/iscsi/EP_JNL", path);

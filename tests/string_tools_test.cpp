@@ -1,3 +1,4 @@
+#include "../src/DumpText.h"
 #include "Support.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
@@ -10,6 +11,8 @@ TEST(StringTools, BytesBecomeHexadecimalAndUUIDTextAndNoBytesAreRefused) {
     EXPECT_EQ(Lines(), takeLog());
     EXPECT_EQ(18990003, GetHexInString(nullptr, 0, text));
     EXPECT_EQ(Lines{"iSCSI:ISCSIQuorinStringTool.h:190:GetHexInString Input pointer is NULL."}, takeLog());
+    EXPECT_EQ("iSCSI:%s:%d:%s Input pointer is NULL.", logFormats.back());
+    EXPECT_EQ(0, errno);
     EXPECT_EQ("old", text);
     EXPECT_EQ(0, GetHexInString(bytes, 7, text));
     EXPECT_EQ("0adeadbeef0001", text);
@@ -17,6 +20,24 @@ TEST(StringTools, BytesBecomeHexadecimalAndUUIDTextAndNoBytesAreRefused) {
     EXPECT_EQ("", text);
     EXPECT_EQ(0, GetUUIDInString(bytes, text));
     EXPECT_EQ("0adeadbe-ef00-0102-0304-05060780ff9f", text);
+    // Every byte, in every place of a block, and no digit behind the last.
+    static constexpr char digits[] = "0123456789abcdef";
+    std::vector<unsigned char> all;
+    std::string expected;
+    for (unsigned int i = 0; i < 256 * 17; ++i) {
+        all.push_back(static_cast<unsigned char>(i * 3));
+        expected.append(1, digits[all.back() / 16]).append(1, digits[all.back() % 16]);
+    }
+    for (const unsigned int length : {15U, 16U, 17U, 511U, 512U, 513U, 256U * 17}) {
+        EXPECT_EQ(0, GetHexInString(all.data(), length, text));
+        EXPECT_EQ(expected.substr(0, 2 * std::size_t{length}), text);
+    }
+}
+
+TEST(StringTools, LongLabelsAndSectionNamesKeepTheDumpInShape) {
+    EXPECT_EQ(
+        "================ SECTIONS ================\na label of 22 columns!:\t0x1f\na label of 23 columns!!:\t7\n",
+        DumpText({}).section("SECTIONS").hex("a label of 22 columns!", 31).dec("a label of 23 columns!!", 7).str());
 }
 
 TEST(StringTools, TimesFollowTheZoneAndAreSigned) {
@@ -25,6 +46,7 @@ TEST(StringTools, TimesFollowTheZoneAndAreSigned) {
          {Case{"UTC", 0, "Thu Jan 01 00:00:00 UTC 1970"}, Case{"UTC", 0x7fffffff, "Tue Jan 19 03:14:07 UTC 2038"},
           Case{"UTC", 0x80000000, "Fri Dec 13 20:45:52 UTC 1901"},
           Case{"ABC-2", 1600000000, "Sun Sep 13 14:26:40 ABC 2020"},
+          Case{"CET-1CEST,M3.5.0,M10.5.0/3", 1600000000, "Sun Sep 13 14:26:40 CEST 2020"},
           Case{"ABCDEF0", 0, "Thu Jan 01 00:00:00 ABCDEF 1970"},  // just fits
           Case{"ABCDEFG0", 0, ""}}) {
         setenv("TZ", zone, 1);

@@ -5,14 +5,14 @@
 extern "C" {
 #endif
 
-/* Bytes of the LUN record that the caller provides. */
+/* Bytes of the LUN record that the caller provides, aligned for its 64-bit number. */
 #define KELPISCSI_LUN_RECORD_SIZE 4480
 
-/* Where its fields start; numbers are in the host's byte order, texts end with a NUL. The record may lie anywhere. */
-#define KELPISCSI_LUN_EXTENT_SIZE 20  /* 4 bytes, unsigned */
-#define KELPISCSI_LUN_SIZE 24         /* 8 bytes, unsigned */
+/* Where the fields of the record start, in bytes: numbers in the host's byte order, texts that end with a NUL. */
+#define KELPISCSI_LUN_EXTENT_SIZE 20  /* unsigned, 4 bytes */
+#define KELPISCSI_LUN_SIZE 24         /* unsigned, 8 bytes */
 #define KELPISCSI_LUN_RESTORE_TIME 32 /* 4 bytes */
-#define KELPISCSI_LUN_TYPE 36         /* 4 bytes, signed */
+#define KELPISCSI_LUN_TYPE 36         /* signed, 4 bytes */
 #define KELPISCSI_LUN_UUID 44
 #define KELPISCSI_LUN_ROOT_PATH 118
 #define KELPISCSI_LUN_NAME 4213

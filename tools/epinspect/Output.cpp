@@ -1,60 +1,92 @@
 #include "Output.h"
 
+#include <fcntl.h>
+#include <langinfo.h>
+#include <sys/ioctl.h>
 #include <unistd.h>
 
-#include <ISCSIEPFile.h>
+#include <algorithm>
 #include <cerrno>
-#include <cstdio>
+#include <csignal>
+#include <cstring>
 #include <cwchar>
 #include <cwctype>
 
-namespace epinspect {
+#include "Progress.h"
 
-namespace tool = ISCSI::TOOL;
+namespace epinspect {
 
 namespace {
 
-struct ErrorText {
-    int error;
-    const char* name;
-    const char* text;
-};
+constexpr std::size_t bufferSize = 65536;
+char buffer[bufferSize];
+std::size_t buffered = 0;
+int outputError = 0;  ///< errno of the first write that failed
 
-constexpr ErrorText errorTexts[] = {
-    {tool::EP_ERR_BAD_ARGUMENT, "EP_ERR_BAD_ARGUMENT", "no input"},
-    {tool::EP_ERR_OPEN_FAILED, "EP_ERR_OPEN_FAILED", "cannot be opened"},
-    {tool::EP_ERR_READ_FAILED, "EP_ERR_READ_FAILED", "cannot be read, or ends too early"},
-    {tool::EP_ERR_SEEK_FAILED, "EP_ERR_SEEK_FAILED", "position out of any file's range"},
-    {tool::EP_ERR_BAD_UUID, "EP_ERR_BAD_UUID", "UUID cannot be shown"},
-    {tool::EP_ERR_WRONG_FILE_TYPE, "EP_ERR_WRONG_FILE_TYPE", "wrong type of EP file"},
-    {tool::EP_ERR_NO_PATH, "EP_ERR_NO_PATH", "path names no volume"},
-    {tool::EP_ERR_BAD_EXTENT_SIZE, "EP_ERR_BAD_EXTENT_SIZE", "extent size cannot be used"},
-};
-
-std::string describe(int error) {
-    for (const ErrorText& row : errorTexts) {
-        if (row.error == error) {
-            return std::string(row.text) + " (" + row.name + ", " + std::to_string(error) + ")";
-        }
+/// Returns 0 or the errno value of the write that failed.
+int writeAll(int stream, const char* text, std::size_t size) noexcept {
+    while (size > 0) {
+        const ssize_t written = write(stream, text, size);
+        if (written < 0 && errno == EINTR) continue;
+        if (written < 0) return errno;
+        text += written;
+        size -= static_cast<std::size_t>(written);
     }
-    return "configuration cannot be loaded (code " + std::to_string(error) + ")";
+    return 0;
 }
 
-int outputError = 0;  ///< errno of the first flush that failed
-
-void flushOutput() {
-    if (std::fflush(stdout) != 0 && outputError == 0) outputError = errno;
+void flushOutput() noexcept {
+    if (outputError == 0) outputError = writeAll(STDOUT_FILENO, buffer, buffered);
+    buffered = 0;
 }
 
-void appendEscaped(std::string& text, unsigned char byte) {
+/// Characters that count as printable but show nothing, or change the direction of what follows.
+bool deceives(wchar_t character) {
+    struct Range {
+        unsigned int first, last;
+    };
+    static constexpr Range ranges[] = {
+        {0xAD, 0xAD},       {0x34F, 0x34F},     {0x600, 0x605},     {0x61C, 0x61C},     {0x6DD, 0x6DD},
+        {0x70F, 0x70F},     {0x890, 0x891},     {0x8E2, 0x8E2},     {0x115F, 0x1160},   {0x17B4, 0x17B5},
+        {0x180B, 0x180F},   {0x200B, 0x200F},   {0x2028, 0x202E},   {0x2060, 0x206F},   {0x2800, 0x2800},
+        {0x3164, 0x3164},   {0xFE00, 0xFE0F},   {0xFEFF, 0xFEFF},   {0xFFA0, 0xFFA0},   {0xFFF0, 0xFFFB},
+        {0x110BD, 0x110BD}, {0x110CD, 0x110CD}, {0x13430, 0x1343F}, {0x1BCA0, 0x1BCA3}, {0x1D173, 0x1D17A},
+        {0xE0000, 0xE0FFF},
+    };
+    const auto code = static_cast<unsigned int>(character);
+    return std::any_of(std::begin(ranges), std::end(ranges),
+                       [code](const Range& range) { return range.first <= code && code <= range.last; });
+}
+
+void appendEscaped(std::string& text, std::string_view bytes) {
     static constexpr char digits[] = "0123456789abcdef";
-    text.append("\\x").append(1, digits[byte >> 4U]).append(1, digits[byte & 0xFU]);
+    for (const char c : bytes) {
+        const auto byte = static_cast<unsigned char>(c);
+        text.append("\\x").append(1, digits[byte >> 4U]).append(1, digits[byte & 0xFU]);
+    }
 }
 
 }  // namespace
 
+void prepareStreams() {
+    for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+        // Opened for reading, so that what is written to a missing stream still fails.
+        if (fcntl(stream, F_GETFD) == -1 && errno == EBADF) static_cast<void>(open("/dev/null", O_RDONLY));
+    }
+    std::signal(SIGPIPE, SIG_IGN);
+    std::signal(SIGXFSZ, SIG_IGN);
+}
+
 void print(std::string_view text) {
-    if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) throw OutputFailure{errno};
+    static const bool terminal = outputIsTerminal();
+    while (!text.empty()) {
+        const auto part = text.substr(0, bufferSize - buffered);
+        std::memcpy(buffer + buffered, part.data(), part.size());
+        buffered += part.size();
+        text.remove_prefix(part.size());
+        if (buffered == bufferSize || terminal) flushOutput();
+    }
+    if (outputError != 0) throw OutputFailure{outputError};
 }
 
 void finishOutput() {
@@ -64,18 +96,29 @@ void finishOutput() {
 
 bool outputIsTerminal() { return isatty(STDOUT_FILENO) == 1; }
 
+unsigned int terminalWidth(int stream) {
+    winsize size = {};
+    return ioctl(stream, TIOCGWINSZ, &size) == 0 && size.ws_col > 0 ? size.ws_col : 80;
+}
+
+unsigned int outputWidth() { return terminalWidth(STDOUT_FILENO); }
+
+bool outputIsUnicode() { return std::strcmp(nl_langinfo(CODESET), "UTF-8") == 0; }
+
 std::string printable(std::string_view text) {
     std::string result;
     std::mbstate_t state = {};
     while (!text.empty()) {
         wchar_t character = 0;
         auto length = std::mbrtowc(&character, text.data(), text.size(), &state);
-        if (length <= text.size() && length > 0 && std::iswprint(static_cast<std::wint_t>(character)) != 0) {
-            result.append(text.substr(0, length));
-        } else {
+        if (length == 0 || length > text.size()) {  // a NUL, or no character
             length = 1;
             state = {};
-            appendEscaped(result, static_cast<unsigned char>(text.front()));
+            appendEscaped(result, text.substr(0, 1));
+        } else if (std::iswprint(static_cast<std::wint_t>(character)) == 0 || deceives(character)) {
+            appendEscaped(result, text.substr(0, length));
+        } else {
+            result.append(text.substr(0, length));
         }
         text.remove_prefix(length);
     }
@@ -84,12 +127,41 @@ std::string printable(std::string_view text) {
 
 std::string forReader(std::string_view text) { return outputIsTerminal() ? printable(text) : std::string(text); }
 
-void complain(std::string_view message) {
-    flushOutput();  // what came before is seen before
-    const std::string line = "epinspect: " + printable(message) + "\n";
-    static_cast<void>(std::fwrite(line.data(), 1, line.size(), stderr));
+std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap) {
+    const auto columns = [](std::string_view piece) {  // every character of our own texts is one column wide
+        return std::count_if(piece.begin(), piece.end(),
+                             [](char c) { return (static_cast<unsigned char>(c) & 0xC0U) != 0x80U; });
+    };
+    std::string result;
+    std::string line;
+    for (bool first = true;; first = false) {
+        const auto end = std::min(text.find(gap), text.size());
+        const auto piece = text.substr(0, end);
+        if (!first && columns(line) + columns(gap) + columns(piece) > static_cast<std::ptrdiff_t>(width)) {
+            result.append(line).append("\n");
+            line.assign(indent, ' ').append(piece);
+        } else {
+            line.append(first ? "" : gap).append(piece);
+        }
+        if (end == text.size()) return result + line + "\n";
+        text.remove_prefix(end + gap.size());
+    }
 }
 
-void complain(std::string_view subject, int error) { complain(std::string(subject) + ": " + describe(error)); }
+void complain(std::string_view message) {
+    const std::string line = "epinspect: " + printable(message) + "\n";
+    flushOutput();
+    Progress::erase();
+    static_cast<void>(writeAll(STDERR_FILENO, line.data(), line.size()));
+}
+
+void complainPlainly(std::initializer_list<const char*> pieces) noexcept {
+    flushOutput();
+    Progress::erase();
+    const auto write = [](const char* text) { static_cast<void>(writeAll(STDERR_FILENO, text, std::strlen(text))); };
+    write("epinspect: ");
+    std::for_each(pieces.begin(), pieces.end(), write);
+    write("\n");
+}
 
 }  // namespace epinspect

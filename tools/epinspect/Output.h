@@ -1,6 +1,7 @@
 // What epinspect says: data to standard output, messages to standard error.
 #pragma once
 
+#include <initializer_list>
 #include <string>
 #include <string_view>
 
@@ -11,7 +12,12 @@ struct OutputFailure {
     int error;
 };
 
-/// Writes data to standard output. Throws OutputFailure.
+/// Prepares the standard streams: one that is missing gets a number that nothing else can take and that fails when it
+/// is used, and a write that fails is an error, never a signal.
+void prepareStreams();
+
+/// Writes data to standard output, which is a terminal line by line and otherwise in large pieces. Throws
+/// OutputFailure.
 void print(std::string_view text);
 
 /// Makes sure that all data has arrived. Throws OutputFailure.
@@ -20,16 +26,29 @@ void finishOutput();
 /// Whether standard output is a terminal.
 bool outputIsTerminal();
 
-/// `text` with everything that could disturb a terminal written as \xNN.
+/// The columns of the terminal that `stream` (a file descriptor) is, 80 when it is none.
+unsigned int terminalWidth(int stream);
+
+/// The same for standard output.
+unsigned int outputWidth();
+
+/// Whether the user's character set is UTF-8.
+bool outputIsUnicode();
+
+/// `text` with everything that could disturb or deceive the reader of a terminal written as \xNN.
 std::string printable(std::string_view text);
 
 /// `text` as data: unchanged for a program that reads it, printable for a person.
 std::string forReader(std::string_view text);
 
-/// Writes "epinspect: MESSAGE" to standard error.
+/// `text` in lines of at most `width` columns, broken where it has `gap`; every line but the first starts with `indent`
+/// blanks, every line ends with a line feed. What is too long stays whole.
+std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap = " ");
+
+/// Writes "epinspect: MESSAGE" to standard error, after all data that came before.
 void complain(std::string_view message);
 
-/// Writes "epinspect: SUBJECT: WHAT FAILED (NAME, CODE)" for an error code of the library.
-void complain(std::string_view subject, int error);
+/// The same from pieces that can be shown as they are; takes no memory.
+void complainPlainly(std::initializer_list<const char*> pieces) noexcept;
 
 }  // namespace epinspect

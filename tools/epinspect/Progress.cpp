@@ -2,27 +2,70 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <cinttypes>
+#include <csignal>
 #include <cstdio>
+
+#include "Output.h"
 
 namespace epinspect {
 
 namespace {
+
 constexpr auto period = std::chrono::seconds(1);
+constexpr int endingSignals[] = {SIGINT, SIGTERM, SIGHUP, SIGQUIT};
+
+volatile std::sig_atomic_t shown = 0;
+
+extern "C" void endBySignal(int signal) {
+    Progress::erase();
+    static_cast<void>(std::raise(signal));  // arrives, with its default action, when this handler returns
 }
 
-Progress::Progress(const char* what)
-    : what_(what), terminal_(isatty(STDERR_FILENO) == 1), due_(std::chrono::steady_clock::now() + period) {}
-
-Progress::~Progress() {
-    if (shown_) static_cast<void>(std::fputs("\r\033[K", stderr));
+/// From now on the line is also taken away by the signals that end the program.
+void watchSignals() {
+    for (const int signal : endingSignals) {
+        struct sigaction action = {};
+        if (sigaction(signal, nullptr, &action) != 0 || action.sa_handler != SIG_DFL) continue;
+        action.sa_handler = endBySignal;
+        action.sa_flags = static_cast<int>(SA_RESETHAND);
+        sigaction(signal, &action, nullptr);
+    }
 }
+
+}  // namespace
+
+Progress::Progress(const char* things, std::uint64_t total, Beside beside)
+    : things_(things),
+      total_(total),
+      wanted_(isatty(STDERR_FILENO) == 1 && !(beside == Beside::listing && outputIsTerminal())),
+      due_(start_ + period) {}
 
 void Progress::show(std::uint64_t done) {
-    if (!terminal_ || std::chrono::steady_clock::now() < due_) return;
-    static_cast<void>(std::fprintf(stderr, "\r%" PRIu64 " %s", done, what_));
-    shown_ = true;
-    due_ += period;
+    if (!wanted_) return;
+    const auto now = Clock::now();
+    if (now < due_ || done == 0) return;
+    due_ = now + period;
+    const double share = static_cast<double>(done) / static_cast<double>(std::max(total_, done));
+    const double seconds = std::chrono::duration<double>(now - start_).count();
+    char line[160];
+    const int length = std::snprintf(line, sizeof line, "%3.0f%%  %" PRIu64 " of %" PRIu64 " %s, %.0f s left",
+                                     100 * share, done, total_, things_, seconds / share - seconds);
+    if (length < 0) return;
+    erase();
+    if (shown == 0) watchSignals();
+    const auto columns = std::min<std::size_t>(
+        {static_cast<std::size_t>(length), sizeof line - 1, terminalWidth(STDERR_FILENO) - std::size_t{1}});
+    shown = 1;
+    static_cast<void>(write(STDERR_FILENO, line, columns));
+}
+
+void Progress::erase() noexcept {
+    if (shown == 0) return;
+    shown = 0;
+    static constexpr char text[] = "\r\033[K";
+    static_cast<void>(write(STDERR_FILENO, text, sizeof text - 1));
 }
 
 }  // namespace epinspect

@@ -1,4 +1,4 @@
-// A sign of life on long walks.
+// A sign of life during long work.
 #pragma once
 
 #include <chrono>
@@ -6,23 +6,32 @@
 
 namespace epinspect {
 
-/// Shows how far a walk has come on standard error, when that is a terminal and more than a second has passed.
+/// Shows on standard error how far a work has come and how long it will still take, when that is a terminal and more
+/// than a second has passed. One at a time.
 class Progress {
 public:
-    explicit Progress(const char* what);
+    /// What goes to standard output meanwhile.
+    enum class Beside { nothing, listing };
+
+    /// `total` of `things` will be done. Shows nothing while a listing runs on a terminal.
+    Progress(const char* things, std::uint64_t total, Beside beside);
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;
-
-    /// Takes the line away again.
-    ~Progress();
+    ~Progress() { erase(); }
 
     void show(std::uint64_t done);
 
+    /// Takes the line away until the next show(), so that something else can be written.
+    static void erase() noexcept;
+
 private:
-    const char* what_;
-    bool terminal_;
-    bool shown_ = false;
-    std::chrono::steady_clock::time_point due_;
+    using Clock = std::chrono::steady_clock;
+
+    const char* things_;
+    std::uint64_t total_;
+    bool wanted_;
+    Clock::time_point start_ = Clock::now();
+    Clock::time_point due_;
 };
 
 }  // namespace epinspect

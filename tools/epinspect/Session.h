@@ -1,35 +1,64 @@
-// What holds for a whole run of epinspect: the options every subcommand takes, and how it went so far.
+// What holds for a whole run of epinspect: the options every subcommand takes, where files are, and how it went so far.
 #pragma once
 
 #include <optional>
 #include <string>
+#include <string_view>
+
+#include "SystemLog.h"
 
 namespace epinspect {
 
-class Session {
-public:
-    /// Makes `folder` stand for / of the target: files are opened below it, and the LUN list is looked for there.
-    void setRoot(std::string folder);
-
-    bool failed = false;  ///< something could not be read or found
-
-    /// Where the file that the user called `name` lies on the target: a name below the root folder, or a path of the
-    /// target.
-    std::string targetPath(const std::string& name) const;
-
-    /// Where to open that file here, unless something lies there that is neither a regular file nor a block device:
-    /// then complains, marks the session as failed and returns nothing. What is missing is left to the library to
-    /// report.
-    std::optional<std::string> openablePath(const std::string& name);
-
-    /// Complains about `subject` and marks the session as failed when `error` is not 0; tells whether it is 0.
-    bool succeeded(int error, const std::string& subject);
-
-private:
-    std::string root_;  ///< without a slash at its end; empty: / itself
+/// What a failure is about: a file as the user typed it, and the place in it; or only something else, "LUN 9".
+struct Subject {
+    std::string file;
+    std::string part;
 };
 
-/// From now on the library's log lines are shown on standard error too.
-void showLogLines();
+class Session {
+public:
+    bool json = false;         ///< --json: failures are objects on standard output too
+    bool differences = false;  ///< all was read, and there are findings or differences
+
+    /// Makes `folder` stand for / of the target: files are opened below it, the LUN list is looked for there, and
+    /// nothing goes to the system log. Throws UsageError when it is no folder.
+    void setRoot(const std::string& folder);
+
+    /// Where the file that the user called `name` lies on the target, as an absolute path: what lies below the root
+    /// folder, however that is spelt, or a path of the target.
+    std::string targetPath(const std::string& name) const;
+
+    /// Where the file at `path` of the target is to be opened here.
+    std::string hostPath(const std::string& path) const { return root_ + path; }
+
+    /// Where to open the file that the user called `name`, unless something lies there that may not be opened: neither
+    /// a regular file nor a block device, or a link that leads out of the root folder. Then reports that failure and
+    /// returns nothing. What is missing is left to the library to find.
+    std::optional<std::string> openablePath(const std::string& name);
+
+    /// Reports the failure of a call of the library, right after it (the system's reason is still in errno), when
+    /// `error` is not 0. Returns whether it is 0.
+    bool succeeded(int error, const Subject& subject);
+
+    /// The same later; `reason` is what the call left in errno.
+    bool succeeded(int error, const Subject& subject, int reason);
+
+    /// Reports a failure of this program's own making, under the library's code that fits.
+    void fail(const Subject& subject, std::string_view what, int error);
+
+    /// Reports that `place` ("entry 4096") is behind the end of a file that holds `count` of such.
+    void failBeyondEnd(const std::string& file, const std::string& place, unsigned long long count);
+
+    /// The exit status that the run so far amounts to.
+    int status() const;
+
+private:
+    bool leadsOut(const std::string& path) const;
+
+    bool failed_ = false;
+    std::string root_;           ///< as typed, without a slash at its end; empty: / itself
+    std::string canonicalRoot_;  ///< without links; empty without --root
+    std::optional<QuietLog> quiet_;
+};
 
 }  // namespace epinspect

@@ -1,13 +1,11 @@
 // epinspect: shows what EP files hold, and never writes one.
-#include <CLI/App.hpp>
-#include <CLI/Config.hpp>
-#include <CLI/Formatter.hpp>
 #include <cerrno>
 #include <clocale>
-#include <csignal>
+#include <cstring>
 #include <exception>
-#include <system_error>
+#include <new>
 
+#include "CommandLine.h"
 #include "Output.h"
 #include "commands/Commands.h"
 
@@ -15,50 +13,49 @@ namespace {
 
 using namespace epinspect;
 
-void addCommonOptions(CLI::App& app, Session& session) {
-    app.fallthrough();
-    app.require_subcommand(1);
-    app.footer("--root, -v and --help may stand after the subcommand too.");
-    app.set_version_flag("--version", "epinspect " EPINSPECT_VERSION);
-    app.add_flag_callback("-v,--verbose", showLogLines, "Show the library's log lines on standard error");
-    app.add_option_function<std::string>(
-           "--root", [&session](const std::string& root) { session.setRoot(root); },
-           "Folder that stands for / of the target")
-        ->type_name("DIR");
-}
-
 int run(int argc, char** argv) {
-    CLI::App app("Shows what the EP files of an iSCSI LUN store hold.", "epinspect");
     Session session;
-    addCommonOptions(app, session);
-    for (const auto add : {addDump, addEntry, addMap, addExtent, addLun, addPath}) add(app, session);
-    try {
-        app.parse(argc, argv);
-    } catch (const CLI::CallForVersion& version) {
-        print(version.what() + std::string("\n"));
-    } catch (const CLI::CallForHelp&) {
-        print(app.help());
-    } catch (const CLI::ParseError& error) {
-        const bool unknown = app.get_subcommands().empty() && !app.remaining().empty();
-        complain(unknown ? "unknown subcommand or option: " + app.remaining().front() : error.what());
-        return 2;
-    }
+    CommandLine line("epinspect", "Shows what the EP files of an iSCSI LUN store hold", EPINSPECT_VERSION);
+
+    Command& program = line.program();
+    program.group("Files of a store");
+    addDump(program, session);
+    program.group("Entries of a map");
+    addMap(program, session);
+    addEntry(program, session);
+    program.group("Bytes");
+    addExtent(program, session);
+    program.group("Configuration and paths");
+    addLun(program, session);
+    addPath(program, session);
+
+    std::string root;
+    line.everywhere()
+        .option("--root", "DIR", "Folder that stands for / of the target", root,
+                [&session](const std::string& folder) {
+                    session.setRoot(folder);
+                    return folder;
+                })
+        .flag("-v, --verbose", "Show the library's log lines on standard error", showLogLines);
+
+    if (!line.run(argc, argv)) return 2;
     finishOutput();
-    return session.failed ? 1 : 0;
+    return session.status();
 }
 
 }  // namespace
 
 int main(int argc, char** argv) {
+    prepareStreams();
     std::setlocale(LC_CTYPE, "");
-    std::signal(SIGPIPE, SIG_IGN);
     try {
         return run(argc, argv);
     } catch (const OutputFailure& failure) {
-        if (failure.error != EPIPE)
-            complain(std::string("standard output: ") + std::generic_category().message(failure.error));
+        if (failure.error != EPIPE) complainPlainly({"standard output: ", std::strerror(failure.error)});
+    } catch (const std::bad_alloc&) {
+        complainPlainly({"out of memory"});
     } catch (const std::exception& error) {
-        complain(error.what());
+        complainPlainly({error.what()});
     }
     return 1;
 }

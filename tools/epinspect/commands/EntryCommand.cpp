@@ -1,13 +1,12 @@
 // epinspect entry: the map entries of given indexes.
-#include <CLI/App.hpp>
 #include <memory>
-#include <vector>
 
 #include "Json.h"
-#include "Numbers.h"
 #include "Output.h"
 #include "commands/Commands.h"
+#include "map/MapOutput.h"
 #include "map/MapWalk.h"
+#include "store/Doubts.h"
 
 namespace epinspect {
 
@@ -17,53 +16,53 @@ namespace {
 
 struct EntryOptions {
     std::string file;
-    std::vector<std::string> indexes;
-    bool json = false;
+    std::vector<Range> ranges;
 };
 
-void printEntry(const EntryOptions& options, std::uint64_t index, const tool::ISCSIEPMapEntryInfo& entry) {
-    if (!options.json) {
+void printEntry(Json* json, const tool::ISCSIEPFileMAP& file, std::uint64_t index, const MapEntry& entry) {
+    if (json == nullptr) {
         print(std::to_string(index) + ": " + entry.toString());
         return;
     }
-    Json object = fileObject(options.file);
-    object["index"] = index;
-    addMembers(object, entry);
-    printJson(object);
+    json->begin("entry").number("index", index).number("entryOffset", entryOffset(file, index));
+    writeMembers(*json, entry);
+    json->end();
 }
 
 /// The entries of a range up to the first one that is not there.
-void printRange(const EntryOptions& options, Session& session, tool::ISCSIEPFileMAP& file, IndexRange range) {
-    std::uint64_t next = range.first;
-    int error = walkMap(file, range.first, range.last - range.first, [&](std::uint64_t index, const auto& found) {
-        printEntry(options, index, found);
-        next = index + 1;
+void printRange(const EntryOptions& options, Session& session, Json* json, tool::ISCSIEPFileMAP& file, Range range) {
+    Progress progress("entries", range.last - range.first, Progress::Beside::listing);
+    const WalkEnd end = walkMap(file, range, progress, [&](std::uint64_t index, const auto& entries) {
+        for (const MapEntry& entry : entries) printEntry(json, file, index++, entry);
     });
-    tool::ISCSIEPMapEntryInfo entry;  // the last one, or the first that the walk has not met
-    if (error == 0) error = file.getMapEntry(next, entry);
-    if (error == 0 && next != range.last) error = tool::EP_ERR_READ_FAILED;  // the file grows while it is read
-    if (session.succeeded(error, options.file + ": entry " + std::to_string(next))) printEntry(options, next, entry);
+    const std::uint64_t next = range.first + end.met;
+    const std::string place = "entry " + std::to_string(next);
+    if (!session.succeeded(end.error, {options.file, place}, end.reason) || next - 1 == range.last) return;
+    unsigned long long count = 0;
+    if (!session.succeeded(file.getEntryCount(count), {options.file, place})) return;
+    session.failBeyondEnd(options.file, place, count);
 }
 
 void run(const EntryOptions& options, Session& session) {
-    std::vector<IndexRange> ranges;
-    for (const std::string& text : options.indexes) ranges.push_back(parseIndexRange(text));
     const std::optional<std::string> path = session.openablePath(options.file);
     if (!path) return;
     tool::ISCSIEPFileMAP file(*path);
-    if (!session.succeeded(file.parseHead0(), options.file)) return;
-    for (const IndexRange range : ranges) printRange(options, session, file, range);
+    if (!session.succeeded(file.parseHead0(), {options.file, ""})) return;
+    sayDataStartDoubts(file, options.file);
+    Json json(options.file);
+    for (const Range range : options.ranges) printRange(options, session, session.json ? &json : nullptr, file, range);
 }
 
 }  // namespace
 
-void addEntry(CLI::App& app, Session& session) {
+void addEntry(Command& parent, Session& session) {
     const auto options = std::make_shared<EntryOptions>();
-    CLI::App* command = app.add_subcommand("entry", "Show entries of a map file");
-    command->add_option("MAPFILE", options->file, "Map file of a LUN")->required()->type_name("");
-    command->add_option("INDEX", options->indexes, "Index, or FIRST-LAST for all from FIRST to LAST")->required();
-    command->add_flag("--json", options->json, "One JSON object an entry");
-    command->callback([options, &session] { run(*options, session); });
+    parent.add("entry", "Show entries of a map file")
+        .argument("MAPFILE", "Map file of a LUN", options->file)
+        .arguments("INDEX", "Index of an entry, from 0; FIRST-LAST for all from FIRST to LAST", options->ranges,
+                   parseRange)
+        .flag("--json", "One JSON object an entry", session.json)
+        .action([options, &session] { run(*options, session); });
 }
 
 }  // namespace epinspect

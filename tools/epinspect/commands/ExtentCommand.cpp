@@ -1,14 +1,20 @@
 // epinspect extent: the bytes of one extent of a data file.
 #include <ISCSIEPFileDAT.h>
+#include <etc/ISCSIQuorinStringTool.h>
 
-#include <CLI/App.hpp>
+#include <algorithm>
 #include <memory>
+#include <vector>
 
 #include "Numbers.h"
 #include "Output.h"
 #include "commands/Commands.h"
+#include "store/Doubts.h"
+#include "store/FileSize.h"
 
 namespace epinspect {
+
+namespace tool = ISCSI::TOOL;
 
 namespace {
 
@@ -19,42 +25,65 @@ struct ExtentOptions {
     bool raw = false;
 };
 
-unsigned int valueOf(char digit) { return static_cast<unsigned int>(digit <= '9' ? digit - '0' : digit - 'a' + 10); }
+/// How many whole extents the file holds, or nothing when its size cannot be told.
+std::optional<std::uint64_t> extentCount(const tool::ISCSIEPFileDAT& file, std::uint32_t extentSize) {
+    const auto size = sizeOf(file.path);
+    if (!size) return std::nullopt;
+    return *size < file.head0DataStartOffset ? 0 : (*size - file.head0DataStartOffset) / extentSize;
+}
 
-/// The bytes that the library's hexadecimal text stands for, in place of it.
-void toBytes(std::string& hex) {
-    for (std::size_t i = 0; i < hex.size() / 2; ++i) {
-        hex[i] = static_cast<char>(valueOf(hex[2 * i]) << 4U | valueOf(hex[2 * i + 1]));
+/// Prints the extent block by block, so that its size does not matter. Returns 0 or the code of the read that failed.
+int printExtent(const ExtentOptions& options, tool::ISCSIEPFileDAT& file) {
+    constexpr unsigned int blockSize = 256U << 10U;
+    const unsigned int size = std::min(options.extentSize, blockSize);
+    std::vector<unsigned char> bytes(size);
+    std::string digits(options.raw ? 0 : 2 * std::size_t{size}, '\0');
+    for (unsigned int offset = 0; offset < options.extentSize;) {
+        const unsigned int length = std::min(options.extentSize - offset, blockSize);
+        const int error = file.getExtentBytes(options.index, options.extentSize, offset, length, bytes.data());
+        if (error != 0) return error;
+        if (options.raw) {
+            print({reinterpret_cast<const char*>(bytes.data()), length});
+        } else {
+            tool::PutHexDigits(bytes.data(), length, digits.data());
+            print({digits.data(), 2 * std::size_t{length}});
+        }
+        offset += length;
     }
-    hex.resize(hex.size() / 2);
+    if (!options.raw) print("\n");
+    return 0;
 }
 
 void run(const ExtentOptions& options, Session& session) {
-    if (options.raw && outputIsTerminal()) {
-        throw CLI::ValidationError("--raw", "standard output is a terminal");
-    }
+    if (options.raw && outputIsTerminal()) throw UsageError{"--raw: standard output is a terminal"};
     const std::optional<std::string> path = session.openablePath(options.file);
     if (!path) return;
-    ISCSI::TOOL::ISCSIEPFileDAT file(*path);
-    std::string data;
-    const int error = file.getExtentData(options.index, options.extentSize, data);
-    if (!session.succeeded(error, options.file + ": extent " + std::to_string(options.index))) return;
-    if (options.raw) toBytes(data);
-    print(data);
-    if (!options.raw) print("\n");
+    tool::ISCSIEPFileDAT file(*path);
+    const std::string place = "extent " + std::to_string(options.index);
+    // Nothing is read yet: this tells whether there can be extents at all.
+    if (!session.succeeded(file.getExtentBytes(0, options.extentSize, 0, 0, nullptr), {options.file, place})) return;
+    sayDataStartDoubts(file, options.file);
+    const auto count = extentCount(file, options.extentSize);
+    if (!count) {
+        session.succeeded(tool::EP_ERR_OPEN_FAILED, {options.file, place});
+    } else if (options.index >= *count) {
+        session.failBeyondEnd(options.file, place, *count);
+    } else {
+        session.succeeded(printExtent(options, file), {options.file, place});
+    }
 }
 
 }  // namespace
 
-void addExtent(CLI::App& app, Session& session) {
+void addExtent(Command& parent, Session& session) {
     const auto options = std::make_shared<ExtentOptions>();
-    CLI::App* command = app.add_subcommand("extent", "Show one extent of a data file in hexadecimal");
-    command->add_option("DATFILE", options->file, "Data file of a volume")->required()->type_name("");
-    addParsed(command, "INDEX", "Number of the extent in the file", options->index, parseNumber)->required();
-    addParsed(command, "--extent-size", "Bytes of an extent; K, M or G may follow", options->extentSize, parseSize)
-        ->required();
-    command->add_flag("--raw", options->raw, "The bytes themselves");
-    command->callback([options, &session] { run(*options, session); });
+    parent.add("extent", "Show one extent of a data file in hexadecimal")
+        .argument("DATFILE", "Data file of a volume", options->file)
+        .argument("INDEX", "Number of the extent in the file, from 0", options->index, parseNumber)
+        .option("--extent-size", "SIZE", "Bytes of an extent; K, M, G or KiB, MiB, GiB may follow", options->extentSize,
+                parseSize32, Command::Need::one)
+        .flag("--raw", "The bytes themselves", options->raw)
+        .action([options, &session] { run(*options, session); });
 }
 
 }  // namespace epinspect

@@ -1,51 +1,48 @@
 // epinspect lun: the configuration of LUNs and where their map files lie.
-#include <CLI/App.hpp>
+#include <filesystem>
 #include <memory>
-#include <vector>
 
-#include "Json.h"
-#include "Numbers.h"
 #include "Output.h"
 #include "commands/Commands.h"
+#include "store/Luns.h"
 
 namespace epinspect {
 
-namespace tool = ISCSI::TOOL;
-
 namespace {
 
-struct LunOptions {
-    std::vector<std::string> lids;
-    bool json = false;
-};
-
-void printLun(const LunOptions& options, Session& session, std::uint32_t lid) {
-    const std::string subject = "LUN " + std::to_string(lid);
-    tool::ISCSILUNConfInfo lun(lid);
-    std::string mapPath;
-    if (!session.succeeded(lun.loadFromConfig(), subject)) return;
-    if (!session.succeeded(tool::ISCSIEPFileMAP().getMAPFilePath(lid, mapPath), subject)) return;
-    if (options.json) {
-        Json object = fileObject(mapPath);
-        addMembers(object, lun);
-        printJson(object);
+void printLun(const Session& session, const Lun& lun) {
+    if (!session.json) {
+        print(forReader(lun.record.toString()) + "\n" + forReader(lun.mapPath) + "\n");
         return;
     }
-    print(forReader(lun.toString()) + "\n" + forReader(mapPath) + "\n");
+    std::error_code error;
+    Json object(lun.mapPath);
+    writeMembers(object.begin("lun"), lun.record);
+    object.text("typeName", typeNameOf(lun.record))
+        .boolean("missing", !std::filesystem::exists(session.hostPath(lun.mapPath), error))
+        .end();
+}
+
+void printLuns(Session& session, Range range) {
+    const auto print = [&session](const Lun& lun) { printLun(session, lun); };
+    if (range.first < range.last && forEachLun(session, range, print)) return;
+    std::optional<QuietLog> quiet;
+    if (range.first < range.last) quiet.emplace();
+    // A single id; or none of the range exists, and the first one tells why.
+    Lun lun;
+    if (session.succeeded(loadLun(static_cast<std::uint32_t>(range.first), lun), subjectOf(range))) print(lun);
 }
 
 }  // namespace
 
-void addLun(CLI::App& app, Session& session) {
-    const auto options = std::make_shared<LunOptions>();
-    CLI::App* command = app.add_subcommand("lun", "Show the configuration of LUNs and the paths of their map files");
-    command->add_option("LID", options->lids, "LUN ids")->required();
-    command->add_flag("--json", options->json, "One JSON object a LUN");
-    command->callback([options, &session] {
-        std::vector<std::uint32_t> lids;
-        for (const std::string& text : options->lids) lids.push_back(parseNumber32(text));
-        for (const std::uint32_t lid : lids) printLun(*options, session, lid);
-    });
+void addLun(Command& parent, Session& session) {
+    const auto ranges = std::make_shared<std::vector<Range>>();
+    parent.add("lun", "Show the configuration of LUNs and the paths of their map files")
+        .arguments("LID", "LUN id; FIRST-LAST for those that exist from FIRST to LAST", *ranges, parseRange32)
+        .flag("--json", "One JSON object a LUN", session.json)
+        .action([ranges, &session] {
+            for (const Range range : *ranges) printLuns(session, range);
+        });
 }
 
 }  // namespace epinspect

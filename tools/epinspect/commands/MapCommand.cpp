@@ -1,16 +1,14 @@
 // epinspect map: all entries of a map file, as runs or as a picture.
-#include <CLI/App.hpp>
-#include <filesystem>
 #include <limits>
 #include <memory>
 
 #include "Json.h"
-#include "Numbers.h"
 #include "Output.h"
 #include "commands/Commands.h"
 #include "map/MapChart.h"
-#include "map/MapRuns.h"
+#include "map/MapOutput.h"
 #include "map/MapWalk.h"
+#include "store/Doubts.h"
 
 namespace epinspect {
 
@@ -23,104 +21,107 @@ struct MapOptions {
     std::uint64_t first = 0;
     std::uint64_t count = std::numeric_limits<std::uint64_t>::max();
     bool chart = false;
-    bool json = false;
 };
 
-/// "FIRST-LAST", or the one number when both are the same.
-std::string range(std::uint64_t first, std::uint64_t count) {
-    const std::string text = std::to_string(first);
-    return count == 1 ? text : text + "-" + std::to_string(first + count - 1);
+std::string counted(std::uint64_t count, const char* one, const char* several) {
+    return std::to_string(count) + " " + (count == 1 ? one : several);
 }
 
-std::string describe(const MapRun& run) {
-    std::string text = range(run.first, run.count) + ": ";
-    if (isHole(run.entry)) return text + "hole\n";
-    text += run.entry.mapped ? "mapped" : "unmapped";
-    if (run.entry.vpushed) text += " vpushed";
-    if (run.entry.vpulled) text += " vpulled";
-    if (run.entry.synced) text += " synced";
-    text += ", pool " + std::to_string(run.entry.poolNumber);
-    return text + (run.count == 1 ? ", extent " : ", extents ") + range(run.entry.extentAddress, run.count) + "\n";
+void printSummary(const MapSummary& summary, unsigned int width) {
+    const std::string text =
+        counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
+        std::to_string(summary.mapped) + " mapped, " + std::to_string(summary.unmapped) + " unmapped, " +
+        counted(summary.holes, "hole", "holes") + "; " + std::to_string(summary.vpushed) + " vpushed, " +
+        std::to_string(summary.vpulled) + " vpulled, " + std::to_string(summary.synced) + " synced";
+    print(wrapped(text, width, 0));
 }
 
-void printRun(const MapOptions& options, const MapRun& run) {
-    if (!options.json) {
-        print(describe(run));
-        return;
-    }
-    Json object = fileObject(options.file);
-    object["first"] = run.first;
-    object["count"] = run.count;
-    if (isHole(run.entry)) {
-        object["hole"] = true;
-    } else {
-        addMembers(object, run.entry);
-    }
-    printJson(object);
+void printSummary(Json& json, const MapSummary& summary) {
+    json.begin("summary")
+        .boolean("summary", true)
+        .number("entries", summary.entries)
+        .number("mapped", summary.mapped)
+        .number("unmapped", summary.unmapped)
+        .number("vpushed", summary.vpushed)
+        .number("vpulled", summary.vpulled)
+        .number("synced", summary.synced)
+        .number("holes", summary.holes)
+        .number("runs", summary.runs)
+        .end();
 }
 
-void printSummary(const MapOptions& options, const MapSummary& summary) {
-    if (!options.json) {
-        print(std::to_string(summary.entries) + " entries: " + std::to_string(summary.mapped) + " mapped, " +
-              std::to_string(summary.synced) + " synced, " + std::to_string(summary.holes) + " holes, in " +
-              std::to_string(summary.runs) + " runs\n");
-        return;
-    }
-    Json object = fileObject(options.file);
-    object["summary"] = true;
-    object["entries"] = summary.entries;
-    object["mapped"] = summary.mapped;
-    object["synced"] = summary.synced;
-    object["holes"] = summary.holes;
-    object["runs"] = summary.runs;
-    printJson(object);
-}
-
-/// Whether the map file ends where its entries would start.
-bool isEmptyMap(const tool::ISCSIEPFileMAP& file) {
-    std::error_code error;
-    return file.head0Type == tool::EP_FILE_TYPE_MAP &&
-           std::filesystem::file_size(file.path, error) == file.head0DataStartOffset && !error;
+/// Walks `range`, which the file held when its entries were counted, and gives the runs to each(run). Returns whether
+/// all entries were still there.
+template <typename Each>
+bool walkRuns(const MapOptions& options, Session& session, tool::ISCSIEPFileMAP& file, Range range, Each&& each) {
+    Progress progress("entries", range.last - range.first + 1,
+                      options.chart ? Progress::Beside::nothing : Progress::Beside::listing);
+    MapRuns runs;
+    const WalkEnd end = walkMap(file, range, progress,
+                                [&](std::uint64_t index, const auto& entries) { runs.add(index, entries, each); });
+    runs.finish(each);
+    const std::uint64_t next = range.first + end.met;
+    const Subject place = {options.file, "entry " + std::to_string(next)};
+    if (!session.succeeded(end.error, place, end.reason)) return false;
+    if (next - 1 == range.last) return true;
+    session.fail(place, "the file has become shorter while it was read", tool::EP_ERR_READ_FAILED);
+    return false;
 }
 
 void run(const MapOptions& options, Session& session) {
     const std::optional<std::string> path = session.openablePath(options.file);
     if (!path) return;
     tool::ISCSIEPFileMAP file(*path);
-    if (!session.succeeded(file.parseHead0(), options.file)) return;
+    unsigned long long total = 0;
+    if (!session.succeeded(file.parseHead0(), {options.file, ""})) return;
+    if (!session.succeeded(file.getEntryCount(total), {options.file, ""})) return;
+    sayDataStartDoubts(file, options.file);
+    sayPartialEntry(file, options.file);
+    if (options.first > 0 && options.first >= total) {
+        session.failBeyondEnd(options.file, "entry " + std::to_string(options.first), total);
+        return;
+    }
+    const std::uint64_t count = std::min<std::uint64_t>(options.count, total - options.first);
+    const unsigned int width = options.chart ? outputWidth() : std::numeric_limits<unsigned int>::max();
+    MapChart chart(options.first, count, width);
     MapSummary summary;
-    MapRun current;
-    MapChart chart(options.first);
-    const auto visit = [&](std::uint64_t index, const tool::ISCSIEPMapEntryInfo& entry) {
-        summary.add(entry);
-        if (current.count > 0 && current.continuesWith(entry)) {
-            ++current.count;
+    Json json(options.file);
+    Text line;
+    const auto each = [&](const MapRun& run) {
+        summary.add(run);
+        if (options.chart) {
+            chart.add(run.entry.mapped, run.count);
+        } else if (session.json) {
+            writeRun(json.begin("run"), run, entryOffset(file, run.first));
+            json.end();
         } else {
-            if (current.count > 0 && !options.chart) printRun(options, current);
-            current = {index, 1, entry};
-            ++summary.runs;
+            line.clear();
+            writeRun(line, run);
+            print(line.view());
         }
-        if (options.chart) chart.add(entry.mapped);
     };
-    const auto count = options.first == 0 && isEmptyMap(file) ? 0 : options.count;
-    const int error = walkMap(file, options.first, count, visit);
-    if (current.count > 0 && !options.chart) printRun(options, current);
-    if (!session.succeeded(error, options.file + ": entry " + std::to_string(options.first + summary.entries))) return;
-    if (options.chart) print(chart.draw(terminalWidth(), localeIsUnicode()));
-    printSummary(options, summary);
+    if (count > 0 && !walkRuns(options, session, file, {options.first, options.first + count - 1}, each)) return;
+    if (options.chart) print(chart.draw(outputIsUnicode()));
+    if (session.json) {
+        printSummary(json, summary);
+    } else {
+        printSummary(summary, width);
+    }
 }
 
 }  // namespace
 
-void addMap(CLI::App& app, Session& session) {
+void addMap(Command& parent, Session& session) {
     const auto options = std::make_shared<MapOptions>();
-    CLI::App* command = app.add_subcommand("map", "Show all entries of a map file, merged into runs");
-    command->add_option("MAPFILE", options->file, "Map file of a LUN")->required()->type_name("");
-    addParsed(command, "--first", "Index to start at", options->first, parseNumber);
-    addParsed(command, "--count", "Entries to show at most", options->count, parseNumber);
-    CLI::Option* json = command->add_flag("--json", options->json, "One JSON object a run, then one that sums up");
-    command->add_flag("--chart", options->chart, "A picture instead of the runs")->excludes(json);
-    command->callback([options, &session] { run(*options, session); });
+    parent.add("map", "Show all entries of a map file, merged into runs")
+        .argument("MAPFILE", "Map file of a LUN", options->file)
+        .option("--first", "N", "Index to start at (default: 0)", options->first, parseNumber)
+        .option("--count", "N", "Entries to show at most (default: all to the end of the file)", options->count,
+                parseNumber)
+        .flag("--chart", "A picture instead of the runs", options->chart)
+        .flag("--json", "One JSON object a run, then one that sums up", session.json)
+        .exclusive("--chart", "--json")
+        .action([options, &session] { run(*options, session); });
 }
 
 }  // namespace epinspect

@@ -1,22 +1,20 @@
 #include "map/MapChart.h"
 
-#include <langinfo.h>
-#include <sys/ioctl.h>
-#include <unistd.h>
-
 #include <algorithm>
-#include <cstring>
+
+#include "Output.h"
 
 namespace epinspect {
 
 namespace {
 
-constexpr std::size_t maxCells = 1024;
+constexpr std::uint64_t maxRows = 16;
 
 /// Shades by share of mapped entries: none, under a third, under two thirds, most, all.
 using Shades = const char* const[5];
 constexpr Shades blocks = {"·", "░", "▒", "▓", "█"};
 constexpr Shades letters = {".", "-", "+", "*", "#"};
+constexpr Shades meanings = {"none", "<1/3", "<2/3", "most", "all"};
 
 unsigned int shadeOf(std::uint64_t mapped, std::uint64_t entries) {
     if (mapped == 0) return 0;
@@ -26,45 +24,43 @@ unsigned int shadeOf(std::uint64_t mapped, std::uint64_t entries) {
 
 }  // namespace
 
-void MapChart::add(bool mapped) {
-    if (entries_ == cellSize_ * maxCells) {
-        for (std::size_t i = 0; i < maxCells / 2; ++i) mapped_[i] = mapped_[2 * i] + mapped_[2 * i + 1];
-        mapped_.resize(maxCells / 2);
-        cellSize_ *= 2;
-    }
-    if (entries_++ % cellSize_ == 0) mapped_.push_back(0);
-    mapped_.back() += mapped ? 1 : 0;
+MapChart::MapChart(std::uint64_t first, std::uint64_t count, unsigned int width)
+    : first_(first), width_(width), labelWidth_(std::to_string(first + count).size()) {
+    constexpr std::uint64_t frame = 3;  // " |" and "|"
+    rowCells_ = std::max<std::uint64_t>(width, labelWidth_ + frame + 1) - labelWidth_ - frame;
+    const std::uint64_t cells = maxRows * rowCells_;
+    cellSize_ = std::max<std::uint64_t>(count / cells + (count % cells > 0 ? 1 : 0), 1);
 }
 
-std::string MapChart::draw(unsigned int width, bool unicode) const {
-    const Shades& shades = unicode ? blocks : letters;
-    const auto labelWidth = std::to_string(first_ + entries_).size();
-    std::size_t rowCells = 64;
-    while (rowCells > 8 && labelWidth + 3 + rowCells > width) rowCells /= 2;
-    while (labelWidth + 3 + 2 * rowCells <= width && rowCells < maxCells / 8) rowCells *= 2;
+void MapChart::add(bool mapped, std::uint64_t count) {
+    while (count > 0) {
+        const auto free = cellSize_ - entries_ % cellSize_;
+        const auto part = std::min(count, free);
+        if (free == cellSize_) mapped_.push_back(0);
+        mapped_.back() += mapped ? part : 0;
+        entries_ += part;
+        count -= part;
+    }
+}
 
+std::string MapChart::draw(bool unicode) const {
+    const Shades& shades = unicode ? blocks : letters;
     std::string text;
-    for (std::size_t cell = 0; cell < mapped_.size(); ++cell) {
+    for (std::uint64_t cell = 0; cell < mapped_.size(); ++cell) {
         const std::uint64_t start = cell * cellSize_;
-        if (cell % rowCells == 0) {
+        if (cell % rowCells_ == 0) {
             const std::string label = std::to_string(first_ + start);
-            text.append(labelWidth - label.size(), ' ').append(label).append(" |");
+            text.append(labelWidth_ - label.size(), ' ').append(label).append(" |");
         }
         text.append(shades[shadeOf(mapped_[cell], std::min(cellSize_, entries_ - start))]);
-        if ((cell + 1) % rowCells == 0 || cell + 1 == mapped_.size()) text.append("|\n");
+        if ((cell + 1) % rowCells_ == 0 || cell + 1 == mapped_.size()) text.append("|\n");
     }
-    text.append("One cell: ").append(std::to_string(cellSize_)).append(cellSize_ == 1 ? " entry" : " entries");
-    text.append("\nMapped: ");
-    text.append(shades[0]).append(" none  ").append(shades[1]).append(" <1/3  ").append(shades[2]).append(" <2/3  ");
-    return text.append(shades[3]).append(" most  ").append(shades[4]).append(" all\n");
+    text += wrapped("One cell: " + std::to_string(cellSize_) + (cellSize_ == 1 ? " entry" : " entries"), width_, 0);
+    std::string legend = "Mapped: ";
+    for (std::size_t i = 0; i < std::size(meanings); ++i) {
+        legend.append(i == 0 ? "" : "  ").append(shades[i]).append(" ").append(meanings[i]);
+    }
+    return text + wrapped(legend, width_, 8, "  ");
 }
-
-unsigned int terminalWidth() {
-    winsize size = {};
-    const bool known = ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 0;
-    return known ? size.ws_col : 80;
-}
-
-bool localeIsUnicode() { return std::strcmp(nl_langinfo(CODESET), "UTF-8") == 0; }
 
 }  // namespace epinspect

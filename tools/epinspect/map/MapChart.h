@@ -7,29 +7,26 @@
 
 namespace epinspect {
 
-/// Counts mapped entries in cells of equal size. It need not know how many entries will come: when the cells run out,
-/// they are merged in pairs.
+/// Counts the mapped ones of `count` entries from index `first` on in cells of equal size, and draws them.
 class MapChart {
 public:
-    explicit MapChart(std::uint64_t firstIndex) : first_(firstIndex) {}
+    /// For a picture `width` columns wide.
+    MapChart(std::uint64_t first, std::uint64_t count, unsigned int width);
 
-    void add(bool mapped);
+    /// The next `count` entries are mapped, or are not.
+    void add(bool mapped, std::uint64_t count);
 
-    /// Rows of cells, each after the index it starts at, in `width` columns, and a legend; in block characters where
-    /// `unicode` is set.
-    std::string draw(unsigned int width, bool unicode) const;
+    /// Rows of cells, each after the index it starts at, and a legend; in block characters where `unicode` is set.
+    std::string draw(bool unicode) const;
 
 private:
     std::uint64_t first_;
-    std::uint64_t entries_ = 0;
-    std::uint64_t cellSize_ = 1;  ///< entries a cell stands for
-    std::vector<std::uint64_t> mapped_;
+    unsigned int width_;
+    std::size_t labelWidth_;
+    std::uint64_t rowCells_;
+    std::uint64_t cellSize_;             ///< entries a cell stands for
+    std::uint64_t entries_ = 0;          ///< how many have been added
+    std::vector<std::uint64_t> mapped_;  ///< of each cell
 };
-
-/// The width of the terminal that standard output is, 80 when it is none.
-unsigned int terminalWidth();
-
-/// Whether the locale's character set is UTF-8.
-bool localeIsUnicode();
 
 }  // namespace epinspect

@@ -1,0 +1,32 @@
+// The log line of every failure, one per failing step: "iSCSI:FILE:LINE:OPERATION MESSAGE" at priority LOG_ERR.
+#pragma once
+
+#include <cerrno>
+
+namespace ISCSI::TOOL {
+
+/// The system's own syslog(), by its name alone: whatever <syslog.h> makes of that name in a hardened build, a caller
+/// that puts a syslog() of its own in its place is called.
+[[gnu::format(printf, 2, 3)]] void SystemLog(int priority, const char* format, ...) __asm__("syslog");
+
+inline constexpr int SYSTEM_LOG_ERR = 3;
+
+/// Puts errno back when it goes: the log call must not disturb the reason of the failure.
+struct ErrnoKeeper {
+    ErrnoKeeper() = default;
+    ErrnoKeeper(const ErrnoKeeper&) = delete;
+    ErrnoKeeper& operator=(const ErrnoKeeper&) = delete;
+    ~ErrnoKeeper() { errno = kept; }
+    const int kept = errno;
+};
+
+}  // namespace ISCSI::TOOL
+
+/// Writes the line of `operation` in `sourceFile`. `line` is a fixed number that identifies the failure and never
+/// follows the source text; the format's literal and its arguments come after it.
+#define EP_LOG_ERR_FOR(sourceFile, operation, line, format, ...)                                                     \
+    (::ISCSI::TOOL::ErrnoKeeper(), ::ISCSI::TOOL::SystemLog(::ISCSI::TOOL::SYSTEM_LOG_ERR, "iSCSI:%s:%d:%s " format, \
+                                                            sourceFile, line, operation, __VA_ARGS__))
+
+/// The same on behalf of the operation it stands in.
+#define EP_LOG_ERR(line, format, ...) EP_LOG_ERR_FOR(__FILE_NAME__, __func__, line, format, __VA_ARGS__)

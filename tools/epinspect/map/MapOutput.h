@@ -1,0 +1,22 @@
+// How entries and runs are written.
+#pragma once
+
+#include "Json.h"
+#include "Text.h"
+#include "map/MapRuns.h"
+
+namespace epinspect {
+
+/// Appends "FIRST-LAST", or the one number when both are the same.
+void writeRange(Text& text, std::uint64_t first, std::uint64_t count);
+
+/// Appends the line of a run.
+void writeRun(Text& text, const MapRun& run);
+
+/// Writes the six members of an entry.
+void writeMembers(Json& object, const MapEntry& entry);
+
+/// Writes "first", "count", "entryOffset", and "hole" or the members of the first entry.
+void writeRun(Json& object, const MapRun& run, std::uint64_t entryOffset);
+
+}  // namespace epinspect

@@ -1,0 +1,37 @@
+// The configuration of LUNs, as the platform's library tells it.
+#pragma once
+
+#include <ISCSILUNConfInfo.h>
+
+#include <functional>
+#include <string>
+
+#include "Json.h"
+#include "Numbers.h"
+#include "Session.h"
+
+namespace epinspect {
+
+/// A LUN, and where its map file lies on the target.
+struct Lun {
+    ISCSI::TOOL::ISCSILUNConfInfo record;
+    std::string mapPath;
+};
+
+/// Loads the LUN `lid`. Returns 0 or the code of the platform's library.
+int loadLun(std::uint32_t lid, Lun& lun);
+
+/// How messages name LUNs.
+Subject subjectOf(Range lids);
+
+/// Calls each() for the LUNs whose ids are in `range`, lowest id first. Ids that no LUN has are passed over, other
+/// failures are reported. Returns whether there was a LUN or a failure.
+bool forEachLun(Session& session, Range range, const std::function<void(const Lun&)>& each);
+
+/// The name of a LUN's type.
+std::string typeNameOf(const ISCSI::TOOL::ISCSILUNConfInfo& lun);
+
+/// Writes all members of a LUN's record.
+void writeMembers(Json& object, const ISCSI::TOOL::ISCSILUNConfInfo& lun);
+
+}  // namespace epinspect
