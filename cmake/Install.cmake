@@ -37,7 +37,7 @@ if(ISCSIEPTOOL_BUILD_TOOLS)
     set_target_properties(epinspect PROPERTIES INSTALL_RPATH "$ORIGIN/${from_bin_to_lib}")
   endif()
   install(TARGETS epinspect epsample RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT tools)
-  install(FILES man/epinspect.1 man/epsample.1 DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tools)
+  install(FILES man/epinspect.1 DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tools)
   install(FILES tools/epinspect/completion.bash RENAME epinspect
     DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions COMPONENT tools)
   install(FILES docs/ep-files.md docs/epinspect-json.md

@@ -62,7 +62,7 @@ TEST(Epsample, StoresFitTogetherAndNothingIsOverwritten) {
     // clang-format on
     for (const auto& [arguments, status, message] : runs) {
         const std::string before = "cd '" + folder.path("") + (arguments == "cut" ? "'; ulimit -f 100; " : "'; ");
-        EXPECT_EQ(status << 8, std::system((before + EPSAMPLE_COMMAND " " + arguments + " 2>said").c_str()));
+        EXPECT_EQ(status << 8, std::system((before + PROGRAMS "/epsample " + arguments + " 2>said").c_str()));
         std::ifstream stream(folder.path("said"));
         const std::string said{std::istreambuf_iterator<char>(stream), {}};
         EXPECT_TRUE(status == 0 ? said.empty() : said.find(message) != std::string::npos) << arguments << '\n' << said;

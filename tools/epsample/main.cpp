@@ -46,7 +46,7 @@ struct Wanted {
 };
 
 std::uint64_t parseEntries(const std::string& text) {
-    const bool hexadecimal = text.compare(0, 2, "0x") == 0;
+    const bool hexadecimal = text.compare(0, 2, "0x") == 0 || text.compare(0, 2, "0X") == 0;
     const char* end = text.data() + text.size();
     std::uint64_t number = 0;
     const auto result = std::from_chars(text.data() + (hexadecimal ? 2 : 0), end, number, hexadecimal ? 16 : 10);
