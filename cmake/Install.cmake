@@ -54,7 +54,7 @@ if(ISCSIEPTOOL_BUILD_TOOLS)
     set_target_properties(epinspect PROPERTIES INSTALL_RPATH "${programs_rpath}")
   endif()
   install(TARGETS epinspect epsample RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT tools)
-  install(FILES man/epinspect.1 DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tools)
+  install(DIRECTORY man/ DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tools FILES_MATCHING PATTERN *.1)
   install(FILES tools/epinspect/completion.bash RENAME epinspect
     DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions COMPONENT tools)
   install(FILES docs/ep-files.md docs/epinspect-json.md

@@ -15,9 +15,8 @@ rm -rf "$folder"
 mkdir -p "$folder/source"
 git ls-files -z --cached --others --exclude-standard | tar -c --null -T - | tar -x -C "$folder/source"
 cd "$folder/source"
-export DEB_BUILD_OPTIONS="nocheck noautodbgsym parallel=$(nproc)"
-dpkg-buildpackage --host-arch "$architecture" --build=binary --unsigned-changes --no-check-builddeps \
-  --build-profiles=nocheck
+DEB_BUILD_OPTIONS="nocheck noautodbgsym terse parallel=$(nproc)" dpkg-buildpackage \
+  --host-arch "$architecture" --build=binary --unsigned-changes --no-check-builddeps --build-profiles=nocheck
 cd ..
 rm -rf source
 ls -- *.deb
