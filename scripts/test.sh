@@ -39,6 +39,8 @@ run_leg() {
   cmake --build --preset "$preset" --parallel "$(nproc)"
   echo "== $1: testing"
   ctest --preset "$preset" --parallel "$(nproc)"
+  [ "$1" != hardened ] || nm -D --undefined-only build/hardened/lib/libiscsieptool.so.1 | grep '__[a-z]*_chk@' ||
+    { echo "hardened: the library is not" >&2; return 1; }
 }
 
 legs=(native debug clang hardened asan tsan armhf armel armhf-clang)
