@@ -3,14 +3,21 @@
 // a list of any length no more than one LUN is held.
 #include "kelpiscsiep.h"
 
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <array>
+#include <cerrno>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
-#include <filesystem>
-#include <fstream>
+#include <istream>
 #include <nlohmann/json.hpp>
 #include <optional>
+#include <streambuf>
 #include <string>
+#include <system_error>
 #include <type_traits>
 
 namespace {
@@ -108,9 +115,9 @@ public:
     bool binary(const nlohmann::json::binary_t& /*value*/) { return take(OtherValue()); }
 
     bool start_array(std::size_t /*size*/) {
-        const bool proper = depth_ == 0 || take(OtherValue());
+        take(OtherValue());
         ++depth_;
-        return proper;
+        return true;
     }
 
     bool end_array() {
@@ -127,7 +134,7 @@ public:
     }
 
     bool key(const std::string& name) {
-        if (depth_ == inLun) key_ = keyOf(name);
+        key_ = keyOf(name);
         return true;
     }
 
@@ -190,19 +197,41 @@ private:
     std::optional<Result> result_;
 };
 
-std::string listPath() {
-    const char* path = std::getenv("KELPISCSIEP_LUNS");  // NOLINT(concurrency-mt-unsafe): nothing here sets it
-    return path != nullptr ? path : "/var/db/iscsi/luns.json";
-}
+/// The bytes of a file, a block at a time. A read that fails throws.
+class FileBytes : public std::streambuf {
+public:
+    explicit FileBytes(const char* path) : descriptor_(open(path, O_RDONLY | O_CLOEXEC | O_NONBLOCK)) {}
+    FileBytes(const FileBytes&) = delete;
+    FileBytes& operator=(const FileBytes&) = delete;
+    ~FileBytes() override {
+        if (descriptor_ >= 0) close(descriptor_);
+    }
+
+    bool isRegularFile() const {
+        struct stat status = {};
+        return descriptor_ >= 0 && fstat(descriptor_, &status) == 0 && S_ISREG(status.st_mode);
+    }
+
+protected:
+    int_type underflow() override {
+        const ssize_t count = read(descriptor_, block_.data(), block_.size());
+        if (count < 0) throw std::system_error(errno, std::generic_category());
+        setg(block_.data(), block_.data(), block_.data() + count);
+        return count > 0 ? traits_type::to_int_type(block_[0]) : traits_type::eof();
+    }
+
+private:
+    const int descriptor_;
+    std::array<char, 16384> block_;
+};
 
 Result findLun(std::uint32_t lid, void* record) {
-    const std::string path = listPath();
-    std::error_code error;
-    if (!std::filesystem::is_regular_file(path, error)) return LIST_UNREADABLE;
-    std::ifstream file(path, std::ios::binary);
-    if (!file) return LIST_UNREADABLE;
+    const char* path = std::getenv("KELPISCSIEP_LUNS");  // NOLINT(concurrency-mt-unsafe): nothing here sets it
+    FileBytes bytes(path != nullptr ? path : "/var/db/iscsi/luns.json");
+    if (!bytes.isRegularFile()) return LIST_UNREADABLE;
+    std::istream list(&bytes);
     LunFinder finder(lid);
-    if (!nlohmann::json::sax_parse(file, &finder)) return LIST_MALFORMED;
+    if (!nlohmann::json::sax_parse(list, &finder)) return LIST_MALFORMED;
     if (finder.result() == OK) fill(record, finder.lun());
     return finder.result();
 }

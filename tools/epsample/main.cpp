@@ -1,14 +1,17 @@
 // epsample: writes a sample LUN store to try the tools on.
-#include <CLI/App.hpp>
-#include <CLI/Config.hpp>
-#include <CLI/Formatter.hpp>
+#include <getopt.h>
+
+#include <cerrno>
 #include <charconv>
 #include <csignal>
 #include <cstdint>
 #include <exception>
 #include <filesystem>
 #include <iostream>
+#include <optional>
+#include <stdexcept>
 #include <string>
+#include <system_error>
 
 #include "BrokenStore.h"
 #include "SampleStore.h"
@@ -16,36 +19,68 @@
 
 namespace {
 
+constexpr const char* help = R"(Usage: epsample [--map-entries N] DIR
+       epsample --broken DIR
+
+Writes a LUN store to try the tools on below DIR, a new or empty folder that
+stands for / of the target: journal, LUN list, and the files of two volumes,
+the same at each run.
+
+  --map-entries N   entries of the map file of LUN 1, 4096 if not given; each
+                    is 1 MiB of the LUN
+  --broken          write a store in which one thing of each kind is wrong
+  -h, --help        show this text
+  -V, --version     show the version
+)";
+
+struct WrongUsage : std::runtime_error {
+    using std::runtime_error::runtime_error;
+};
+
+enum class Action { write, writeBroken, showHelp, showVersion };
+
 struct Wanted {
+    Action action = Action::write;
+    std::optional<std::uint64_t> mapEntries;
     std::string root;
-    std::uint64_t mapEntries = 4096;
-    bool broken = false;
 };
 
 std::uint64_t parseEntries(const std::string& text) {
-    const bool hexadecimal = text.compare(0, 2, "0x") == 0;
+    const bool hexadecimal = text.compare(0, 2, "0x") == 0 || text.compare(0, 2, "0X") == 0;
     const char* end = text.data() + text.size();
     std::uint64_t number = 0;
     const auto result = std::from_chars(text.data() + (hexadecimal ? 2 : 0), end, number, hexadecimal ? 16 : 10);
     if (result.ec != std::errc() || result.ptr != end || number > epsample::mostMapEntries) {
-        throw CLI::ValidationError(
-            "--map-entries", "'" + text + "' is not a number from 0 to " + std::to_string(epsample::mostMapEntries));
+        throw WrongUsage("--map-entries: '" + text + "' is not a number from 0 to " +
+                         std::to_string(epsample::mostMapEntries));
     }
     return number;
 }
 
-void addOptions(CLI::App& app, Wanted& wanted) {
-    app.set_version_flag("-V,--version", "epsample " EPSAMPLE_VERSION);
-    app.add_option("DIR", wanted.root, "Folder that stands for / of the target; new or empty")
-        ->required()
-        ->check([](const std::string& root) { return root.empty() ? "is empty" : ""; }, "");
-    auto* const entries = app.add_option_function<std::string>(
-        "--map-entries", [&wanted](const std::string& text) { wanted.mapEntries = parseEntries(text); },
-        "Entries of the map file of LUN 1, 1 MiB of the LUN each; 4096 if not given");
-    entries->type_name("N");
-    app.add_flag("--broken", wanted.broken, "Write a store with one fault of each kind instead")
-        ->disable_flag_override()
-        ->excludes(entries);
+/// Reads the command line; getopt_long() itself says which option is wrong.
+Wanted parse(int argc, char** argv) {
+    static char program[] = "epsample";
+    static const option options[] = {{"map-entries", required_argument, nullptr, 'm'},
+                                     {"broken", no_argument, nullptr, 'b'},
+                                     {"help", no_argument, nullptr, 'h'},
+                                     {"version", no_argument, nullptr, 'V'},
+                                     {nullptr, 0, nullptr, 0}};
+    if (argc > 0) argv[0] = program;
+    Wanted wanted;
+    for (int found = 0; (found = getopt_long(argc, argv, "hV", options, nullptr)) != -1;) {
+        if (found == 'h') return {Action::showHelp, {}, {}};
+        if (found == 'V') return {Action::showVersion, {}, {}};
+        if (found == 'b') wanted.action = Action::writeBroken;
+        if (found == 'm') wanted.mapEntries = parseEntries(optarg);
+        if (found == '?') throw WrongUsage("");
+    }
+    if (optind >= argc || *argv[optind] == '\0') throw WrongUsage("DIR is missing");
+    if (optind + 1 < argc) throw WrongUsage("'" + std::string(argv[optind + 1]) + "': only one DIR is possible");
+    if (wanted.action == Action::writeBroken && wanted.mapEntries) {
+        throw WrongUsage("--map-entries and --broken exclude each other");
+    }
+    wanted.root = argv[optind];
+    return wanted;
 }
 
 void complain(const std::string& message) { std::cerr << "epsample: " << message << '\n'; }
@@ -64,41 +99,34 @@ bool succeeds(const Work& work) {
     return false;
 }
 
-int writeStore(const Wanted& wanted) {
-    if (!succeeds([&wanted] { epsample::makeRoot(wanted.root); })) return 1;
+bool writeStore(const Wanted& wanted) {
+    if (!succeeds([&wanted] { epsample::makeRoot(wanted.root); })) return false;
     const bool written = succeeds([&wanted] {
-        if (wanted.broken) {
+        if (wanted.action == Action::writeBroken) {
             epsample::writeBrokenStore(wanted.root);
         } else {
-            epsample::writeSampleStore(wanted.root, wanted.mapEntries);
+            epsample::writeSampleStore(wanted.root, wanted.mapEntries.value_or(4096));
         }
     });
     if (!written) complain(wanted.root + ": what has been written is not a whole store");
-    return written ? 0 : 1;
+    return written;
 }
 
-int printed(const std::string& text) {
+bool print(const char* text) {
     std::cout << text << std::flush;
-    if (std::cout) return 0;
-    complain("standard output cannot be written");
-    return 1;
+    if (!std::cout) complain("standard output: " + std::generic_category().message(errno));
+    return std::cout.good();
 }
 
-int run(int argc, char** argv) {
-    CLI::App app("Writes a small LUN store below a folder, the same at each run.", "epsample");
-    Wanted wanted;
-    addOptions(app, wanted);
-    try {
-        app.parse(argc, argv);
-    } catch (const CLI::CallForHelp&) {
-        return printed(app.help());
-    } catch (const CLI::CallForVersion& version) {
-        return printed(version.what() + std::string("\n"));
-    } catch (const CLI::ParseError& error) {
-        complain(error.what() + std::string("\nTry 'epsample --help'."));
-        return 2;
+bool run(const Wanted& wanted) {
+    switch (wanted.action) {
+        case Action::showHelp:
+            return print(help);
+        case Action::showVersion:
+            return print("epsample " EPSAMPLE_VERSION "\n");
+        default:
+            return writeStore(wanted);
     }
-    return writeStore(wanted);
 }
 
 }  // namespace
@@ -106,6 +134,14 @@ int run(int argc, char** argv) {
 int main(int argc, char** argv) {
     std::signal(SIGXFSZ, SIG_IGN);  // a limit on the size of files is a failed write like others
     int status = 1;
-    succeeds([&] { status = run(argc, argv); });
+    succeeds([&] {
+        try {
+            status = run(parse(argc, argv)) ? 0 : 1;
+        } catch (const WrongUsage& error) {
+            if (*error.what() != '\0') complain(error.what());
+            std::cerr << "Try 'epsample --help'.\n";
+            status = 2;
+        }
+    });
     return status;
 }
