@@ -40,7 +40,8 @@ void printFile(const StoreFile& file, const std::optional<std::uint64_t>& entrie
     std::string text = file.kind->name + std::string(sizeColumns - std::min(sizeColumns - 1, size.size()), ' ') + size;
     if (file.lun != nullptr) text += "  LUN " + std::to_string(file.lun->record.lid);
     if (entries) text += "  " + std::to_string(*entries) + (entries == 1U ? " entry" : " entries");
-    if (file.mapName) text += "  " + file.mapName->typeName + " " + file.mapName->uuid + " " + file.mapName->name;
+    if (file.mapName) text += "  " + file.mapName->typeName + " " + file.mapName->uuid;
+    if (file.mapName && !file.mapName->name.empty()) text += " " + file.mapName->name;
     print(wrapped(forReader(text + "  " + file.path), outputWidth(), indent, "  "));
 }
 
