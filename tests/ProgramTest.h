@@ -43,11 +43,17 @@ inline bool matches(std::string_view text, std::string_view pattern) {
     return false;
 }
 
-/// Ends of messages.
-const std::string missing = "cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)\n";
-const std::string wrongType = "wrong type of EP file (EP_ERR_WRONG_FILE_TYPE, 18990400)\n";
-inline std::string beyondEnd(const std::string& held) {
-    return "beyond the end, the file holds " + held + " (EP_ERR_READ_FAILED, 18990039)\n";
+/// What epinspect writes to standard error for these messages.
+inline std::string says(std::initializer_list<std::string> messages) {
+    std::string lines;
+    for (const std::string& message : messages) lines += "epinspect: " + message + "\n";
+    return lines;
+}
+
+const std::string missing = ": cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)";
+const std::string wrongType = ": wrong type of EP file (EP_ERR_WRONG_FILE_TYPE, 18990400)";
+inline std::string holds(const std::string& what) {
+    return ": beyond the end, the file holds " + what + " (EP_ERR_READ_FAILED, 18990039)";
 }
 
 inline int exitStatus(int status) { return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status); }

@@ -119,7 +119,7 @@ const Case cases[] = {
      " { read first; truncate -s 90000 s; tail -n 1; }; done", 0, "1\n1\n1\n", shorter + shorter + shorter},
     {"diff and find and check name what is wrong",
      "epinspect diff gone other; epinspect diff a; epinspect find a; epinspect check --extent-size 0", 2, "",
-     "epinspect: gone: " + missing + "epinspect: other: cannot be opened: neither a regular file nor a block device …\n"
+     "epinspect: gone: cannot be opened: No such…epinspect: other: cannot be opened: neither a regular file…"
      "epinspect: MAPFILE is missing. Try 'epinspect diff --help'.\n"
      "epinspect: --extent or --pool is missing. Try…epinspect: --extent-size: '0': no extent has 0 bytes. Try 'epinspect check --help'.\n"},
 };

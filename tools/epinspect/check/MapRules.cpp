@@ -115,7 +115,8 @@ void MapRules::checkPartialEntry() const {
     if (rest == 0) return;
     report_.add({file_.path, "partial-entry", Value::number(file_.size), Value::number(rest),
                  "the file of " + std::to_string(file_.size) + " bytes ends inside entry " +
-                     std::to_string(bytes / entrySize) + ", of which " + std::to_string(rest) + " bytes are there"});
+                     std::to_string(bytes / entrySize) + ", " + std::to_string(rest) + " of its " +
+                     std::to_string(entrySize) + " bytes are there"});
 }
 
 void MapRules::checkUnmappedBits(const MapRun& run) {
