@@ -138,7 +138,7 @@ TEST_F(ProgramTest, CheckReportsEveryFieldThatDoesNotFit) {
         std::fstream file(path("own" + name), std::ios::binary | std::ios::in | std::ios::out);
         const auto place = std::streamoff(field.offset);
         std::string before(field.width, '\0');
-        file.seekg(place).read(before.data(), field.width);
+        file.seekg(place).read(before.data(), std::streamsize(field.width));
         file.seekp(place) << epbuilder::littleEndian(bad, field.width) << std::flush;
         expect({"", "epinspect check --root own", 3, "…" + name + ": " + rule + ": …", ""});
         file.seekp(place) << before << std::flush;
