@@ -13,6 +13,6 @@ target_compile_definitions(iscsieptool_flags INTERFACE _FILE_OFFSET_BITS=64)
 
 set(CMAKE_CXX_STANDARD 17)
 set(CMAKE_CXX_EXTENSIONS OFF)
-set(CMAKE_CXX_VISIBILITY_PRESET hidden)
-set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
 set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+# The same bytes whatever folder it is built in: the libraries are found from where the program lies.
+set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)

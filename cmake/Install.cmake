@@ -1,18 +1,26 @@
-# What goes where, in four components: runtime, development, tools, standin.
+# What goes where, in four components: runtime, development, tools, standin. The folders are those of GNUInstallDirs.
 include(CMakePackageConfigHelpers)
 
-# Found next to each other wherever the folder is moved; below /usr the system's own search path does.
-if(NOT CMAKE_INSTALL_PREFIX STREQUAL "/usr")
-  file(RELATIVE_PATH from_bin_to_lib /${CMAKE_INSTALL_BINDIR} /${CMAKE_INSTALL_LIBDIR})
+# Libraries and programs find each other wherever the whole is moved; in the system's own folders they need no help.
+set(system_libdirs /lib /usr/lib /usr/lib/${CMAKE_LIBRARY_ARCHITECTURE})
+if(NOT CMAKE_INSTALL_FULL_LIBDIR IN_LIST system_libdirs)
   set_target_properties(iscsieptool PROPERTIES INSTALL_RPATH "$ORIGIN")
+  if(IS_ABSOLUTE ${CMAKE_INSTALL_BINDIR} OR IS_ABSOLUTE ${CMAKE_INSTALL_LIBDIR})
+    set(programs_rpath ${CMAKE_INSTALL_FULL_LIBDIR})
+  else()
+    file(RELATIVE_PATH from_bin_to_lib /${CMAKE_INSTALL_BINDIR} /${CMAKE_INSTALL_LIBDIR})
+    set(programs_rpath "$ORIGIN/${from_bin_to_lib}")
+  endif()
 endif()
 
 install(TARGETS iscsieptool EXPORT iscsieptool
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
 install(DIRECTORY include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/iscsieptool COMPONENT development)
 
-# A program that uses the library need not see the platform's library when it is linked, only when it runs.
-target_link_options(iscsieptool INTERFACE $<INSTALL_INTERFACE:LINKER:--allow-shlib-undefined>)
+# The platform's library is wanted when a consumer runs, and is seldom on the machine where it is linked: its symbols
+# may stay open there. The package config and the .pc take the option from here.
+set(consumer_link_option --allow-shlib-undefined)
+target_link_options(iscsieptool INTERFACE $<INSTALL_INTERFACE:LINKER:${consumer_link_option}>)
 
 set(package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/iscsieptool)
 install(EXPORT iscsieptool NAMESPACE iscsieptool:: FILE iscsieptoolConfig.cmake
@@ -20,9 +28,18 @@ install(EXPORT iscsieptool NAMESPACE iscsieptool:: FILE iscsieptoolConfig.cmake
 write_basic_package_version_file(iscsieptoolConfigVersion.cmake COMPATIBILITY SameMajorVersion)
 install(FILES ${PROJECT_BINARY_DIR}/iscsieptoolConfigVersion.cmake DESTINATION ${package_dir} COMPONENT development)
 
-# The paths in the module start at its own folder, so that it may be moved with the rest.
-file(RELATIVE_PATH from_module_to_prefix /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
-string(REGEX REPLACE "/$" "" from_module_to_prefix ${from_module_to_prefix})
+# The paths in the .pc start at its own folder, so that it may be moved with the rest; an absolute folder stays put.
+set(pc_prefix ${CMAKE_INSTALL_PREFIX})
+if(NOT IS_ABSOLUTE ${CMAKE_INSTALL_LIBDIR})
+  file(RELATIVE_PATH from_pc_to_prefix /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
+  string(REGEX REPLACE "/$" "" pc_prefix "\${pcfiledir}/${from_pc_to_prefix}")
+endif()
+foreach(folder LIBDIR INCLUDEDIR)
+  set(pc_${folder} ${CMAKE_INSTALL_${folder}})
+  if(NOT IS_ABSOLUTE ${pc_${folder}})
+    set(pc_${folder} "\${prefix}/${pc_${folder}}")
+  endif()
+endforeach()
 configure_file(cmake/iscsieptool.pc.in iscsieptool.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/iscsieptool.pc
   DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT development)
@@ -33,11 +50,11 @@ if(NOT KELPISCSIEP_LIBRARY)
 endif()
 
 if(ISCSIEPTOOL_BUILD_TOOLS)
-  if(DEFINED from_bin_to_lib)
-    set_target_properties(epinspect PROPERTIES INSTALL_RPATH "$ORIGIN/${from_bin_to_lib}")
+  if(DEFINED programs_rpath)
+    set_target_properties(epinspect PROPERTIES INSTALL_RPATH "${programs_rpath}")
   endif()
   install(TARGETS epinspect epsample RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT tools)
-  install(FILES man/epinspect.1 DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tools)
+  install(DIRECTORY man/ DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tools FILES_MATCHING PATTERN *.1)
   install(FILES tools/epinspect/completion.bash RENAME epinspect
     DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions COMPONENT tools)
   install(FILES docs/ep-files.md docs/epinspect-json.md

@@ -1,4 +1,4 @@
-// What the tests share: log lines as they reach syslog(), and a folder for files. Included once per test program.
+// What the tests share: log lines as they reach syslog(). Included once per test program.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -6,13 +6,11 @@
 #include <cerrno>
 #include <cstdarg>
 #include <cstdio>
-#include <cstdlib>
-#include <filesystem>
 #include <fstream>
 #include <string>
 #include <vector>
 
-#include "EPFileBuilder.h"
+#include "TempDir.h"
 
 using Lines = std::vector<std::string>;
 
@@ -43,21 +41,3 @@ inline Lines chain(const std::string& path, Lines sources) {
     for (std::string& source : sources) source = "iSCSI:" + source + " path: " + path;
     return sources;
 }
-
-/// A folder of the test's own, gone at its end.
-class TempDir {
-public:
-    TempDir() { EXPECT_NE(nullptr, mkdtemp(path_.data())); }
-    ~TempDir() { std::filesystem::remove_all(path_); }
-
-    std::string path(const std::string& name) const { return path_ + "/" + name; }
-
-    /// Writes the file `name` and returns its path.
-    std::string write(const std::string& name, const epbuilder::EPFileBuilder& builder) const {
-        builder.write(path(name));
-        return path(name);
-    }
-
-private:
-    std::string path_ = (std::filesystem::temp_directory_path() / "eptestXXXXXX").string();
-};

@@ -43,7 +43,7 @@ __attribute__((visibility("default"))) ssize_t faultyReadCall(int descriptor, vo
     return syscall(SYS_read, descriptor, bytes, size);
 }
 
-int formatOrFail(char* text, std::size_t size, const char* format, va_list arguments) {
+[[gnu::format(printf, 3, 0)]] int formatOrFail(char* text, std::size_t size, const char* format, va_list arguments) {
     const int length = std::vsnprintf(text, size, format, arguments);
     return textsLeft >= 0 && textsLeft-- == 0 ? 35 : length;
 }

@@ -34,7 +34,7 @@ bool takesSeveral(Command::Need need) { return need == Command::Need::several ||
 
 }  // namespace
 
-Command& Command::flag(const char* name, const char* about, std::function<void()> take) {
+Command& Command::flag(const char* name, const char* about, const std::function<void()>& take) {
     options_.push_back({name, "", about, [take](const std::string&) { take(); }, Need::severalOrNone});
     return *this;
 }
@@ -128,7 +128,7 @@ void Command::checkWhole() const {
             }
         }
     }
-    const auto given = [this](const char* name) {
+    const auto given = [this](std::string_view name) {
         return std::any_of(options_.begin(), options_.end(),
                            [name](const Parameter& option) { return option.name == name && option.count > 0; });
     };

@@ -55,7 +55,7 @@ public:
     }
 
     /// An option without a value, which does `take`.
-    Command& flag(const char* name, const char* about, std::function<void()> take);
+    Command& flag(const char* name, const char* about, const std::function<void()>& take);
 
     /// An option without a value, which sets `target`.
     Command& flag(const char* name, const char* about, bool& target);

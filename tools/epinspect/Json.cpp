@@ -25,16 +25,16 @@ bool isUTF8(const std::string& text) {
 
 }  // namespace
 
-Json::Json(const std::string& file) : file_(",\"file\":" + (file.empty() ? "null" : escaped(file))) {
+Json::Json(const std::string& file) : file_(R"(,"file":)" + (file.empty() ? "null" : escaped(file))) {
     if (isUTF8(file)) return;
     std::string digits(2 * file.size(), '\0');
     ISCSI::TOOL::PutHexDigits(reinterpret_cast<const unsigned char*>(file.data()), file.size(), digits.data());
-    file_ += ",\"fileHex\":\"" + digits + "\"";
+    file_ += R"(,"fileHex":")" + digits + "\"";
 }
 
 Json& Json::begin(const char* kind) {
     line_.clear();
-    line_.add("{\"kind\":\"", kind, "\"", file_);
+    line_.add(R"({"kind":")", kind, "\"", file_);
     inner_ = true;
     return *this;
 }

@@ -41,7 +41,7 @@ void flushOutput() noexcept {
 }
 
 /// Characters that count as printable but show nothing, or change the direction of what follows.
-bool deceives(wchar_t character) {
+bool deceives(std::wint_t character) {
     struct Range {
         unsigned int first, last;
     };
@@ -53,10 +53,11 @@ bool deceives(wchar_t character) {
         {0x110BD, 0x110BD}, {0x110CD, 0x110CD}, {0x13430, 0x1343F}, {0x1BCA0, 0x1BCA3}, {0x1D173, 0x1D17A},
         {0xE0000, 0xE0FFF},
     };
-    const auto code = static_cast<unsigned int>(character);
     return std::any_of(std::begin(ranges), std::end(ranges),
-                       [code](const Range& range) { return range.first <= code && code <= range.last; });
+                       [character](const Range& range) { return range.first <= character && character <= range.last; });
 }
+
+bool isHarmful(std::wint_t character) { return std::iswprint(character) == 0 || deceives(character); }
 
 void appendEscaped(std::string& text, std::string_view bytes) {
     static constexpr char digits[] = "0123456789abcdef";
@@ -115,7 +116,7 @@ std::string printable(std::string_view text) {
             length = 1;
             state = {};
             appendEscaped(result, text.substr(0, 1));
-        } else if (std::iswprint(static_cast<std::wint_t>(character)) == 0 || deceives(character)) {
+        } else if (isHarmful(static_cast<std::wint_t>(character))) {
             appendEscaped(result, text.substr(0, length));
         } else {
             result.append(text.substr(0, length));
@@ -129,15 +130,15 @@ std::string forReader(std::string_view text) { return outputIsTerminal() ? print
 
 std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap) {
     const auto columns = [](std::string_view piece) {  // every character of our own texts is one column wide
-        return std::count_if(piece.begin(), piece.end(),
-                             [](char c) { return (static_cast<unsigned char>(c) & 0xC0U) != 0x80U; });
+        return static_cast<std::size_t>(std::count_if(
+            piece.begin(), piece.end(), [](char c) { return (static_cast<unsigned char>(c) & 0xC0U) != 0x80U; }));
     };
     std::string result;
     std::string line;
     for (bool first = true;; first = false) {
         const auto end = std::min(text.find(gap), text.size());
         const auto piece = text.substr(0, end);
-        if (!first && columns(line) + columns(gap) + columns(piece) > static_cast<std::ptrdiff_t>(width)) {
+        if (!first && columns(line) + columns(gap) + columns(piece) > width) {
             result.append(line).append("\n");
             line.assign(indent, ' ').append(piece);
         } else {
@@ -148,20 +149,23 @@ std::string wrapped(std::string_view text, unsigned int width, unsigned int inde
     }
 }
 
+void writeMessage(std::string_view text) noexcept {
+    static_cast<void>(writeAll(STDERR_FILENO, text.data(), text.size()));
+}
+
 void complain(std::string_view message) {
     const std::string line = "epinspect: " + printable(message) + "\n";
     flushOutput();
     Progress::erase();
-    static_cast<void>(writeAll(STDERR_FILENO, line.data(), line.size()));
+    writeMessage(line);
 }
 
 void complainPlainly(std::initializer_list<const char*> pieces) noexcept {
     flushOutput();
     Progress::erase();
-    const auto write = [](const char* text) { static_cast<void>(writeAll(STDERR_FILENO, text, std::strlen(text))); };
-    write("epinspect: ");
-    std::for_each(pieces.begin(), pieces.end(), write);
-    write("\n");
+    writeMessage("epinspect: ");
+    for (const char* piece : pieces) writeMessage(piece);
+    writeMessage("\n");
 }
 
 }  // namespace epinspect

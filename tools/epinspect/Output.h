@@ -45,6 +45,9 @@ std::string forReader(std::string_view text);
 /// blanks, every line ends with a line feed. What is too long stays whole.
 std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap = " ");
 
+/// Writes to standard error, as it is; takes no memory, and may be called in a signal handler.
+void writeMessage(std::string_view text) noexcept;
+
 /// Writes "epinspect: MESSAGE" to standard error, after all data that came before.
 void complain(std::string_view message);
 

@@ -58,14 +58,13 @@ void Progress::show(std::uint64_t done) {
     const auto columns = std::min<std::size_t>(
         {static_cast<std::size_t>(length), sizeof line - 1, terminalWidth(STDERR_FILENO) - std::size_t{1}});
     shown = 1;
-    static_cast<void>(write(STDERR_FILENO, line, columns));
+    writeMessage({line, columns});
 }
 
 void Progress::erase() noexcept {
     if (shown == 0) return;
     shown = 0;
-    static constexpr char text[] = "\r\033[K";
-    static_cast<void>(write(STDERR_FILENO, text, sizeof text - 1));
+    writeMessage("\r\033[K");
 }
 
 }  // namespace epinspect

@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <system_error>
+#include <utility>
 
 #include "CommandLine.h"
 #include "Json.h"
@@ -36,6 +37,8 @@ constexpr ErrorText errorTexts[] = {
     {tool::EP_ERR_BAD_EXTENT_SIZE, "EP_ERR_BAD_EXTENT_SIZE", "extent size cannot be used"},
 };
 
+constexpr const char* leadsOutText = "a link leads out of the folder of --root";
+
 /// The row of a code of the library, null for one of the platform's library.
 const ErrorText* find(int error) {
     for (const ErrorText& row : errorTexts) {
@@ -58,6 +61,7 @@ std::string whatFailed(int error, int reason) {
 }
 
 std::string named(const Subject& subject) {
+    if (subject.file.empty() && subject.part.empty()) return "''";
     return subject.file + (subject.file.empty() || subject.part.empty() ? "" : ": ") + subject.part;
 }
 
@@ -71,8 +75,22 @@ void Session::setRoot(const std::string& folder) {
     root_ = folder;
     while (!root_.empty() && root_.back() == '/') root_.pop_back();
     quiet_.emplace();
-    // The stand-in for the platform's library reads its list from there; another choice in the environment wins.
-    setenv("KELPISCSIEP_LUNS", hostPath("/var/db/iscsi/luns.json").c_str(), 0);
+}
+
+void Session::prepareLuns() {
+    if (canonicalRoot_.empty() || std::exchange(lunsPrepared_, true)) return;
+    std::string list = hostPath("/var/db/iscsi/luns.json");
+    if (leadsOut(list)) {
+        complain(list + ": not used: " + leadsOutText);
+        list = "/dev/null";
+    }
+    // The stand-in for the platform's library reads that list; another choice in the environment wins.
+    setenv("KELPISCSIEP_LUNS", list.c_str(), 0);
+}
+
+bool Session::exists(const std::string& path) const {
+    std::error_code error;
+    return fs::exists(hostPath(path), error) && !leadsOut(hostPath(path));
 }
 
 std::string Session::targetPath(const std::string& name) const {
@@ -104,12 +122,12 @@ std::optional<std::string> Session::openablePath(const std::string& name) {
     struct stat status = {};
     const char* refusal = nullptr;
     if (leadsOut(path)) {
-        refusal = "cannot be opened: a link leads out of the folder of --root";
+        refusal = leadsOutText;
     } else if (stat(path.c_str(), &status) == 0 && !S_ISREG(status.st_mode) && !S_ISBLK(status.st_mode)) {
-        refusal = "cannot be opened: neither a regular file nor a block device";
+        refusal = "neither a regular file nor a block device";
     }
     if (refusal == nullptr) return path;
-    fail({name, ""}, refusal, tool::EP_ERR_OPEN_FAILED);
+    fail({name, ""}, std::string("cannot be opened: ") + refusal, tool::EP_ERR_OPEN_FAILED);
     return std::nullopt;
 }
 

@@ -20,16 +20,19 @@ public:
     bool json = false;         ///< --json: failures are objects on standard output too
     bool differences = false;  ///< all was read, and there are findings or differences
 
-    /// Makes `folder` stand for / of the target: files are opened below it, the LUN list is looked for there, and
-    /// nothing goes to the system log. Throws UsageError when it is no folder.
+    /// Makes `folder` stand for / of the target: files are opened below it, and nothing goes to the system log. Throws
+    /// UsageError when it is no folder.
     void setRoot(const std::string& folder);
+
+    /// To be called before the first look at a LUN: its list is then looked for below the root folder too.
+    void prepareLuns();
 
     /// Where the file that the user called `name` lies on the target, as an absolute path: what lies below the root
     /// folder, however that is spelt, or a path of the target.
     std::string targetPath(const std::string& name) const;
 
-    /// Where the file at `path` of the target is to be opened here.
-    std::string hostPath(const std::string& path) const { return root_ + path; }
+    /// Whether something lies at `path` of the target.
+    bool exists(const std::string& path) const;
 
     /// Where to open the file that the user called `name`, unless something lies there that may not be opened: neither
     /// a regular file nor a block device, or a link that leads out of the root folder. Then reports that failure and
@@ -53,9 +56,14 @@ public:
     int status() const;
 
 private:
+    /// Where what lies at `path` of the target is here.
+    std::string hostPath(const std::string& path) const { return root_ + path; }
+
+    /// Whether `path`, as it is here, leads out of the root folder.
     bool leadsOut(const std::string& path) const;
 
     bool failed_ = false;
+    bool lunsPrepared_ = false;
     std::string root_;           ///< as typed, without a slash at its end; empty: / itself
     std::string canonicalRoot_;  ///< without links; empty without --root
     std::optional<QuietLog> quiet_;

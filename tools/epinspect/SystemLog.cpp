@@ -23,7 +23,7 @@ char errorLine[lineSize];  ///< the last line about an error of the platform's l
 
 /// Throws nothing: the caller is the library, which does not expect it.
 void keep(const char* line) noexcept {
-    if (std::strstr(line, errorMark.data()) != nullptr) std::strcpy(errorLine, line);
+    if (std::strstr(line, errorMark.data()) != nullptr) std::memcpy(errorLine, line, std::strlen(line) + 1);
     if (!shown) return;
     try {
         epinspect::complain(line);

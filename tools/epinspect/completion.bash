@@ -1,46 +1,82 @@
-# bash completion for epinspect: subcommands, options, kinds and file names.
+# bash completion for epinspect: subcommands, options, kinds and file names, also those below --root.
+
+# Offers the files ("-f") or folders ("-d") that $2 may become, as they lie below the folder $3.
+_epinspect_files() {
+    local path
+    while IFS= read -r path; do
+        [[ -d $path ]] && path+=/
+        COMPREPLY+=("${path#"$3"}")
+    done < <(compgen "$1" -- "$3$2")
+}
+
 _epinspect() {
-    local word=$2 previous=$3 command='' kind='' index
-    local commands='dump entry map extent lun path'
+    local word before command='' kind='' root='' files='' piece replaced pieces=() typed=() index
+    local commands='dump map entry extent lun path help' kinds='tbl fri jnl map dat'
     local common='--root --verbose --help'
     COMPREPLY=()
-    for ((index = 1; index < COMP_CWORD; index++)); do
-        if [[ ${COMP_WORDS[index - 1]} == --root ]]; then
-            continue
-        elif [[ -z $command && " $commands " == *" ${COMP_WORDS[index]} "* ]]; then
-            command=${COMP_WORDS[index]}
-        elif [[ $command == path && " tbl fri jnl dat map " == *" ${COMP_WORDS[index]} "* ]]; then
-            kind=${kind:-${COMP_WORDS[index]}}
+    # The words as the shell will see them: bash breaks them at "=" and "@".
+    # shellcheck disable=SC2162  # backslashes quote here
+    read -a pieces <<<"${COMP_LINE:0:COMP_POINT}"
+    [[ ${COMP_LINE:COMP_POINT-1:1} == ' ' ]] && pieces+=('')
+    for piece in "${pieces[@]}"; do
+        if [[ $piece == --*=* ]]; then
+            typed+=("${piece%%=*}" "${piece#*=}")
+        else
+            typed+=("$piece")
         fi
     done
-
-    case $previous in
-        --as) mapfile -t COMPREPLY < <(compgen -W 'tbl map dat fri jnl head' -- "$word") && return ;;
-        --root)
-            compopt -o filenames
-            mapfile -t COMPREPLY < <(compgen -d -- "$word")
-            return
-            ;;
-        --first | --count | --extent-size | --extent-address) return ;;
-    esac
+    word=${typed[-1]} before=${typed[-2]}
+    for ((index = 1; index < ${#typed[@]} - 1; index++)); do
+        case ${typed[index]} in
+            --root) root=${typed[++index]} ;;
+            --as | --first | --count | --extent-size | --extent-address) ((++index)) ;;
+            -*) ;;
+            *)
+                if [[ -z $command ]]; then
+                    command=${typed[index]}
+                elif [[ $command == path ]]; then
+                    kind=${kind:-${typed[index]}}
+                fi
+                ;;
+        esac
+    done
 
     local options=$common
     case $command in
         '') options="$commands $common --version" ;;
+        help) options=$commands ;;
         dump) options+=' --as --json' ;;
         entry | lun) options+=' --json' ;;
         map) options+=' --first --count --chart --json' ;;
         extent) options+=' --extent-size --raw' ;;
         path)
-            [[ -z $kind ]] && options="tbl fri jnl dat map $common"
+            [[ -z $kind ]] && options="$kinds $common"
             [[ $kind == dat ]] && options+=' --extent-size --extent-address'
             ;;
     esac
-    if [[ $word == -* || -z $command || ($command == path && -z $kind) ]]; then
+    case $before in
+        --as) options='tbl map dat fri jnl head' ;;
+        --root) files=-d ;;
+        --first | --count | --extent-size | --extent-address) return ;;
+        *) [[ $word == -* || -z $command || $command$kind =~ ^(help|lun|path|pathmap)$ ]] || files=-f ;;
+    esac
+    if [[ -z $files ]]; then
         mapfile -t COMPREPLY < <(compgen -W "$options" -- "$word")
-    elif [[ $command != lun && $kind != map ]]; then
-        compopt -o filenames
-        mapfile -t COMPREPLY < <(compgen -f -- "$word")
+        [[ $word != -* && ($command == lun || $kind == map) ]] && COMPREPLY=()
+    else
+        if [[ $files == -f && -n $root ]]; then
+            root=${root/#\~/$HOME} root=${root%/}
+            [[ $word == /* ]] || root+=/
+            _epinspect_files -f "$word" "$root"
+        fi
+        [[ ${#COMPREPLY[@]} != 0 ]] || _epinspect_files "$files" "$word" ''
+        [[ ${#COMPREPLY[@]} == 1 && ${COMPREPLY[0]} != */ ]] || compopt -o nospace
     fi
+    # bash replaces no more than $2, the end of the word.
+    # shellcheck disable=SC2162
+    read replaced <<<"$2"
+    for index in "${!COMPREPLY[@]}"; do
+        printf -v "COMPREPLY[index]" %q "${COMPREPLY[index]#"${word%"$replaced"}"}"
+    done
 }
 complete -F _epinspect epinspect

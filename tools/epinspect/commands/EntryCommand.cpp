@@ -1,4 +1,5 @@
 // epinspect entry: the map entries of given indexes.
+#include <algorithm>
 #include <memory>
 
 #include "Json.h"
@@ -31,14 +32,16 @@ void printEntry(Json* json, const tool::ISCSIEPFileMAP& file, std::uint64_t inde
 
 /// The entries of a range up to the first one that is not there.
 void printRange(const EntryOptions& options, Session& session, Json* json, tool::ISCSIEPFileMAP& file, Range range) {
-    Progress progress("entries", range.last - range.first, Progress::Beside::listing);
-    const WalkEnd end = walkMap(file, range, progress, [&](std::uint64_t index, const auto& entries) {
+    unsigned long long count = 0;
+    if (range.first < range.last && !session.succeeded(file.getEntryCount(count), {options.file, ""})) return;
+    const std::uint64_t end = std::clamp<std::uint64_t>(count, range.first, range.last);
+    Progress progress("entries", end - range.first, Progress::Beside::listing);
+    const WalkEnd walk = walkMap(file, range, progress, [&](std::uint64_t index, const auto& entries) {
         for (const MapEntry& entry : entries) printEntry(json, file, index++, entry);
     });
-    const std::uint64_t next = range.first + end.met;
+    const std::uint64_t next = range.first + walk.met;
     const std::string place = "entry " + std::to_string(next);
-    if (!session.succeeded(end.error, {options.file, place}, end.reason) || next - 1 == range.last) return;
-    unsigned long long count = 0;
+    if (!session.succeeded(walk.error, {options.file, place}, walk.reason) || next - 1 == range.last) return;
     if (!session.succeeded(file.getEntryCount(count), {options.file, place})) return;
     session.failBeyondEnd(options.file, place, count);
 }

@@ -8,6 +8,7 @@
 
 #include "Numbers.h"
 #include "Output.h"
+#include "Progress.h"
 #include "commands/Commands.h"
 #include "store/Doubts.h"
 #include "store/FileSize.h"
@@ -38,6 +39,7 @@ int printExtent(const ExtentOptions& options, tool::ISCSIEPFileDAT& file) {
     const unsigned int size = std::min(options.extentSize, blockSize);
     std::vector<unsigned char> bytes(size);
     std::string digits(options.raw ? 0 : 2 * std::size_t{size}, '\0');
+    Progress progress("bytes", options.extentSize, Progress::Beside::listing);
     for (unsigned int offset = 0; offset < options.extentSize;) {
         const unsigned int length = std::min(options.extentSize - offset, blockSize);
         const int error = file.getExtentBytes(options.index, options.extentSize, offset, length, bytes.data());
@@ -49,6 +51,7 @@ int printExtent(const ExtentOptions& options, tool::ISCSIEPFileDAT& file) {
             print({digits.data(), 2 * std::size_t{length}});
         }
         offset += length;
+        progress.show(offset);
     }
     if (!options.raw) print("\n");
     return 0;

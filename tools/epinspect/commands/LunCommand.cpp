@@ -1,5 +1,4 @@
 // epinspect lun: the configuration of LUNs and where their map files lie.
-#include <filesystem>
 #include <memory>
 
 #include "Output.h"
@@ -15,12 +14,9 @@ void printLun(const Session& session, const Lun& lun) {
         print(forReader(lun.record.toString()) + "\n" + forReader(lun.mapPath) + "\n");
         return;
     }
-    std::error_code error;
     Json object(lun.mapPath);
     writeMembers(object.begin("lun"), lun.record);
-    object.text("typeName", typeNameOf(lun.record))
-        .boolean("missing", !std::filesystem::exists(session.hostPath(lun.mapPath), error))
-        .end();
+    object.text("typeName", typeNameOf(lun.record)).boolean("missing", !session.exists(lun.mapPath)).end();
 }
 
 void printLuns(Session& session, Range range) {
@@ -30,7 +26,7 @@ void printLuns(Session& session, Range range) {
     if (range.first < range.last) quiet.emplace();
     // A single id; or none of the range exists, and the first one tells why.
     Lun lun;
-    if (session.succeeded(loadLun(static_cast<std::uint32_t>(range.first), lun), subjectOf(range))) print(lun);
+    if (session.succeeded(loadLun(session, static_cast<std::uint32_t>(range.first), lun), subjectOf(range))) print(lun);
 }
 
 }  // namespace

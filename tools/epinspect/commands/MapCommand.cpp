@@ -7,7 +7,7 @@
 #include "commands/Commands.h"
 #include "map/MapChart.h"
 #include "map/MapOutput.h"
-#include "map/MapWalk.h"
+#include "map/RunWalk.h"
 #include "store/Doubts.h"
 
 namespace epinspect {
@@ -27,13 +27,11 @@ std::string counted(std::uint64_t count, const char* one, const char* several) {
     return std::to_string(count) + " " + (count == 1 ? one : several);
 }
 
-void printSummary(const MapSummary& summary, unsigned int width) {
-    const std::string text =
-        counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
-        std::to_string(summary.mapped) + " mapped, " + std::to_string(summary.unmapped) + " unmapped, " +
-        counted(summary.holes, "hole", "holes") + "; " + std::to_string(summary.vpushed) + " vpushed, " +
-        std::to_string(summary.vpulled) + " vpulled, " + std::to_string(summary.synced) + " synced";
-    print(wrapped(text, width, 0));
+std::string textOf(const MapSummary& summary) {
+    return counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
+           std::to_string(summary.mapped) + " mapped, " + std::to_string(summary.unmapped) + " unmapped, " +
+           counted(summary.holes, "hole", "holes") + "; " + std::to_string(summary.vpushed) + " vpushed, " +
+           std::to_string(summary.vpulled) + " vpulled, " + std::to_string(summary.synced) + " synced";
 }
 
 void printSummary(Json& json, const MapSummary& summary) {
@@ -50,24 +48,6 @@ void printSummary(Json& json, const MapSummary& summary) {
         .end();
 }
 
-/// Walks `range`, which the file held when its entries were counted, and gives the runs to each(run). Returns whether
-/// all entries were still there.
-template <typename Each>
-bool walkRuns(const MapOptions& options, Session& session, tool::ISCSIEPFileMAP& file, Range range, Each&& each) {
-    Progress progress("entries", range.last - range.first + 1,
-                      options.chart ? Progress::Beside::nothing : Progress::Beside::listing);
-    MapRuns runs;
-    const WalkEnd end = walkMap(file, range, progress,
-                                [&](std::uint64_t index, const auto& entries) { runs.add(index, entries, each); });
-    runs.finish(each);
-    const std::uint64_t next = range.first + end.met;
-    const Subject place = {options.file, "entry " + std::to_string(next)};
-    if (!session.succeeded(end.error, place, end.reason)) return false;
-    if (next - 1 == range.last) return true;
-    session.fail(place, "the file has become shorter while it was read", tool::EP_ERR_READ_FAILED);
-    return false;
-}
-
 void run(const MapOptions& options, Session& session) {
     const std::optional<std::string> path = session.openablePath(options.file);
     if (!path) return;
@@ -82,8 +62,7 @@ void run(const MapOptions& options, Session& session) {
         return;
     }
     const std::uint64_t count = std::min<std::uint64_t>(options.count, total - options.first);
-    const unsigned int width = options.chart ? outputWidth() : std::numeric_limits<unsigned int>::max();
-    MapChart chart(options.first, count, width);
+    MapChart chart(options.first, count, outputWidth());
     MapSummary summary;
     Json json(options.file);
     Text line;
@@ -100,12 +79,15 @@ void run(const MapOptions& options, Session& session) {
             print(line.view());
         }
     };
-    if (count > 0 && !walkRuns(options, session, file, {options.first, options.first + count - 1}, each)) return;
-    if (options.chart) print(chart.draw(outputIsUnicode()));
+    const auto beside = options.chart ? Progress::Beside::nothing : Progress::Beside::listing;
+    const Range range = {options.first, options.first + count - 1};
+    if (count > 0 && !walkRuns(session, options.file, file, range, beside, each)) return;
     if (session.json) {
         printSummary(json, summary);
+    } else if (options.chart) {
+        print(chart.draw(outputIsUnicode()) + wrapped(textOf(summary), outputWidth(), 0));
     } else {
-        printSummary(summary, width);
+        print(textOf(summary) + "\n");
     }
 }
 

@@ -1,6 +1,8 @@
 // epinspect path: where EP files lie on the target.
 #include <ISCSIEPFile.h>
 
+#include <cerrno>
+#include <limits>
 #include <memory>
 
 #include "Numbers.h"
@@ -54,12 +56,17 @@ void addPath(Command& parent, Session& session) {
         .argument("LID", "LUN id", options->lid, parseNumber32)
         .action([options, &session] {
             Lun lun;
-            if (session.succeeded(loadLun(options->lid, lun), subjectOf({options->lid, options->lid}))) {
+            if (session.succeeded(loadLun(session, options->lid, lun), subjectOf({options->lid, options->lid}))) {
                 print(forReader(lun.mapPath) + "\n");
             }
         });
     addKind(path, session, options, "dat", "The data file that holds an extent address",
             [options](const ISCSIEPFile& file, std::string& result) {
+                constexpr auto limit = static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max());
+                if (options->extentSize > 0 && options->extentAddress > limit / options->extentSize) {
+                    errno = 0;
+                    return ISCSI::TOOL::EP_ERR_SEEK_FAILED;
+                }
                 return file.getDATFilePath(options->extentSize, options->extentAddress, result);
             })
         .option("--extent-size", "SIZE", "Bytes of an extent; K, M, G or KiB, MiB, GiB may follow", options->extentSize,

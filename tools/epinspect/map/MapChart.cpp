@@ -46,7 +46,7 @@ void MapChart::add(bool mapped, std::uint64_t count) {
 std::string MapChart::draw(bool unicode) const {
     const Shades& shades = unicode ? blocks : letters;
     std::string text;
-    for (std::uint64_t cell = 0; cell < mapped_.size(); ++cell) {
+    for (std::size_t cell = 0; cell < mapped_.size(); ++cell) {
         const std::uint64_t start = cell * cellSize_;
         if (cell % rowCells_ == 0) {
             const std::string label = std::to_string(first_ + start);

@@ -34,7 +34,7 @@ void sayPartialEntry(const tool::ISCSIEPFile& file, const std::string& name) {
     const auto size = sizeOf(file.path);
     if (!size || *size <= file.head0DataStartOffset) return;
     const auto rest = (*size - file.head0DataStartOffset) % entrySize;
-    if (rest > 0) complain(name + ": ends inside an entry, of which " + std::to_string(rest) + " bytes are there");
+    if (rest > 0) complain(name + ": ends inside an entry, " + std::to_string(rest) + " of its 8 bytes are there");
 }
 
 }  // namespace epinspect

@@ -2,7 +2,8 @@
 
 #include <ISCSIEPFileMAP.h>
 
-#include <limits>
+#include <algorithm>
+#include <map>
 
 #include "Progress.h"
 #include "SystemLog.h"
@@ -11,7 +12,8 @@ namespace epinspect {
 
 namespace tool = ISCSI::TOOL;
 
-int loadLun(std::uint32_t lid, Lun& lun) {
+int loadLun(Session& session, std::uint32_t lid, Lun& lun) {
+    session.prepareLuns();
     lun.record = tool::ISCSILUNConfInfo(lid);
     const int error = lun.record.loadFromConfig();
     return error != 0 ? error : tool::ISCSIEPFileMAP().getMAPFilePath(lid, lun.mapPath);
@@ -22,19 +24,31 @@ Subject subjectOf(Range lids) {
 }
 
 bool forEachLun(Session& session, Range range, const std::function<void(const Lun&)>& each) {
+    struct Failures {
+        std::uint64_t count = 0, firstId = 0;
+    };
     const QuietLog quiet;
     Progress progress("LUN ids", range.last - range.first + 1, Progress::Beside::listing);
+    std::map<int, Failures> failures;  // by code
     Lun lun;
-    // Which code stands for "no such LUN" is the platform's secret; the largest id, which no LUN has, tells it.
-    const int noSuchLun = loadLun(std::numeric_limits<std::uint32_t>::max(), lun);
     bool met = false;
     for (std::uint64_t id = range.first; id <= range.last; ++id) {
-        const auto lid = static_cast<std::uint32_t>(id);
-        const int error = loadLun(lid, lun);
+        const int error = loadLun(session, static_cast<std::uint32_t>(id), lun);
+        if (error == 0) {
+            met = true;
+            each(lun);
+        } else if (failures[error].count++ == 0) {
+            failures[error].firstId = id;
+        }
         progress.show(id - range.first);
-        if (error == noSuchLun && error != 0) continue;
-        met = true;
-        if (session.succeeded(error, subjectOf({id, id}))) each(lun);
+    }
+    // Which code stands for "no such LUN" is the platform's secret: the most frequent one does, any other is a failure.
+    const auto frequent = std::max_element(
+        failures.begin(), failures.end(), [](const auto& a, const auto& b) { return a.second.count < b.second.count; });
+    for (auto failure = failures.begin(); failure != failures.end(); ++failure) {
+        const std::uint64_t id = failure->second.firstId;
+        if (failure == frequent) continue;
+        session.succeeded(loadLun(session, static_cast<std::uint32_t>(id), lun), subjectOf({id, id}));
     }
     return met;
 }

@@ -19,13 +19,13 @@ struct Lun {
 };
 
 /// Loads the LUN `lid`. Returns 0 or the code of the platform's library.
-int loadLun(std::uint32_t lid, Lun& lun);
+int loadLun(Session& session, std::uint32_t lid, Lun& lun);
 
 /// How messages name LUNs.
 Subject subjectOf(Range lids);
 
-/// Calls each() for the LUNs whose ids are in `range`, lowest id first. Ids that no LUN has are passed over, other
-/// failures are reported. Returns whether there was a LUN or a failure.
+/// Calls each() for the LUNs whose ids are in `range`, lowest id first. Ids that no LUN has are passed over, of other
+/// failures the first one of each kind is reported. Returns whether there was a LUN.
 bool forEachLun(Session& session, Range range, const std::function<void(const Lun&)>& each);
 
 /// The name of a LUN's type.

@@ -1,0 +1,132 @@
+// What the tests of epinspect and epsample share: commands as they are typed, and what they print, say and end with.
+#pragma once
+
+#include <gtest/gtest.h>
+#include <pty.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cctype>
+#include <fstream>
+#include <functional>
+#include <string>
+#include <string_view>
+
+#include "TempDir.h"
+
+using epbuilder::EPFileBuilder;
+
+/// A promise, which becomes the name of its test: a command, its exit status (128 and more after a signal), and what it
+/// prints to standard output and error; "…" in these texts stands for anything.
+struct Case {
+    std::string promise, command;
+    int status;
+    std::string out, err;
+};
+
+inline void PrintTo(const Case& c, std::ostream* stream) { *stream << c.command; }
+
+inline std::string nameOf(const testing::TestParamInfo<Case>& info) {
+    std::string name = info.param.promise;
+    for (char& c : name) c = std::isalnum(static_cast<unsigned char>(c)) != 0 ? c : '_';
+    return name;
+}
+
+inline bool matches(std::string_view text, std::string_view pattern) {
+    const std::string_view gap = "…";
+    const auto end = pattern.find(gap);
+    if (end == std::string_view::npos) return text == pattern;
+    if (text.substr(0, end) != pattern.substr(0, end)) return false;
+    for (auto rest = end; rest <= text.size(); ++rest) {
+        if (matches(text.substr(rest), pattern.substr(end + gap.size()))) return true;
+    }
+    return false;
+}
+
+/// What epinspect writes to standard error for these messages.
+inline std::string says(std::initializer_list<std::string> messages) {
+    std::string lines;
+    for (const std::string& message : messages) lines += "epinspect: " + message + "\n";
+    return lines;
+}
+
+const std::string missing = ": cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)";
+const std::string wrongType = ": wrong type of EP file (EP_ERR_WRONG_FILE_TYPE, 18990400)";
+inline std::string holds(const std::string& what) {
+    return ": beyond the end, the file holds " + what + " (EP_ERR_READ_FAILED, 18990039)";
+}
+
+inline int exitStatus(int status) { return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status); }
+
+/// Tests in a folder of their own, which is the current one of their commands. In it `store` is a link to a sample
+/// store that all tests share.
+class ProgramTest : public testing::TestWithParam<Case> {
+protected:
+    ProgramTest() {
+        static const TempDir shared;
+        static const int made = std::system(script("epsample '" + shared.path("store") + "'").c_str());
+        EXPECT_EQ(0, made);
+        std::filesystem::create_symlink(shared.path("store"), path("store"));
+    }
+
+    std::string path(const std::string& name) const { return folder_.path(name); }
+    void write(const std::string& name, const EPFileBuilder& builder) const { folder_.write(name, builder); }
+
+    /// What makes the shell do `command` in the test's folder, whatever the environment of the tests is.
+    std::string script(const std::string& command) const {
+        return "unset KELPISCSIEP_LUNS; export TZ=UTC LC_ALL=C PATH='" PROGRAMS "':\"$PATH\"; cd '" + path("") +
+               "'; {\n" + command + "\n}";
+    }
+
+    void expect(const Case& c) const {
+        EXPECT_EQ(c.status, exitStatus(std::system((script(c.command) + " >.out 2>.err").c_str())));
+        for (const auto& [name, text] : {std::pair(".out", c.out), std::pair(".err", c.err)}) {
+            std::ifstream file(path(name), std::ios::binary);
+            EXPECT_PRED2(matches, std::string(std::istreambuf_iterator<char>(file), {}), text);
+        }
+    }
+
+private:
+    TempDir folder_;
+};
+
+/// A terminal, `columns` wide, on which a process does something. The carriage returns at the ends of lines are left
+/// out.
+class Terminal {
+public:
+    Terminal(unsigned short columns, const std::function<void()>& action) {
+        const winsize size = {24, columns, 0, 0};
+        process_ = forkpty(&terminal_, nullptr, nullptr, &size);
+        if (process_ != 0) return;
+        action();
+        _exit(0);
+    }
+    Terminal(unsigned short columns, const std::string& script)
+        : Terminal(columns, [&script] { execl("/bin/sh", "sh", "-c", script.c_str(), nullptr); }) {}
+    ~Terminal() { close(terminal_); }
+
+    void interrupt() const { EXPECT_EQ(1, write(terminal_, "\003", 1)); }
+
+    /// All that is shown until `text` is, or to the end.
+    std::string shownUntil(const std::string& text) {
+        char byte = 0;
+        while (shown_.find(text) == std::string::npos && read(terminal_, &byte, 1) == 1) {
+            if (byte == '\n' && !shown_.empty()) shown_.pop_back();
+            shown_ += byte;
+        }
+        return shown_;
+    }
+
+    /// All that is shown to the end, and "=STATUS".
+    std::string shown() {
+        shownUntil(std::string(1, '\0'));
+        int status = 0;
+        EXPECT_EQ(process_, waitpid(process_, &status, 0));
+        return shown_ + "=" + std::to_string(exitStatus(status));
+    }
+
+private:
+    int terminal_ = -1;
+    pid_t process_ = -1;
+    std::string shown_;
+};

@@ -1,0 +1,149 @@
+// The rooms of epinspect on their own: numbers, runs, the chart, the system log, progress.
+#include <cstdarg>
+#include <map>
+#include <sstream>
+#include <thread>
+
+#include "CommandLine.h"
+#include "Numbers.h"
+#include "ProgramTest.h"
+#include "Progress.h"
+#include "Session.h"
+#include "map/MapChart.h"
+#include "map/MapRuns.h"
+
+using namespace epinspect;
+
+namespace {
+
+using Numbers = std::map<std::string, std::uint64_t>;
+
+std::string forwarded;  ///< what went to the system log
+
+/// "FIRST+COUNT@ADDRESS " of each run in the blocks of entries.
+std::string runsOf(const std::vector<std::vector<MapEntry>>& blocks) {
+    std::ostringstream text;
+    const auto emit = [&text](const MapRun& run) {
+        text << run.first << '+' << run.count << '@' << run.entry.extentAddress << ' ';
+    };
+    MapRuns runs;
+    std::uint64_t first = 0;
+    for (const auto& block : blocks) runs.add(std::exchange(first, first + block.size()), block, emit);
+    runs.finish(emit);
+    return text.str();
+}
+
+}  // namespace
+
+/// What the program's syslog() calls, whatever a hardened build makes of that name.
+void keepForwarded(int priority, const char* format, va_list arguments) __asm__("vsyslog");
+__attribute__((visibility("default"))) void keepForwarded(int priority, const char* format, va_list arguments) {
+    char text[100];
+    std::vsnprintf(text, sizeof text, format, arguments);
+    forwarded += std::to_string(priority) + " " + text + "\n";
+}
+extern "C" void syslog(int priority, const char* format, ...);
+
+TEST(Numbers, AreDecimalOrHexadecimalAndNothingElse) {
+    for (const auto& [text, number] :
+         Numbers{{"0", 0}, {"007", 7}, {"0x1F", 31}, {"0Xa", 10}, {"18446744073709551615", UINT64_MAX}})
+        EXPECT_EQ(number, parseNumber(text)) << text;
+    for (const char* text : {"", "0x", "x1", "1x", " 1", "1 ", "-1", "+1", "1K", "0x-1", "18446744073709551616"})
+        EXPECT_THROW(parseNumber(text), UsageError) << text;
+    EXPECT_EQ(UINT32_MAX, parseNumber32("4294967295"));
+    EXPECT_THROW(parseNumber32("4294967296"), UsageError);
+}
+
+TEST(Numbers, OfBytesMayHaveAUnit) {
+    for (const auto& [text, size] : Numbers{{"8", 8},
+                                            {"3K", 3072},
+                                            {"0x10M", 16777216},
+                                            {"1G", 1073741824},
+                                            {"2T", 2199023255552},
+                                            {"1KiB", 1024},
+                                            {"1MiB", 1048576},
+                                            {"1GiB", 1073741824},
+                                            {"1TiB", 1099511627776},
+                                            {"16777215T", 18446742974197923840U}})
+        EXPECT_EQ(size, parseSize(text)) << text;
+    for (const char* text : {"K", "1KB", "1kib", "1KiBx", "1KK", "1E", "16777216T"})
+        EXPECT_THROW(parseSize(text), UsageError) << text;
+    EXPECT_EQ(4294966272U, parseSize32("4194303K"));
+    EXPECT_THROW(parseSize32("4194304K"), UsageError);
+}
+
+TEST(Numbers, OfARangeDoNotRunBackwards) {
+    for (const auto& [text, last] :
+         Numbers{{"5", 5}, {"5-5", 5}, {"5-0x10", 16}, {"5-18446744073709551615", UINT64_MAX}}) {
+        EXPECT_EQ(5U, parseRange(text).first) << text;
+        EXPECT_EQ(last, parseRange(text).last) << text;
+    }
+    for (const char* text : {"6-5", "5-", "-5", "1-2-3", "-", "0-18446744073709551616"})
+        EXPECT_THROW(parseRange(text), UsageError) << text;
+    EXPECT_EQ(UINT32_MAX, parseRange32("0-4294967295").last);
+    EXPECT_THROW(parseRange32("0-4294967296"), UsageError);
+}
+
+TEST(Runs, MergeNeighboursThatAreAlike) {
+    const MapEntry hole, entry(7, 1, true, false, false, false), next(8, 1, true, false, false, false);
+    EXPECT_EQ("0+2@7 2+1@8 ", runsOf({{entry, next, next}}));
+    EXPECT_EQ("0+3@0 ", runsOf({{hole, hole}, {}, {hole}}));
+    for (const MapEntry& other : {entry, hole, MapEntry(6, 1, true, false, false, false),
+                                  MapEntry(9, 1, true, false, false, false), MapEntry(8, 2, true, false, false, false),
+                                  MapEntry(8, 1, false, false, false, false), MapEntry(8, 1, true, true, false, false),
+                                  MapEntry(8, 1, true, false, true, false), MapEntry(8, 1, true, false, false, true)}) {
+        const std::string runs = "0+1@7 1+1@" + std::to_string(other.extentAddress) + " ";
+        EXPECT_EQ(runs, runsOf({{entry, other}})) << other.toString();
+        EXPECT_EQ(runs, runsOf({{entry}, {other}})) << other.toString() << "in another block";
+    }
+    const MapEntry hasPool(0, 5, false, false, false, false), synced(0, 0, false, false, false, true);
+    EXPECT_EQ("0+1@0 1+1@0 2+1@0 3+1@0 4+2@0 ", runsOf({{hole, hasPool, hasPool, synced, hole, hole}}));
+}
+
+TEST(Chart, ShadesACellByItsShareOfMappedEntries) {
+    MapChart chart(0, 6330, 40);  // 16 rows of 33 cells, of 12 entries each; the last cell has but 6
+    for (const unsigned int mapped : {0U, 1U, 3U, 4U, 7U, 8U, 11U, 12U}) {
+        chart.add(true, mapped);
+        chart.add(false, 12 - mapped);
+    }
+    chart.add(false, 6330 - 8 * 12 - 6);
+    chart.add(true, 6);
+    const std::string drawn = chart.draw(false);
+    EXPECT_EQ("   0 |.--++**#.........................|\n 396 |", drawn.substr(0, 47));
+    EXPECT_EQ("   0 |·░░▒▒▓▓█·", chart.draw(true).substr(0, 31));
+    EXPECT_EQ(
+        "\n5940 |................................#|\nOne cell: 12 entries\n"
+        "Mapped: . none  - <1/3  + <2/3  * most\n        # all\n",
+        drawn.substr(drawn.rfind("\n5940")));
+}
+
+TEST(Chart, StartsRowsWithAnIndexHoweverNarrow) {
+    MapChart wide(95, 10, 80), narrow(98, 3, 2);
+    wide.add(true, 10);
+    narrow.add(true, 3);
+    EXPECT_EQ(" 95 |##########|\nOne cell: 1 entry\n", wide.draw(false).substr(0, 35));
+    EXPECT_EQ(" 98 |#|\n 99 |#|\n100 |#|\nOne\n", narrow.draw(false).substr(0, 28));
+}
+
+TEST(SystemLog, GetsEveryLineButThoseAboutACopy) {
+    forwarded.clear();
+    syslog(3, "line %d", 1);
+    {
+        Session session;
+        session.setRoot(".");
+        syslog(3, "line %d", 2);
+    }
+    syslog(4, "line %d", 3);
+    EXPECT_EQ("3 line 1\n4 line 3\n", forwarded);
+}
+
+TEST(Progress, TellsHowFarAndHowLongAndIsGoneAtTheEnd) {
+    const auto work = [] {
+        Progress beside("entries", 400, Progress::Beside::listing), progress("entries", 400, Progress::Beside::nothing);
+        progress.show(1);
+        std::this_thread::sleep_for(std::chrono::milliseconds(1100));
+        beside.show(100);
+        for (const std::uint64_t done : {0U, 100U, 200U}) progress.show(done);
+    };
+    EXPECT_EQ(" 25%  100 of 400 entries, 3 s \r\033[K=0", Terminal(31, work).shown());
+}

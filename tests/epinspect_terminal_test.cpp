@@ -1,0 +1,72 @@
+// epinspect on a terminal: what it shows there, what it does not, and how wide.
+#include "ProgramTest.h"
+
+namespace {
+
+class OnTerminal : public ProgramTest {
+protected:
+    OnTerminal() {
+        std::string mapped;
+        for (std::uint64_t i = 0; i < 100; ++i) mapped += epbuilder::littleEndian(0x8000000000000000 + i, 8);
+        write("hundred", EPFileBuilder::map().bytes(24576, mapped).entry(99, 0));
+        write("endless", EPFileBuilder::map().resize(std::uint64_t{1} << 40U));
+        write("data", EPFileBuilder::data().resize(24576 + 8));
+    }
+
+    /// What a user of UTF-8 sees of it, with the status at the end.
+    std::string shown(const std::string& command, unsigned short columns = 80) const {
+        return Terminal(columns, script("export LC_ALL=C.UTF-8; " + command)).shown();
+    }
+};
+
+std::string full(unsigned int cells) { return cells == 0 ? "" : "█" + full(cells - 1); }
+
+}  // namespace
+
+TEST_F(OnTerminal, AChartIsAsWideAsTheTerminal) {
+    const std::string legend =
+        "One cell: 1 entry\nMapped: · none  ░ <1/3  ▒ <2/3  ▓ most  █ all\n100 entries in 2 runs: ";
+    EXPECT_EQ("  0 |" + full(34) + "|\n 34 |" + full(34) + "|\n 68 |" + full(31) + "·|\nOne cell: 1 entry\n" +
+                  "Mapped: · none  ░ <1/3  ▒ <2/3  ▓ most\n        █ all\n100 entries in 2 runs: 99 mapped, 0\n" +
+                  "unmapped, 1 hole; 0 vpushed, 0 vpulled,\n0 synced\n=0",
+              shown("epinspect map hundred --chart", 40));
+    EXPECT_EQ("  0 |" + full(74) + "|\n 74 |" + full(25) + "·|\n" + legend +
+                  "99 mapped, 0 unmapped, 1 hole; 0 vpushed, 0 vpulled, 0\nsynced\n=0",
+              shown("epinspect map hundred --chart"));
+    EXPECT_EQ(
+        "  0 |" + full(99) + "·|\n" + legend + "99 mapped, 0 unmapped, 1 hole; 0 vpushed, 0 vpulled, 0 synced\n=0",
+        shown("epinspect map hundred --chart", 200));
+}
+
+TEST_F(OnTerminal, NothingDisturbsOrDeceivesTheReader) {
+    const std::string name = "\"$(printf 'a\\033[1m\\n\\302\\205\u202e\u2066\u200b\ufeff\u00ad\\377ä')\"";
+    const std::string escaped = R"(a\x1b[1m\x0a\xc2\x85\xe2\x80\xae\xe2\x81\xa6\xe2\x80\x8b\xef\xbb\xbf\xc2\xad\xffä)";
+    EXPECT_EQ(says({escaped + missing}) + "=1", shown("epinspect dump " + name));
+    EXPECT_PRED2(matches, shown("cp data " + name + "; epinspect dump data " + name), "data:\n…" + escaped + ":\n…");
+    std::ofstream(path("luns.json")) << R"([{"lid": 7, "extentSize": 1, "size": 1, "restoreTime": 0, "type": 7,
+        "uuid": "u", "rootPath": "/v", "name": "\u001b"}])";
+    EXPECT_PRED2(matches, shown("export KELPISCSIEP_LUNS=luns.json; epinspect lun 7; epinspect path map 7"),
+                 "lid: 7 ,…name: \\x1b\n/v/@iSCSI/LUN/…\\x1b_00000\n/v/@iSCSI/LUN/…\\x1b_00000\n=0");
+}
+
+TEST_F(OnTerminal, BytesAreShownInHexadecimalOnly) {
+    EXPECT_EQ("0000000000000000\n=0", shown("epinspect extent data 0 --extent-size 8"));
+    EXPECT_EQ("epinspect: --raw: standard output is a terminal. Try 'epinspect extent --help'.\n=2",
+              shown("epinspect extent data 0 --extent-size 8 --raw"));
+}
+
+TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {
+    Terminal drawing(80, script("epinspect map endless --chart")), listing(80, script("epinspect map endless >list"));
+    EXPECT_PRED2(matches, drawing.shownUntil(" left"), "  0%  … of 137438950400 entries, … s left");
+    drawing.interrupt();
+    EXPECT_PRED2(matches, drawing.shown(), "  0%…\r\033[K=130");
+    listing.shownUntil(" left");
+    std::filesystem::resize_file(path("endless"), 24576);
+    EXPECT_PRED2(matches, listing.shown(),
+                 "  0%…\r\033[Kepinspect: endless: entry …: the file has become shorter while it was read (…)\n=1");
+}
+
+TEST_F(OnTerminal, ThereIsNoProgressBesideAListingNorInAFile) {
+    const std::string list = "timeout 2 epinspect map endless & ";
+    EXPECT_EQ("=0", shown(list + "timeout 2 epinspect map endless --chart 2>said; wait; cat said"));
+}
