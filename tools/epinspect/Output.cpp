@@ -80,6 +80,11 @@ void prepareStreams() {
 
 void print(std::string_view text) {
     static const bool terminal = outputIsTerminal();
+    if (text.size() >= bufferSize) {  // nothing is won by copying it
+        flushOutput();
+        if (outputError == 0) outputError = writeAll(STDOUT_FILENO, text.data(), text.size());
+        text = {};
+    }
     while (!text.empty()) {
         const auto part = text.substr(0, bufferSize - buffered);
         std::memcpy(buffer + buffered, part.data(), part.size());
@@ -127,6 +132,10 @@ std::string printable(std::string_view text) {
 }
 
 std::string forReader(std::string_view text) { return outputIsTerminal() ? printable(text) : std::string(text); }
+
+std::string counted(std::uint64_t count, const char* one, const char* several) {
+    return std::to_string(count) + " " + (count == 1 ? one : several);
+}
 
 std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap) {
     const auto columns = [](std::string_view piece) {  // every character of our own texts is one column wide

@@ -1,6 +1,7 @@
 // What epinspect says: data to standard output, messages to standard error.
 #pragma once
 
+#include <cstdint>
 #include <initializer_list>
 #include <string>
 #include <string_view>
@@ -40,6 +41,9 @@ std::string printable(std::string_view text);
 
 /// `text` as data: unchanged for a program that reads it, printable for a person.
 std::string forReader(std::string_view text);
+
+/// "1 entry", "2 entries".
+std::string counted(std::uint64_t count, const char* one, const char* several);
 
 /// `text` in lines of at most `width` columns, broken where it has `gap`; every line but the first starts with `indent`
 /// blanks, every line ends with a line feed. What is too long stays whole.

@@ -131,6 +131,13 @@ std::optional<std::string> Session::openablePath(const std::string& name) {
     return std::nullopt;
 }
 
+std::optional<std::string> Session::openableFolder(const std::string& path) {
+    std::string folder = hostPath(path);
+    if (!leadsOut(folder)) return folder;
+    fail({path, ""}, "cannot be opened: a link leads out of the folder of --root", tool::EP_ERR_OPEN_FAILED);
+    return std::nullopt;
+}
+
 bool Session::succeeded(int error, const Subject& subject) { return succeeded(error, subject, errno); }
 
 bool Session::succeeded(int error, const Subject& subject, int reason) {

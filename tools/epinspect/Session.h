@@ -39,6 +39,9 @@ public:
     /// returns nothing. What is missing is left to the library to find.
     std::optional<std::string> openablePath(const std::string& name);
 
+    /// The same for a folder at `path` of the target. Whether it can be listed is left to find.
+    std::optional<std::string> openableFolder(const std::string& path);
+
     /// Reports the failure of a call of the library, right after it (the system's reason is still in errno), when
     /// `error` is not 0. Returns whether it is 0.
     bool succeeded(int error, const Subject& subject);

@@ -19,11 +19,17 @@ int run(int argc, char** argv) {
 
     Command& program = line.program();
     program.group("Files of a store");
+    addList(program, session);
     addDump(program, session);
+    addCheck(program, session);
     program.group("Entries of a map");
     addMap(program, session);
     addEntry(program, session);
+    addDiff(program, session);
+    addFind(program, session);
     program.group("Bytes");
+    addLocate(program, session);
+    addRead(program, session);
     addExtent(program, session);
     program.group("Configuration and paths");
     addLun(program, session);

@@ -8,7 +8,7 @@
 #include "map/MapChart.h"
 #include "map/MapOutput.h"
 #include "map/RunWalk.h"
-#include "store/Doubts.h"
+#include "store/OpenMap.h"
 
 namespace epinspect {
 
@@ -22,10 +22,6 @@ struct MapOptions {
     std::uint64_t count = std::numeric_limits<std::uint64_t>::max();
     bool chart = false;
 };
-
-std::string counted(std::uint64_t count, const char* one, const char* several) {
-    return std::to_string(count) + " " + (count == 1 ? one : several);
-}
 
 std::string textOf(const MapSummary& summary) {
     return counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
@@ -49,19 +45,15 @@ void printSummary(Json& json, const MapSummary& summary) {
 }
 
 void run(const MapOptions& options, Session& session) {
-    const std::optional<std::string> path = session.openablePath(options.file);
-    if (!path) return;
-    tool::ISCSIEPFileMAP file(*path);
-    unsigned long long total = 0;
-    if (!session.succeeded(file.parseHead0(), {options.file, ""})) return;
-    if (!session.succeeded(file.getEntryCount(total), {options.file, ""})) return;
-    sayDataStartDoubts(file, options.file);
-    sayPartialEntry(file, options.file);
+    const OpenedMap map = openMap(session, options.file);
+    if (!map.file) return;
+    tool::ISCSIEPFileMAP& file = *map.file;
+    const std::uint64_t total = map.entries;
     if (options.first > 0 && options.first >= total) {
         session.failBeyondEnd(options.file, "entry " + std::to_string(options.first), total);
         return;
     }
-    const std::uint64_t count = std::min<std::uint64_t>(options.count, total - options.first);
+    const std::uint64_t count = std::min(options.count, total - options.first);
     MapChart chart(options.first, count, outputWidth());
     MapSummary summary;
     Json json(options.file);

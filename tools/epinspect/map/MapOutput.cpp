@@ -24,18 +24,22 @@ void writeRange(Text& text, std::uint64_t first, std::uint64_t count) {
     if (count > 1) text.add("-").decimal(first + count - 1);
 }
 
-void writeRun(Text& text, const MapRun& run) {
-    writeRange(text, run.first, run.count);
-    if (isHole(run.entry)) {
-        text.add(": hole\n");
+void writeEntries(Text& text, const MapEntry& entry, std::uint64_t count) {
+    if (isHole(entry)) {
+        text.add("hole");
         return;
     }
-    text.add(run.entry.mapped ? ": mapped" : ": unmapped");
-    if (run.entry.vpushed) text.add(" vpushed");
-    if (run.entry.vpulled) text.add(" vpulled");
-    if (run.entry.synced) text.add(" synced");
-    text.add(", pool ").decimal(run.entry.poolNumber).add(run.count == 1 ? ", extent " : ", extents ");
-    writeRange(text, run.entry.extentAddress, run.count);
+    text.add(entry.mapped ? "mapped" : "unmapped");
+    if (entry.vpushed) text.add(" vpushed");
+    if (entry.vpulled) text.add(" vpulled");
+    if (entry.synced) text.add(" synced");
+    text.add(", pool ").decimal(entry.poolNumber).add(count == 1 ? ", extent " : ", extents ");
+    writeRange(text, entry.extentAddress, count);
+}
+
+void writeRun(Text& text, const MapRun& run) {
+    writeRange(text, run.first, run.count);
+    writeEntries(text.add(": "), run.entry, run.count);
     text.add("\n");
 }
 

@@ -10,6 +10,9 @@ namespace epinspect {
 /// Appends "FIRST-LAST", or the one number when both are the same.
 void writeRange(Text& text, std::uint64_t first, std::uint64_t count);
 
+/// Appends what a run is whose first entry is `entry`: "hole", or flags, pool and extent addresses.
+void writeEntries(Text& text, const MapEntry& entry, std::uint64_t count);
+
 /// Appends the line of a run.
 void writeRun(Text& text, const MapRun& run);
 

@@ -21,6 +21,17 @@ inline bool isHole(const MapEntry& entry) {
     return entry.extentAddress == 0 && entry.poolNumber == 0 && flagsOf(entry) == 0;
 }
 
+/// Bits 0 to 59 as they are stored: extent address and pool number, wherever they are divided.
+inline std::uint64_t lowBitsOf(const MapEntry& entry) {
+    return std::uint64_t{entry.poolNumber} << 48U | entry.extentAddress;
+}
+
+/// Whether `next`, `count` entries behind the first entry of a run, continues it.
+inline bool continues(const MapEntry& first, std::uint64_t count, const MapEntry& next) {
+    return next.extentAddress == first.extentAddress + (isHole(first) ? 0 : count) &&
+           next.poolNumber == first.poolNumber && flagsOf(next) == flagsOf(first);
+}
+
 /// A run of entries: all holes, or the same flags and pool at extent addresses that follow one another.
 struct MapRun {
     std::uint64_t first = 0;

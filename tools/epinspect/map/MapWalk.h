@@ -35,7 +35,7 @@ struct WalkEnd {
 /// Calls visit(index, entries) for one block after the other of the entries of `range`, as far as the file goes.
 /// HEAD[0] must have been decoded.
 template <typename Visit>
-WalkEnd walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, Range range, Progress& progress, Visit&& visit) {
+WalkEnd walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, Range range, Visit&& visit) {
     constexpr std::uint64_t blockSize = 4096;
     std::vector<MapEntry> entries;
     std::uint64_t met = 0;
@@ -46,9 +46,17 @@ WalkEnd walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, Range range, Progress& progre
         if (!entries.empty()) visit(range.first + met, entries);
         met += entries.size();
         if (entries.size() < wanted || met - 1 == range.last - range.first) break;
-        progress.show(met);
     }
     return {0, 0, met};
+}
+
+/// The same, with a sign of life that counts entries.
+template <typename Visit>
+WalkEnd walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, Range range, Progress& progress, Visit&& visit) {
+    return walkMap(file, range, [&](std::uint64_t index, const auto& entries) {
+        visit(index, entries);
+        progress.show(index - range.first + entries.size());
+    });
 }
 
 }  // namespace epinspect

@@ -1,0 +1,161 @@
+// epinspect diff, find and check: what differs, who uses an extent, what does not fit together.
+#include "ProgramTest.h"
+
+namespace {
+
+namespace head0 = epbuilder::head0;
+namespace map = epbuilder::map;
+using epbuilder::dat::serialNumber, epbuilder::Field;
+using namespace std::string_literals;
+
+constexpr std::uint64_t m = 0x8000000000000000, synced = 0x1000000000000000, pool1 = 0x0001000000000000;
+
+/// A map of these entries, whose header fits them.
+EPFileBuilder mapOf(const std::vector<std::uint64_t>& entries, std::uint64_t dataStart = 24576) {
+    std::uint64_t mappedCount = 0, syncCount = 0;
+    std::string content;
+    for (const std::uint64_t entry : entries) {
+        content += epbuilder::littleEndian(entry, 8);
+        mappedCount += entry >> 63U;
+        syncCount += entry >> 60U & 1U;
+    }
+    EPFileBuilder file = EPFileBuilder::map().set(head0::dataStartOffset, dataStart).bytes(dataStart, content);
+    return file.set(map::totalCount, entries.size()).set(map::mappedCount, mappedCount).set(map::syncCount, syncCount);
+}
+
+class Check : public ProgramTest {
+protected:
+    Check() {
+        write("a", mapOf({m, m + 1, m + 2, m + 3, m + 4, m + 5, 0, 0, 7}));
+        write("b", mapOf({m, m + 9, m + 7, m + synced + 3, m + synced + 4, 0, 0, 6, 0, 0}, 32768));
+        write("none", mapOf({}));
+        write("pools", mapOf({m + pool1 + 4, m + pool1 + 5, 0, m + 5, m + 16 * pool1, 0, 5}));
+        write("x", mapOf({m + 10, m + 11, m + 12, m + 13, 0, m + 11, 12}));
+        write("y", mapOf({m + synced + 12, m + synced + 13, m + 14, m + 16 * pool1 + 10}));
+        write("other/x", mapOf({m + 10}));
+        std::vector<std::uint64_t> large(20000), moved(20000), scattered(20000);
+        for (std::size_t i = 0; i < 20000; ++i) {
+            large[i] = m + 4096 + i;
+            moved[i] = i / 200 == 20 ? m + i : large[i];
+            scattered[i] = i % 2 * (i + 10);
+        }
+        write("large", mapOf(large));
+        write("moved", mapOf(moved));
+        write("scattered", mapOf(scattered));
+        // Of extents of 1 MiB, 4194304 fill a data file. The first one lacks a byte, the second one holds two extents.
+        EPFileBuilder data = EPFileBuilder::data();
+        write("volume1/@iSCSI/EP/EP_DAT_00000", data.set(serialNumber, 0).resize(24575 + (std::uint64_t{1} << 42U)));
+        write("volume1/@iSCSI/EP/EP_DAT_00001", data.set(serialNumber, 1).resize(24576 + (2U << 20U)));
+        const std::uint64_t n = m + 0x400000;
+        write("volume1/@iSCSI/LUN/m", mapOf({n - 2, n - 1, n, n + 1, n + 2, m + 0x800000, m + 0x800000000000}));
+    }
+};
+
+const std::string shorter = "epinspect: s: entry …: the file has become shorter while it was read (EP_ERR_…)\n";
+
+// clang-format off
+const Case cases[] = {
+    {"diff tells runs of differences", "epinspect diff a b", 3,
+     "1-2: moved: mapped, pool 0, extents 1-2 -> mapped, pool 0, extent 9 ...\n"
+     "3-4: flags changed: mapped, pool 0, extents 3-4 -> mapped synced, pool 0, extents 3-4\n"
+     "5: only in the first: mapped, pool 0, extent 5\n7: only in the second: unmapped, pool 0, extent 6\n"
+     "8: only in the first: unmapped, pool 0, extent 7\n"
+     "10 entries: 3 same, 2 only in the first, 1 only in the second, 2 moved, 2 with other flags\n", ""},
+    {"diff writes both entries as JSON", "epinspect diff none y --json", 3, R"({"kind":"difference","file":"none","otherFile":"y","first":0,"count":4,"difference":"only-second","a":null,"b":{"extentAddress":12,"poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":true}}
+{"kind":"summary","file":"none","otherFile":"y","summary":true,"same":0,"onlyFirst":0,"onlySecond":4,"moved":0,"flags":0}
+)", ""},
+    {"diff takes a hole for nothing", "cp a b; truncate -s +24 b; epinspect diff a b && epinspect diff b a", 0,
+     "12 entries: no difference\n12 entries: no difference\n", ""},
+    {"diff joins what two blocks share", "epinspect diff large moved", 3,
+     "4000-4199: moved: mapped, pool 0, extents 8096-8295 -> mapped, pool 0, extents 4000-4199\n"
+     "20000 entries: 19800 same, 0 only in the first, 0 only in the second, 200 moved, 0 with other flags\n", ""},
+    {"find tells owners across LUNs", "epinspect --root store find --extent 63-64", 0,
+     "/volume1/@iSCSI/LUN/BLUN…lun1_00000: LUN 1: 63-64: mapped synced, pool 0, extents 63-64\n"
+     "/volume2/@iSCSI/LUN/THIN…lun2_00000: LUN 2: 47-48: mapped synced, pool 32, extents 63-64\n"
+     "4352 entries in 2 maps: 2 matches of 4 entries\n", ""},
+    {"find reads addresses both ways and passes over holes",
+     "epinspect find pools a --extent 0-5 --pool 0; epinspect find pools --extent 5 | head -n 1", 0,
+     "pools: 3: mapped, pool 0, extent 5\npools: 6: unmapped, pool 0, extent 5\n"
+     "a: 0-5: mapped, pool 0, extents 0-5\n16 entries in 2 maps: 3 matches of 8 entries\n"
+     "pools: 1: mapped, pool 1, extent 281474976710661 (extent 5 where bits 48 to 51 belong to the pool alone)\n", ""},
+    {"find writes matches as JSON", "epinspect find pools gone --json --pool 1 --extent 5-281474976710660", 1, R"({"kind":"match","file":"pools","first":0,"count":1,"entryOffset":24576,"extentAddress":281474976710660,"poolNumber":1,"mapped":true,"vpushed":false,"vpulled":false,"synced":false}
+{"kind":"match","file":"pools","first":1,"count":1,"entryOffset":24584,"extentAddress":281474976710661,"poolNumber":1,"mapped":true,"vpushed":false,"vpulled":false,"synced":false,"addressBits":48}
+{"kind":"error","file":"gone",…}
+{"kind":"summary","file":null,"summary":true,"files":1,"entries":7,"matches":2,"matchedEntries":2}
+)", "epinspect: gone: …\n"},
+    {"check is silent on a sound store", "epinspect check --root store", 0, "10 files, 4352 entries, 0 findings\n", ""},
+    {"check finds every fault once", "epsample --broken broken; epinspect check --root broken >all; status=$?;"
+     R"(sed -nE 's,^.*/(THIN.{36})?([^/:]*): ([a-z-]*): .*,\3 in \2,p; /^[0-9]/p' all | paste -sd,; exit $status)", 3,
+     "kind in EP_FRI,data-start in EP_DAT_00000,serial-number in EP_DAT_00001,total-count in total-count_00000,"
+     "mapped-count in mapped-count_00000,sync-count in sync-count_00000,pool-count in pool-count_00000,"
+     "partial-entry in partial-entry_00000,unmapped-bits in unmapped-bits_00000,address-bits in address-bits_00000,"
+     "missing-data-file in missing-data-file_00000,beyond-data-file in beyond-data-file_00000,"
+     "lun-size in lun-size_00000,missing-map in missing-map_00000,magic in EP_TBL,version in EP_JNL,"
+     "extent-size in EP_TBL,shared-extents in shared-extents_00000,23 files, 191 entries, 18 findings\n", ""},
+    {"check finds extents that are shared", "epinspect check y x ./x other/x large", 3,
+     "x: unmapped-bits: entry 6: unmapped, but holds 0xc\n"
+     "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
+     "y: shared-extents: entries 0-1: pool 0, extents 12-13, used by entries 2-3 of x too\n"
+     "4 files, 20012 entries, 3 findings\nNot compared: …the extent size is not known, --extent-size tells it: …shared-extents: maps in different folders whose paths name no volume\n", ""},
+    {"check looks into data files", "epinspect check --root . --extent-size 1M", 3,
+     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, behind the end of EP_DAT_00000, which holds 4194303 extents\n"
+     "/volume1/@iSCSI/LUN/m: missing-data-file: entries 5-6: extent 8388608 in the first, for which there is no EP_DAT_00002\n"
+     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, behind the end of EP_DAT_00001, which holds 2 extents\n"
+     "3 files, 7 entries, 3 findings\nNot compared: lun-size, extent-size, missing-map: no LUN is configured with an id from 0 to 255\n", ""},
+    {"check writes findings as JSON", "epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
+)", ""},
+    {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,; s/lun1/new/' var/db/iscsi/luns.json;"
+     "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,
+     "/volume1/@iSCSI/LUN/BLUN…new_00000: missing-map: LUN 1 is configured, but has no map file\n"
+     "/share/@iSCSI/LUN/THIN…lun2_00000: missing-map: LUN 2 is configured, but has no map file\n"
+     "8 files, 4352 entries, 2 findings\nNot compared: beyond-data-file: a data file cannot be read: /volume2/…\n"
+     "Not compared: extent-size: no table file that could be read: /volume1/@iSCSI/EP/EP_TBL\n"
+     "Not compared: extent-size: the path of the LUN's map file names no volume: /share/…\n"
+     "Not compared: lun-size, extent-size: no LUN is configured for this map: /volume1/… and 1 more\n"
+     "Not compared: what the file holds: it is missing: /volume1/@iSCSI/EP/EP_TBL\n",
+     "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)\n"},
+    {"diff and find and check say that a map became shorter",
+     "for what in 'diff s none' 'find s --pool 0' 'check s'; do cp scattered s; { epinspect $what; echo $?; } |"
+     " { read first; truncate -s 90000 s; tail -n 1; }; done", 0, "1\n1\n1\n", shorter + shorter + shorter},
+    {"diff and find and check name what is wrong",
+     "epinspect diff gone other; epinspect diff a; epinspect find a; epinspect check --extent-size 0", 2, "",
+     "epinspect: gone: cannot be opened: No such…epinspect: other: cannot be opened: neither a regular file…"
+     "epinspect: MAPFILE is missing. Try 'epinspect diff --help'.\n"
+     "epinspect: --extent or --pool is missing. Try…epinspect: --extent-size: '0': no extent has 0 bytes. Try 'epinspect check --help'.\n"},
+};
+
+// clang-format on
+
+}  // namespace
+
+TEST_P(Check, Promises) { expect(GetParam()); }
+INSTANTIATE_TEST_SUITE_P(, Check, testing::ValuesIn(cases), nameOf);
+
+TEST_F(ProgramTest, CheckReportsEveryFieldThatDoesNotFit) {
+    const std::string lun1 = "/volume1/@iSCSI/LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11lun1_00000";
+    const std::string table = "/volume1/@iSCSI/EP/EP_TBL", data = "/volume1/@iSCSI/EP/EP_DAT_00001";
+    const auto expectFinding = [&](const char* rule, const std::string& name, Field field, std::uint64_t bad) {
+        std::fstream file(path("own" + name), std::ios::binary | std::ios::in | std::ios::out);
+        const auto place = std::streamoff(field.offset);
+        std::string before(field.width, '\0');
+        file.seekg(place).read(before.data(), field.width);
+        file.seekp(place) << epbuilder::littleEndian(bad, field.width) << std::flush;
+        expect({"", "epinspect check --root own", 3, "…" + name + ": " + rule + ": …", ""});
+        file.seekp(place) << before << std::flush;
+    };
+    expect({"", "epsample own", 0, "", ""});
+    for (const std::string& file : {lun1, table, data, "/volume2/@iSCSI/EP/EP_FRI"s, "/var/db/iscsi/EP_JNL"s}) {
+        expectFinding("kind", file, head0::type, file == data ? 4U : 3U);
+        expectFinding("magic", file, head0::magicCode, 0x1122334455667789);
+        expectFinding("version", file, head0::version, 0);
+        expectFinding("data-start", file, head0::dataStartOffset, 24575);
+        expectFinding("data-start", file, head0::dataStartOffset, 0xffffffffffffffff);
+    }
+    expectFinding("total-count", lun1, map::totalCount, 4095);
+    expectFinding("lun-size", lun1, map::totalCount, 0x100000001000);
+    expectFinding("mapped-count", lun1, map::mappedCount, 2255);
+    expectFinding("sync-count", lun1, map::syncCount, 0);
+    expectFinding("pool-count", lun1, map::seg0PoolCount, 1025);
+    expectFinding("serial-number", data, serialNumber, 0);
+    expectFinding("extent-size", table, epbuilder::tbl::extentSize, 1);
+}

@@ -1,0 +1,31 @@
+// epinspect check: what files say of themselves and of each other, compared.
+#include <memory>
+
+#include "check/StoreCheck.h"
+#include "commands/Commands.h"
+
+namespace epinspect {
+
+namespace {
+
+std::uint32_t parseExtentSize(const std::string& text) {
+    const std::uint32_t size = parseSize32(text);
+    if (size == 0) throw UsageError{"no extent has 0 bytes"};
+    return size;
+}
+
+}  // namespace
+
+void addCheck(Command& parent, Session& session) {
+    const auto options = std::make_shared<CheckOptions>();
+    parent.add("check", "Compare what files say of themselves and of each other")
+        .arguments("FILE", "EP files (default: all of the store)", options->files, Command::Need::severalOrNone)
+        .option("--luns", "FIRST-LAST", "LUN ids to look for (default: 0-255)", options->lids, parseRange32)
+        .option("--extent-size", "SIZE",
+                "Bytes of an extent, for maps whose LUN is not known; K, M, G or KiB, MiB, GiB may follow",
+                options->extentSize, parseExtentSize)
+        .flag("--json", "One JSON object a finding, then one that sums up", session.json)
+        .action([options, &session] { StoreCheck(session, *options).run(); });
+}
+
+}  // namespace epinspect

@@ -1,0 +1,125 @@
+// epinspect find: which map entries point at given extents or at a pool.
+#include <memory>
+
+#include "Json.h"
+#include "Output.h"
+#include "commands/Commands.h"
+#include "map/MapOutput.h"
+#include "map/RunWalk.h"
+#include "store/ChosenFiles.h"
+#include "store/OpenMap.h"
+#include "store/RunSearch.h"
+
+namespace epinspect {
+
+namespace {
+
+struct FindOptions {
+    std::vector<std::string> files;
+    RunSearch search;
+};
+
+struct FindSummary {
+    std::uint64_t files = 0, entries = 0, matches = 0, matchedEntries = 0;
+};
+
+/// The map that is searched, and how its matches are written.
+struct SearchedMap {
+    const std::string& name;
+    const Lun* lun;
+    const ISCSI::TOOL::ISCSIEPFileMAP& file;
+    Json json;
+    Text line;
+};
+
+void printMatch(SearchedMap& map, const RunMatch& match) {
+    Text& line = map.line;
+    line.clear();
+    line.add(forReader(map.name), ": ");
+    if (map.lun != nullptr) line.add("LUN ").decimal(map.lun->record.lid).add(": ");
+    writeRange(line, match.run.first, match.run.count);
+    writeEntries(line.add(": "), match.run.entry, match.run.count);
+    if (match.lowAddress) {
+        line.add(match.run.count == 1 ? " (extent " : " (extents ");
+        writeRange(line, *match.lowAddress, match.run.count);
+        line.add(" where bits 48 to 51 belong to the pool alone)");
+    }
+    print(line.add("\n").view());
+}
+
+void printMatchAsJson(SearchedMap& map, const RunMatch& match) {
+    Json& json = map.json;
+    writeRun(json.begin("match"), match.run, entryOffset(map.file, match.run.first));
+    if (map.lun != nullptr) json.number("lid", map.lun->record.lid);
+    if (match.lowAddress) json.number("addressBits", 48);
+    json.end();
+}
+
+void searchMap(const FindOptions& options, Session& session, const StoreFile& file, FindSummary& summary) {
+    const OpenedMap map = openMap(session, file.path);
+    if (!map.file) return;
+    ++summary.files;
+    SearchedMap searched = {file.path, file.lun, *map.file, Json(file.path), Text()};
+    const auto each = [&](const MapRun& run) {
+        summary.entries += run.count;
+        options.search.in(run, [&](const RunMatch& match) {
+            ++summary.matches;
+            summary.matchedEntries += match.run.count;
+            if (session.json) {
+                printMatchAsJson(searched, match);
+            } else {
+                printMatch(searched, match);
+            }
+        });
+    };
+    if (map.entries == 0) return;
+    walkRuns(session, file.path, *map.file, {0, map.entries - 1}, Progress::Beside::listing, each);
+}
+
+void printSummary(const FindSummary& summary) {
+    print(counted(summary.entries, "entry", "entries") + " in " + counted(summary.files, "map", "maps") + ": " +
+          counted(summary.matches, "match", "matches") + " of " + counted(summary.matchedEntries, "entry", "entries") +
+          "\n");
+}
+
+void printSummaryAsJson(const FindSummary& summary) {
+    Json json("");
+    json.begin("summary")
+        .boolean("summary", true)
+        .number("files", summary.files)
+        .number("entries", summary.entries)
+        .number("matches", summary.matches)
+        .number("matchedEntries", summary.matchedEntries)
+        .end();
+}
+
+void run(const FindOptions& options, Session& session) {
+    if (!options.search.extents && !options.search.pool) throw UsageError{"--extent or --pool is missing"};
+    FindSummary summary;
+    ChosenFiles(session, options.files, {0, 255}).forEach([&](const StoreFile& file) {
+        const bool isMap = file.kind != nullptr && file.kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
+        if (options.files.empty() && (!isMap || file.missing)) return;
+        searchMap(options, session, file, summary);
+    });
+    if (session.json) {
+        printSummaryAsJson(summary);
+    } else {
+        printSummary(summary);
+    }
+}
+
+}  // namespace
+
+void addFind(Command& parent, Session& session) {
+    const auto options = std::make_shared<FindOptions>();
+    parent.add("find", "Show which map entries point at given extents or at a pool")
+        .arguments("MAPFILE", "Map files to search (default: all of the store)", options->files,
+                   Command::Need::severalOrNone)
+        .option("--extent", "N", "Extent address; FIRST-LAST for all from FIRST to LAST", options->search.extents,
+                parseRange)
+        .option("--pool", "N", "Pool number; with --extent, both must fit", options->search.pool, parseNumber32)
+        .flag("--json", "One JSON object a match, then one that sums up", session.json)
+        .action([options, &session] { run(*options, session); });
+}
+
+}  // namespace epinspect

@@ -1,0 +1,105 @@
+// epinspect list: what lies in the store.
+#include <ISCSIEPFileMAP.h>
+
+#include <algorithm>
+#include <memory>
+
+#include "Json.h"
+#include "Output.h"
+#include "commands/Commands.h"
+#include "store/Doubts.h"
+#include "store/Store.h"
+
+namespace epinspect {
+
+namespace tool = ISCSI::TOOL;
+
+namespace {
+
+constexpr Range usualLids = {0, 255};
+
+/// How many entries the map file `file` holds; nothing when there are none to be counted, which is said.
+std::optional<std::uint64_t> entriesOf(Session& session, const StoreFile& file) {
+    if (file.missing || file.kind->type != tool::EP_FILE_TYPE_MAP) return std::nullopt;
+    tool::ISCSIEPFileMAP map(file.hostPath);
+    if (!session.succeeded(map.parseHead0(), {file.path, ""})) return std::nullopt;
+    sayKindDoubts(map, file.path, file.kind);
+    if (map.head0Type != tool::EP_FILE_TYPE_MAP) return std::nullopt;
+    sayDataStartDoubts(map, file.path);
+    sayPartialEntry(map, file.path);
+    unsigned long long entries = 0;
+    if (!session.succeeded(map.getEntryCount(entries), {file.path, ""})) return std::nullopt;
+    return entries;
+}
+
+/// What is known of a file, its path last: one line where it fits.
+void printFile(const StoreFile& file, const std::optional<std::uint64_t>& entries) {
+    constexpr std::size_t sizeColumns = 14;
+    constexpr unsigned int indent = 6;
+    const std::string size = file.missing ? "missing" : std::to_string(file.size);
+    std::string text = file.kind->name + std::string(sizeColumns - std::min(sizeColumns - 1, size.size()), ' ') + size;
+    if (file.lun != nullptr) text += "  LUN " + std::to_string(file.lun->record.lid);
+    if (entries) text += "  " + std::to_string(*entries) + (entries == 1U ? " entry" : " entries");
+    if (file.mapName) text += "  " + file.mapName->typeName + " " + file.mapName->uuid;
+    if (file.mapName && !file.mapName->name.empty()) text += " " + file.mapName->name;
+    print(wrapped(forReader(text + "  " + file.path), outputWidth(), indent, "  "));
+}
+
+void writeFile(const StoreFile& file, const std::optional<std::uint64_t>& entries) {
+    Json json(file.path);
+    json.begin("file").text("fileKind", file.kind->name);
+    if (file.missing) {
+        json.null("size");
+    } else {
+        json.number("size", file.size);
+    }
+    json.boolean("missing", file.missing);
+    if (entries) json.number("entries", *entries);
+    if (file.mapName) {
+        json.text("typeName", file.mapName->typeName).text("uuid", file.mapName->uuid).text("name", file.mapName->name);
+    }
+    if (file.lun != nullptr) json.number("lid", file.lun->record.lid);
+    json.end();
+}
+
+/// Says why no LUN of `lids` is known: a failure when the user asked for these.
+void sayNoLuns(Session& session, Range lids, bool askedFor) {
+    const QuietLog quiet;
+    Lun lun;
+    const int error = loadLun(session, static_cast<std::uint32_t>(lids.first), lun);
+    if (askedFor) {
+        session.succeeded(error, subjectOf(lids));
+    } else {
+        complain(subjectOf(lids).part + ": none is known: " + platformText(error) + " (code " + std::to_string(error) +
+                 ")");
+    }
+}
+
+void run(Session& session, const std::optional<Range>& lids) {
+    Store store(session, lids.value_or(usualLids));
+    if (!store.lunsMet()) sayNoLuns(session, lids.value_or(usualLids), lids.has_value());
+    bool any = false;
+    store.forEachFile([&](const StoreFile& file) {
+        any = true;
+        const auto entries = entriesOf(session, file);
+        if (session.json) {
+            writeFile(file, entries);
+        } else {
+            printFile(file, entries);
+        }
+    });
+    if (!any) session.fail({"/", ""}, "no EP files there", tool::EP_ERR_NO_PATH);
+}
+
+}  // namespace
+
+void addList(Command& parent, Session& session) {
+    const auto lids = std::make_shared<std::optional<Range>>();
+    parent.add("list", "Show what lies in the store, and what LUNs lack there")
+        .option("--luns", "FIRST-LAST", "LUN ids to look for in the configuration (default: 0-255)", *lids,
+                parseRange32)
+        .flag("--json", "One JSON object a file", session.json)
+        .action([lids, &session] { run(session, *lids); });
+}
+
+}  // namespace epinspect

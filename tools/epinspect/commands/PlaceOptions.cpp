@@ -1,0 +1,45 @@
+#include "commands/PlaceOptions.h"
+
+#include "Numbers.h"
+
+namespace epinspect {
+
+namespace {
+
+AddressBits parseAddressBits(const std::string& text) {
+    const std::uint64_t bits = parseNumber(text);
+    if (bits == 48) return AddressBits::bits48;
+    if (bits == 52) return AddressBits::bits52;
+    throw UsageError{"not 48 or 52"};
+}
+
+CountFrom parseCountFrom(const std::string& text) {
+    if (text == "file") return CountFrom::file;
+    if (text == "volume") return CountFrom::volume;
+    throw UsageError{"not file or volume"};
+}
+
+}  // namespace
+
+void addLunArgument(Command& command, PlaceOptions& options) {
+    command.argument("LUN", "LUN id, or the path of a map file (then --extent-size is needed)", options.lun,
+                     parseLunName);
+}
+
+void addPlaceOptions(Command& command, PlaceOptions& options) {
+    command
+        .option("--extent-size", "SIZE",
+                "Bytes of an extent (default: as configured); K, M, G or KiB, MiB, GiB may "
+                "follow",
+                options.extentSize, parseSize32)
+        .option("--address-bits", "48|52",
+                "How many bits of an entry are its extent address; matters where bits 48 to "
+                "51 are set",
+                options.choice.addressBits, parseAddressBits)
+        .option("--count-from", "file|volume",
+                "From where extents are counted: within the data file, or from the "
+                "volume's start",
+                options.choice.countFrom, parseCountFrom);
+}
+
+}  // namespace epinspect

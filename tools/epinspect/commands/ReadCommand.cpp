@@ -1,0 +1,48 @@
+// epinspect read: the bytes of a LUN.
+#include <algorithm>
+#include <memory>
+
+#include "Numbers.h"
+#include "Output.h"
+#include "commands/Commands.h"
+#include "commands/PlaceOptions.h"
+#include "store/LunMap.h"
+#include "store/LunReader.h"
+
+namespace epinspect {
+
+namespace {
+
+struct ReadOptions {
+    PlaceOptions place;
+    std::uint64_t offset = 0;
+    std::optional<std::uint64_t> length;
+};
+
+void run(const ReadOptions& options, Session& session) {
+    if (outputIsTerminal()) throw UsageError{"standard output is a terminal, not a file or a pipe"};
+    const std::optional<LunMap> lun = openLunMap(session, options.place.lun, options.place.extentSize);
+    if (!lun) return;
+    const std::uint64_t there = lun->size - std::min(lun->size, options.offset);
+    if (there == 0 && (options.offset > 0 || options.length > 0U)) {
+        return lun->failBeyondEnd(session, "byte " + std::to_string(options.offset));
+    }
+    if (options.length > there) return lun->failBeyondEnd(session, "byte " + std::to_string(lun->size));
+    LunReader(session, *lun, options.place.choice, options.offset, options.length.value_or(there)).print();
+}
+
+}  // namespace
+
+void addRead(Command& parent, Session& session) {
+    const auto options = std::make_shared<ReadOptions>();
+    Command& command = parent.add("read", "Write the bytes of a LUN; where they cannot be read, zeros");
+    addLunArgument(command, options->place);
+    command
+        .option("--offset", "SIZE", "Byte to start at (default: 0); K, M, G, T or KiB, MiB, GiB, TiB may follow",
+                options->offset, parseSize)
+        .option("--length", "SIZE", "Bytes to write (default: all to the end of the LUN)", options->length, parseSize);
+    addPlaceOptions(command, options->place);
+    command.action([options, &session] { run(*options, session); });
+}
+
+}  // namespace epinspect

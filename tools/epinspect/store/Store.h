@@ -1,0 +1,84 @@
+// The files that make up a store: what lies where, and what should lie there.
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <optional>
+#include <set>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <utility>
+#include <vector>
+
+#include "Numbers.h"
+#include "Session.h"
+#include "store/FileKind.h"
+#include "store/Luns.h"
+
+namespace epinspect {
+
+/// The path of the target as the folders lead there: absolute, without doubled slashes and dots.
+std::string plainPath(const std::string& path);
+
+/// What the name of a LUN's map file is made of.
+struct MapName {
+    std::string typeName;
+    std::string uuid;
+    std::string name;
+};
+
+/// The parts of the map file name `fileName` (without folders), nothing where they cannot be told apart: that takes a
+/// UUID of 36 characters and the usual end.
+std::optional<MapName> mapNameIn(std::string_view fileName);
+
+/// The volume on which a file at `path` of the target lies, 0 when the path names none.
+std::uint32_t volumeOf(const std::string& path);
+
+/// A file of the store.
+struct StoreFile {
+    const FileKind* kind = nullptr;  ///< what its name tells; never null
+    std::string path;                ///< on the target
+    std::string hostPath;            ///< where it is to be opened here
+    std::uint64_t size = 0;
+    bool missing = false;            ///< nothing is there, though a LUN should have it or a link leads there
+    std::uint32_t volume = 0;        ///< 0: on no volume
+    const Lun* lun = nullptr;        ///< of a map file, where the configuration knows the LUN
+    std::optional<MapName> mapName;  ///< of a map file, where the parts of its name are known
+};
+
+/// The store below the root folder.
+class Store {
+public:
+    /// Loads the LUNs whose ids are in `lids`; failures other than unused ids are reported.
+    Store(Session& session, Range lids);
+
+    /// The LUNs found, lowest id first; none at all where there is no configuration.
+    const std::vector<Lun>& luns() const { return luns_; }
+
+    /// Whether any LUN was found, or a failure to load one.
+    bool lunsMet() const { return lunsMet_; }
+
+    /// Calls each() for the files, whose bytes are not read: journal, then volume by volume table, free-index, data and
+    /// map files, then map files on no volume. Those that a configured LUN should have (its map file, the table and
+    /// free-index file of its volume, the journal) are among them when they are missing. What may not be opened or
+    /// cannot be looked at is reported and left out.
+    void forEachFile(const std::function<void(const StoreFile&)>& each);
+
+private:
+    /// Folders that may hold files of the store, in the order of forEachFile(): by volume, the journal's first.
+    using Place = std::pair<std::uint64_t, std::string>;
+
+    void expect(const std::string& path);
+    std::vector<std::string> namesIn(const std::string& folder, std::set<std::string> names);
+    std::optional<StoreFile> fileAt(const std::string& path);
+
+    Session& session_;
+    std::vector<Lun> luns_;
+    bool lunsMet_ = false;
+    std::unordered_map<std::string, const Lun*> lunsByMap_;  ///< by the paths of their map files
+    std::map<Place, std::set<std::string>> folders_;         ///< with the names of what should lie there
+};
+
+}  // namespace epinspect
