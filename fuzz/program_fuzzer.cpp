@@ -75,9 +75,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
         std::ofstream(store.root + "/" + names[i], std::ios::binary | std::ios::trunc) << contents[i];
     }
     const std::string one = "/" + names[0], other = "/" + names[1], root = "--root=" + store.root;
-    run({"epinspect", root, "check", "--extent-size", sizeOfExtents});
-    run({"epinspect", root, "check", "--json", one, other});
-    run({"epinspect", root, "list", "--json"});
+    run({"epinspect", root, "check", "--luns", "1-2", "--extent-size", sizeOfExtents});
+    run({"epinspect", root, "check", "--luns", "1", "--json", one, other});
+    run({"epinspect", root, "list", "--luns", "1-2", "--json"});
     run({"epinspect", root, "diff", one, other});
     run({"epinspect", root, "find", "--extent", small + "-" + bits});
     run({"epinspect", root, "map", one, "--first", small, "--chart"});
