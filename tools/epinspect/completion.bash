@@ -11,7 +11,7 @@ _epinspect_files() {
 
 _epinspect() {
     local word before command='' kind='' root='' files='' piece replaced pieces=() typed=() index
-    local commands='dump map entry extent lun path help' kinds='tbl fri jnl map dat'
+    local commands='dump check map entry diff find extent lun path help' kinds='tbl fri jnl map dat'
     local common='--root --verbose --help'
     COMPREPLY=()
     # The words as the shell will see them: bash breaks them at "=" and "@".
@@ -29,7 +29,7 @@ _epinspect() {
     for ((index = 1; index < ${#typed[@]} - 1; index++)); do
         case ${typed[index]} in
             --root) root=${typed[++index]} ;;
-            --as | --first | --count | --extent-size | --extent-address) ((++index)) ;;
+            --as | --first | --count | --luns | --extent | --pool | --extent-size | --extent-address) ((++index)) ;;
             -*) ;;
             *)
                 if [[ -z $command ]]; then
@@ -46,7 +46,9 @@ _epinspect() {
         '') options="$commands $common --version" ;;
         help) options=$commands ;;
         dump) options+=' --as --json' ;;
-        entry | lun) options+=' --json' ;;
+        check) options+=' --luns --extent-size --json' ;;
+        entry | diff | lun) options+=' --json' ;;
+        find) options+=' --extent --pool --json' ;;
         map) options+=' --first --count --chart --json' ;;
         extent) options+=' --extent-size --raw' ;;
         path)
@@ -57,7 +59,7 @@ _epinspect() {
     case $before in
         --as) options='tbl map dat fri jnl head' ;;
         --root) files=-d ;;
-        --first | --count | --extent-size | --extent-address) return ;;
+        --first | --count | --luns | --extent | --pool | --extent-size | --extent-address) return ;;
         *) [[ $word == -* || -z $command || $command$kind =~ ^(help|lun|path|pathmap)$ ]] || files=-f ;;
     esac
     if [[ -z $files ]]; then
