@@ -19,6 +19,9 @@ say "A sample store; --root makes it stand for / of the target"
 show epsample "$store"
 inspect() { printf '$ epinspect --root STORE %s\n' "$*"; epinspect --root "$store" "$@"; }
 
+say "What lies in the store"
+inspect list
+
 say "The files of the machine and of volume 1, one kind each"
 inspect dump /var/db/iscsi/EP_JNL /volume1/@iSCSI/EP/EP_TBL /volume1/@iSCSI/EP/EP_FRI /volume1/@iSCSI/EP/EP_DAT_00000
 
@@ -38,9 +41,17 @@ inspect map "$map" --count 896
 say "The whole map as a picture"
 inspect map "$map" --chart
 
-say "Where the extent of entry 512 lies"
-address=$(epinspect --root "$store" entry --json "$map" 512 | jq .extentAddress)
-inspect path dat "$map" --extent-size 1M --extent-address "$address"
+say "Where byte 540000000 of LUN 1 lies, and what its extent starts with"
+inspect locate 1 540000000
+inspect read 1 --offset 514M --length 64 | cat
+
+say "Who uses an extent"
+inspect find --extent 4194816-4194818
+
+say "What does not fit together: nothing here, one thing of each kind in a store that is broken on purpose"
+inspect check
+epsample --broken "$store/broken"
+epinspect --root "$store/broken" check || [ $? -eq 3 ]
 
 say "The start of an extent beyond 4 GiB, in hexadecimal and as it is"
 inspect extent /volume1/@iSCSI/EP/EP_DAT_00000 5200 --extent-size 1M | cut -c 1-100

@@ -17,6 +17,6 @@ as_root() {
 
 # shellcheck disable=SC2034
 {
-  build_packages=(g++ cmake make nlohmann-json3-dev libcli11-dev libgtest-dev libbenchmark-dev)
+  build_packages=(g++ cmake make nlohmann-json3-dev libgtest-dev libbenchmark-dev)
   test_packages=("${build_packages[@]}" pkg-config strace)
 }

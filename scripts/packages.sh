@@ -4,7 +4,7 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 . scripts/need.sh
-need "${build_packages[@]}" dpkg-dev debhelper git
+need "${build_packages[@]}" dpkg-dev debhelper
 
 own=$(dpkg --print-architecture)
 architecture=${1:-$own} folder=${2:-build/packages/${1:-$own}}
@@ -13,7 +13,7 @@ architecture=${1:-$own} folder=${2:-build/packages/${1:-$own}}
 # Built in a copy, so that nothing is left among the sources.
 rm -rf "$folder"
 mkdir -p "$folder/source"
-git ls-files -z --cached --others --exclude-standard | tar -c --null -T - | tar -x -C "$folder/source"
+tar -c --exclude=./.git --exclude=./build --exclude='./build-*' . | tar -x -C "$folder/source"
 cd "$folder/source"
 DEB_BUILD_OPTIONS="nocheck noautodbgsym terse parallel=$(nproc)" dpkg-buildpackage \
   --host-arch "$architecture" --build=binary --unsigned-changes --no-check-builddeps --build-profiles=nocheck

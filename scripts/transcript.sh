@@ -1,5 +1,6 @@
 #!/usr/bin/env bash
-# Runs what the console blocks of documents show and compares: scripts/transcript.sh DOCUMENT...
+# Runs what the console blocks of documents show and compares: scripts/transcript.sh [--renew] DOCUMENT...
+# With --renew the documents show from then on what is really printed.
 # A block is run when its fence reads ```console. Behind "$ " stands a command, behind "> " each further line of it, and
 # then follows what it prints. All commands of a document run in one shell, in a new folder, with the time zone UTC.
 set -euo pipefail
@@ -7,7 +8,7 @@ export TZ=UTC LC_ALL=C.UTF-8
 scratch=$(mktemp -d)
 trap 'rm -rf "$scratch"' EXIT
 
-# Runs the commands of $1, the lines of all blocks, and prints the blocks as they should have read.
+# Runs the commands of $1, the lines of all blocks, and prints the blocks as they should have read; ``` ends each.
 replay() (
   set +euo pipefail
   shopt -s expand_aliases
@@ -28,17 +29,31 @@ replay() (
         printf '%s\n' "$line" >&4
         command+=${command:+$'\n'}${line:2}
         ;;
+      '```')
+        [ -z "$command" ] || run
+        echo '```' >&4
+        ;;
     esac
   done 3<<<"$1"
-  [ -z "$command" ] || run
 ) 4>&1
 
+renew=
+[ "${1:-}" != --renew ] || { renew=yes && shift; }
 differing=0
 for document in "$@"; do
-  shown=$(awk '/^```/ { console = $0 == "```console"; next } console' "$document")
+  shown=$(awk 'console; /^```/ { console = $0 == "```console" }' "$document")
   [ -n "$shown" ] || { echo "$document: no console block" >&2; exit 1; }
   rm -rf "$scratch/folder"
   replay "$shown" >"$scratch/real"
+  if [ "$renew" ]; then
+    awk -v real="$scratch/real" '
+      /^```$/ { console = 0 }
+      !console
+      /^```console$/ { console = 1; while ((getline line < real) > 0 && line != "```") print line }
+    ' "$document" >"$scratch/renewed"
+    cp "$scratch/renewed" "$document"
+    continue
+  fi
   diff -u --label "$document" --label "really printed" - "$scratch/real" <<<"$shown" || differing=1
   echo "$document: $(grep -c '^\$ ' <<<"$shown") commands compared"
 done

@@ -84,7 +84,7 @@ const Case cases[] = {
      says({"EP_FRI: named like a free-index file, but its type in HEAD[0] is 4, a map file",
            "early: data start offset 0x5fff lies inside the header block",
            "late: data start offset 0x6001 lies behind the end of the file",
-           "part: ends inside an entry, of which 5 bytes are there"})},
+           "part: ends inside an entry, 5 of its 8 bytes are there"})},
     {"goes on after a failure and keeps the order", "epinspect dump EP_TBL gone EP_DAT_7 2>&1", 1,
      "EP_TBL:\n" + text(1, tableDump) + says({"gone" + missing}) + "EP_DAT_7:\n" + text(3, dataDump), ""},
     {"says why a file cannot be read", "mkfifo f; ln -s l l; truncate -s 24575 EP_TBL; "

@@ -81,8 +81,8 @@ const Case cases[] = {
      1, "{\"kind\":\"dat\",…\n{\"kind\":\"dat\",…\n{\"kind\":\"error\",…{\"kind\":\"error\",…{\"kind\":\"error\",…\n",
      says({"out" + leadsOut, "in" + leadsOut, "beside" + leadsOut})},
 
-    usage("", "a subcommand is missing, one of dump, …", ""),
-    usage("mapp x", "unknown subcommand 'mapp', not one of dump, …", ""),
+    usage("", "a subcommand is missing, one of list, …", ""),
+    usage("mapp x", "unknown subcommand 'mapp', not one of list, …", ""),
     usage("path foo", "unknown subcommand 'foo', not one of tbl, fri, jnl, map, dat", " path"),
     usage("map x --fisrt 3", "unknown option '--fisrt'", " map"),
     usage("dump -vz x", "unknown option '-vz'", " dump"),

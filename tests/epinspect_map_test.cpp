@@ -66,7 +66,7 @@ const Case cases[] = {
      "epinspect map none --first 1", 1, "", says({"seven: entry 7" + holds("0-6"),
      "seven: entry 18446744073709551615" + holds("0-6"), "none: entry 1" + holds("none")})},
     {"says what is doubtful", "printf x >>none; epinspect map none; epinspect map far; epinspect entry far 0", 1,
-     "0 entries…0 entries…", says({"none: ends inside an entry, of which 1 bytes are there",
+     "0 entries…0 entries…", says({"none: ends inside an entry, 1 of its 8 bytes are there",
      "far" + startsFar, "far" + startsFar, "far: entry 0" + holds("none")})},
     {"refuses what is no map", "epinspect map data; epinspect entry data 0", 1, "",
      says({"data" + wrongType, "data: entry 0" + wrongType})},

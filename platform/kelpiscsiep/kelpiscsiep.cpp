@@ -7,6 +7,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <cstdint>
@@ -49,7 +50,7 @@ void fill(void* record, const Lun& lun) {
         std::memcpy(bytes + offset, &value, sizeof value);
     };
     const auto putText = [bytes](TextPlace place, const std::string& text) {
-        std::memcpy(bytes + place.begin, text.data(), text.size());
+        std::copy(text.begin(), text.end(), bytes + place.begin);
     };
     std::memset(bytes, 0, KELPISCSI_LUN_RECORD_SIZE);
     putNumber(KELPISCSI_LUN_EXTENT_SIZE, *lun.extentSize);

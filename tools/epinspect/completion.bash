@@ -11,7 +11,7 @@ _epinspect_files() {
 
 _epinspect() {
     local word before command='' kind='' root='' files='' piece replaced pieces=() typed=() index
-    local commands='dump check map entry diff find extent lun path help' kinds='tbl fri jnl map dat'
+    local commands='list dump check map entry diff find locate read extent lun path help' kinds='tbl fri jnl map dat'
     local common='--root --verbose --help'
     COMPREPLY=()
     # The words as the shell will see them: bash breaks them at "=" and "@".
@@ -29,7 +29,8 @@ _epinspect() {
     for ((index = 1; index < ${#typed[@]} - 1; index++)); do
         case ${typed[index]} in
             --root) root=${typed[++index]} ;;
-            --as | --first | --count | --luns | --extent | --pool | --extent-size | --extent-address) ((++index)) ;;
+            --as | --first | --count | --luns | --extent | --pool | --offset | --length) ((++index)) ;;
+            --extent-size | --extent-address | --address-bits | --count-from) ((++index)) ;;
             -*) ;;
             *)
                 if [[ -z $command ]]; then
@@ -45,10 +46,13 @@ _epinspect() {
     case $command in
         '') options="$commands $common --version" ;;
         help) options=$commands ;;
+        list) options+=' --luns --json' ;;
         dump) options+=' --as --json' ;;
         check) options+=' --luns --extent-size --json' ;;
         entry | diff | lun) options+=' --json' ;;
         find) options+=' --extent --pool --json' ;;
+        locate) options+=' --extent-size --address-bits --count-from --json' ;;
+        read) options+=' --offset --length --extent-size --address-bits --count-from' ;;
         map) options+=' --first --count --chart --json' ;;
         extent) options+=' --extent-size --raw' ;;
         path)
@@ -59,8 +63,10 @@ _epinspect() {
     case $before in
         --as) options='tbl map dat fri jnl head' ;;
         --root) files=-d ;;
-        --first | --count | --luns | --extent | --pool | --extent-size | --extent-address) return ;;
-        *) [[ $word == -* || -z $command || $command$kind =~ ^(help|lun|path|pathmap)$ ]] || files=-f ;;
+        --address-bits) options='48 52' ;;
+        --count-from) options='file volume' ;;
+        --first | --count | --luns | --extent | --pool | --offset | --length | --extent-size | --extent-address) return ;;
+        *) [[ $word == -* || -z $command || $command$kind =~ ^(help|list|lun|path|pathmap)$ ]] || files=-f ;;
     esac
     if [[ -z $files ]]; then
         mapfile -t COMPREPLY < <(compgen -W "$options" -- "$word")

@@ -13,6 +13,8 @@ namespace epsample {
 namespace {
 
 constexpr std::uint32_t extentSize1 = 1048576;
+constexpr std::uint32_t extentSize2 = 65536;
+constexpr std::uint64_t entries2 = 256;
 constexpr std::uint64_t extentsPerDataFile = dataFileSpan / extentSize1;
 
 /// The entries of LUN 1 repeat after as many, but for extent addresses, which go on.
@@ -32,7 +34,7 @@ MapEntry entryOfLun1(std::uint64_t index) {
     entry.extentAddress = index;
     if (place < 400) {
         entry.synced = true;
-    } else if (place < 512 + 256) {
+    } else if (place < 768) {
         entry.poolNumber = 16;
         entry.extentAddress = extentsPerDataFile + index;
     } else if (place < 800) {
@@ -97,14 +99,13 @@ void writeVolume1(const std::string& root, const Lun& lun, std::uint64_t entries
     writeEntriesOfLun1(mapPath, entries);
 }
 
-/// Writes volume 2, all for LUN 2: of its 256 entries some runs, and one backwards.
+/// Writes volume 2, all for LUN 2: some runs, one of them backwards.
 void writeVolume2(const std::string& root, const Lun& lun) {
     const std::string folder = root + epFolder(2);
-    constexpr std::uint64_t entries = 256;
-    tableFile(lun.extentSize, 1).write(folder + "EP_TBL");
+    tableFile(extentSize2, 1).write(folder + "EP_TBL");
     EPFileBuilder::freeIndex().write(folder + "EP_FRI");
-    dataFile(0, lun.extentSize, 256, {16, 80, 128, 175}).write(folder + dataFileName(0));
-    EPFileBuilder map = mapFile(entries, 64 + 16 + 48, 64 + 48);
+    dataFile(0, extentSize2, 256, {16, 80, 128, 175}).write(folder + dataFileName(0));
+    EPFileBuilder map = mapFile(entries2, 64 + 16 + 48, 64 + 48);
     map.set(head0::uuid, 0x41);
     for (std::uint64_t i = 0; i < 64; ++i) map.entry(i, MapEntry{16 + i, 32, true, false, false, true}.stored());
     for (std::uint64_t i = 0; i < 16; ++i) map.entry(128 + i, MapEntry{95 - i, 32, true, false, true, false}.stored());
@@ -118,7 +119,8 @@ void writeSampleStore(const std::string& root, std::uint64_t mapEntries) {
     const std::vector<Lun> luns = {
         {1, extentSize1, mapEntries * extentSize1, 1600000120, 263, "BLUN", "6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11",
          "/volume1", "lun1"},
-        {2, 65536, 256 * 65536, 0, 7, "THIN", "0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522", "/volume2", "lun2"},
+        {2, extentSize2, entries2 * extentSize2, 0, 7, "THIN", "0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522", "/volume2",
+         "lun2"},
     };
     EPFileBuilder::journal().write(root + "/var/db/iscsi/EP_JNL");
     writeLunList(root, luns);

@@ -8,6 +8,7 @@
 #include <exception>
 #include <filesystem>
 #include <iostream>
+#include <new>
 #include <optional>
 #include <stdexcept>
 #include <string>
@@ -93,6 +94,8 @@ bool succeeds(const Work& work) {
         return true;
     } catch (const std::filesystem::filesystem_error& error) {
         complain(error.path1().string() + ": " + error.code().message());
+    } catch (const std::bad_alloc&) {
+        complain("not enough memory");
     } catch (const std::exception& error) {
         complain(error.what());
     }

@@ -39,7 +39,7 @@ void printFile(const StoreFile& file, const std::optional<std::uint64_t>& entrie
     const std::string size = file.missing ? "missing" : std::to_string(file.size);
     std::string text = file.kind->name + std::string(sizeColumns - std::min(sizeColumns - 1, size.size()), ' ') + size;
     if (file.lun != nullptr) text += "  LUN " + std::to_string(file.lun->record.lid);
-    if (entries) text += "  " + std::to_string(*entries) + (entries == 1U ? " entry" : " entries");
+    if (entries) text += "  " + counted(*entries, "entry", "entries");
     if (file.mapName) text += "  " + file.mapName->typeName + " " + file.mapName->uuid;
     if (file.mapName && !file.mapName->name.empty()) text += " " + file.mapName->name;
     print(wrapped(forReader(text + "  " + file.path), outputWidth(), indent, "  "));
@@ -77,7 +77,7 @@ void sayNoLuns(Session& session, Range lids, bool askedFor) {
 
 void run(Session& session, const std::optional<Range>& lids) {
     Store store(session, lids.value_or(usualLids));
-    if (!store.lunsMet()) sayNoLuns(session, lids.value_or(usualLids), lids.has_value());
+    if (store.luns().empty()) sayNoLuns(session, lids.value_or(usualLids), lids.has_value());
     bool any = false;
     store.forEachFile([&](const StoreFile& file) {
         any = true;

@@ -1,12 +1,12 @@
 #include "store/LunMap.h"
 
 #include <algorithm>
-#include <cerrno>
+#include <utility>
 
 #include "CommandLine.h"
 #include "Numbers.h"
-#include "store/Doubts.h"
 #include "store/Luns.h"
+#include "store/OpenMap.h"
 
 namespace epinspect {
 
@@ -71,14 +71,10 @@ std::optional<LunMap> openLunMap(Session& session, const LunName& lun, std::opti
         session.succeeded(tool::EP_ERR_BAD_EXTENT_SIZE, map.subject(""), 0);
         return std::nullopt;
     }
-    const std::optional<std::string> path = session.openablePath(map.file);
-    if (!path) return std::nullopt;
-    map.map = std::make_unique<tool::ISCSIEPFileMAP>(*path);
-    unsigned long long entries = 0;
-    if (!session.succeeded(map.map->getEntryCount(entries), {map.file, ""})) return std::nullopt;
-    sayDataStartDoubts(*map.map, map.file);
-    sayPartialEntry(*map.map, map.file);
-    map.entries = entries;
+    OpenedMap opened = openMap(session, map.file);
+    if (opened.file == nullptr) return std::nullopt;
+    map.map = std::move(opened.file);
+    map.entries = opened.entries;
     if (!map.lid) map.size = map.mappableSize();
     return map;
 }

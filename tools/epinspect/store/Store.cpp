@@ -82,7 +82,7 @@ std::uint32_t volumeOf(const std::string& path) {
 }
 
 Store::Store(Session& session, Range lids) : session_(session) {
-    lunsMet_ = forEachLun(session, lids, [this](const Lun& lun) { luns_.push_back(lun); });
+    forEachLun(session, lids, [this](const Lun& lun) { luns_.push_back(lun); });
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
     const std::string journalFolder = fs::path(journal).parent_path().string();

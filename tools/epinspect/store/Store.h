@@ -57,9 +57,6 @@ public:
     /// The LUNs found, lowest id first; none at all where there is no configuration.
     const std::vector<Lun>& luns() const { return luns_; }
 
-    /// Whether any LUN was found, or a failure to load one.
-    bool lunsMet() const { return lunsMet_; }
-
     /// Calls each() for the files, whose bytes are not read: journal, then volume by volume table, free-index, data and
     /// map files, then map files on no volume. Those that a configured LUN should have (its map file, the table and
     /// free-index file of its volume, the journal) are among them when they are missing. What may not be opened or
@@ -76,7 +73,6 @@ private:
 
     Session& session_;
     std::vector<Lun> luns_;
-    bool lunsMet_ = false;
     std::unordered_map<std::string, const Lun*> lunsByMap_;  ///< by the paths of their map files
     std::map<Place, std::set<std::string>> folders_;         ///< with the names of what should lie there
 };
