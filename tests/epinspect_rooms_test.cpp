@@ -35,12 +35,17 @@ std::string runsOf(const std::vector<std::vector<MapEntry>>& blocks) {
 
 }  // namespace
 
-/// What the program's syslog() calls, whatever a hardened build makes of that name.
+/// What the program's syslog() calls, and what a hardened build makes of that.
 void keepForwarded(int priority, const char* format, va_list arguments) __asm__("vsyslog");
-__attribute__((visibility("default"))) void keepForwarded(int priority, const char* format, va_list arguments) {
+[[gnu::visibility("default"), gnu::format(printf, 2, 0)]] void keepForwarded(int priority, const char* format,
+                                                                             va_list arguments) {
     char text[100];
     std::vsnprintf(text, sizeof text, format, arguments);
     forwarded += std::to_string(priority) + " " + text + "\n";
+}
+extern "C" [[gnu::visibility("default"), gnu::format(printf, 3, 0)]] void __vsyslog_chk(  // NOLINT
+    int priority, int /*flag*/, const char* format, va_list arguments) {
+    keepForwarded(priority, format, arguments);
 }
 extern "C" void syslog(int priority, const char* format, ...);
 
