@@ -70,8 +70,11 @@ const Case cases[] = {
      R"("lastRecordStart":5281116304131903312,"lastFlushErrno":4227661310,"lastRecoveryError":1364349780,)"
      R"("emptyRecordStart":6149198378188823388)"), ""},
 
-    {"takes the kind from the type where the name tells none", "cp EP_DAT_7 d; cp @iSCSI/LUN/m m; "
-     "epinspect dump --json d m", 0, "{\"kind\":\"dat\",\"file\":\"d\",…}\n{\"kind\":\"map\",\"file\":\"m\",…}\n", ""},
+    {"takes the kind from the type where the name tells none", "cp EP_DAT_7 d; cp @iSCSI/LUN/m m; truncate -s 24576 zero; "
+     "epinspect dump --json d m zero", 0,
+     "{\"kind\":\"dat\",\"file\":\"d\",…}\n{\"kind\":\"map\",\"file\":\"m\",…}\n{\"kind\":\"head\",\"file\":\"zero\",…}\n",
+     says({"zero: neither name nor type tells its kind, only HEAD[0] is shown",
+           "zero: data start offset 0x0 lies inside the header block"})},
     {"takes no kind from a name that only resembles one", "for f in EP_TBL2 xEP_TBL EP_FRI2 EP_JNL2 EP_DAT xEP_DAT_1 "
      "@iSCSI/LUN2; do cp EP_TBL $f; epinspect dump --json $f; done | grep -c '\"kind\":\"head\"'", 0, "7\n",
      says({"EP_TBL2: neither name nor type tells its kind, only HEAD[0] is shown"}) + "…"},
@@ -88,8 +91,9 @@ const Case cases[] = {
     {"goes on after a failure and keeps the order", "epinspect dump EP_TBL gone EP_DAT_7 2>&1", 1,
      "EP_TBL:\n" + text(1, tableDump) + says({"gone" + missing}) + "EP_DAT_7:\n" + text(3, dataDump), ""},
     {"says why a file cannot be read", "mkfifo f; ln -s l l; truncate -s 24575 EP_TBL; "
-     "epinspect dump EP_TBL . f /dev/zero l \"$(printf 'a\\033\\nb')\"", 1, "",
-     says({"EP_TBL: ends too early (EP_ERR_READ_FAILED, 18990039)", "." + noFile, "f" + noFile, "/dev/zero" + noFile,
+     "epinspect dump EP_TBL - . f /dev/zero l \"$(printf 'a\\033\\nb')\"", 1, "",
+     says({"EP_TBL: ends too early (EP_ERR_READ_FAILED, 18990039)", "-" + missing, "." + noFile, "f" + noFile,
+           "/dev/zero" + noFile,
            "l: cannot be opened: Too many levels of symbolic links (EP_ERR_OPEN_FAILED, 18990038)",
            "a\\x1b\\x0ab" + missing})},
     {"writes failures as JSON too", "epinspect dump --json \"$(printf 'a\\377')\"", 1,

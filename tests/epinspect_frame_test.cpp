@@ -69,13 +69,20 @@ const Case cases[] = {
      "0x400000'; do epinspect path $a; done", 0,
      "/volume1/@iSCSI/EP/EP_TBL\n/volume2/@iSCSI/EP/EP_FRI\n/var/db/iscsi/EP_JNL\n/var/db/iscsi/EP_JNL\n" + map2 +
      "\n/volume3/@iSCSI/EP/EP_DAT_00000\n/volume3/@iSCSI/EP/EP_DAT_00001\n", ""},
-    {"takes the volume from the path on the target", "epinspect --root store path tbl store/volume1/x; "
+    {"takes the volume from the path on the target", "epinspect --root store path tbl store/./volume1/x; "
      "epinspect path fri store/volume1/x; epinspect path map 1 --root .", 1, "/volume1/@iSCSI/EP/EP_TBL\n",
      says({"store/volume1/x: path names no volume (EP_ERR_NO_PATH, 18990401)",
            "LUN 1" + noLun + "The LUN list is missing or cannot be read (code 9002)"})},
+    {"refuses extent addresses without a position", "for n in 8796093022207 8796093022208; do "
+     "epinspect path dat /volume1/x --extent-address $n --extent-size 1M; done", 1,
+     "/volume1/@iSCSI/EP/EP_DAT_2097151\n",
+     says({"/volume1/x: position out of any file's range (EP_ERR_SEEK_FAILED, 18990041)"})},
     {"finds files below root however they are spelt", "for f in /var/db/iscsi/EP_JNL var/db/iscsi/EP_JNL "
      "store/var/db/iscsi/EP_JNL ./store//var/../var/db/iscsi/EP_JNL \"$PWD/store/var/db/iscsi/EP_JNL\"; "
      "do epinspect --root=./store// dump --json \"$f\"; done | grep -c '\"kind\":\"jnl\"'", 0, "5\n", ""},
+    {"looks for the LUN list below root only", "mkdir -p r/var/db/iscsi; ln -s ../../../../luns.json r/var/db/iscsi; "
+     "epinspect --root r/ lun 7", 1, "", says({"r/var/db/iscsi/luns.json: not used: a link leads out of the folder of "
+     "--root", "LUN 7" + noLun + "…"})},
     {"refuses links out of root", "mkdir r; cp data r/EP_DAT_1; ln -s EP_DAT_1 r/EP_DAT_2; ln -s ../data r/out; "
      "ln -s out r/in; cp data r2; ln -s ../r2 r/beside; epinspect --root r dump --json EP_DAT_1 EP_DAT_2 out in beside",
      1, "{\"kind\":\"dat\",…\n{\"kind\":\"dat\",…\n{\"kind\":\"error\",…{\"kind\":\"error\",…{\"kind\":\"error\",…\n",
@@ -86,15 +93,16 @@ const Case cases[] = {
     usage("path foo", "unknown subcommand 'foo', not one of tbl, fri, jnl, map, dat", " path"),
     usage("map x --fisrt 3", "unknown option '--fisrt'", " map"),
     usage("dump -vz x", "unknown option '-vz'", " dump"),
-    usage("entry five", "INDEX is missing", " entry"),
+    usage("entry x", "INDEX is missing", " entry"),
     usage("extent data 0", "--extent-size is missing", " extent"),
-    usage("map five --first", "--first lacks its value, N", " map"),
-    usage("map five --json=false", "--json takes no value: '--json=false'", " map"),
-    usage("map five --count 1 --count 1", "--count: given twice", " map"),
-    usage("map -- five -5", "unexpected argument: '-5'", " map"),
-    usage("map five --chart --json", "--chart excludes --json", " map"),
+    usage("map x --first", "--first lacks its value, N", " map"),
+    usage("map x --json=false", "--json takes no value: '--json=false'", " map"),
+    usage("map x --count 1 --count 1", "--count: given twice", " map"),
+    usage("map -- x --y", "unexpected argument: '--y'", " map"),
+    usage("map x --chart --json", "--chart excludes --json", " map"),
     usage("dump --as foo x", "--as: 'foo': not one of tbl, dat, fri, jnl, map, head", " dump"),
-    usage("entry five -1", "INDEX: '-1': not a number, nor FIRST-LAST", " entry"),
+    usage("entry x -1", "INDEX: '-1': not a number, nor FIRST-LAST", " entry"),
+    usage("lun 0-4294967296", "LID: '0-4294967296': number out of range", " lun"),
     usage("path map 4294967296", "LID: '4294967296': number out of range", " path map"),
     usage("extent data 0 --extent-size 4G", "--extent-size: '4G': number out of range", " extent"),
     usage("--root EP_TBL dump x", "--root: 'EP_TBL': not a folder", ""),
