@@ -138,6 +138,8 @@ TEST(EPFile, TheSystemsReasonIsLeftInErrno) {
     std::string text;
     ISCSIEPMapEntryInfo entry;
     ISCSIEPFileMAP table(folder.write("table", EPFileBuilder::table()));
+    EXPECT_EQ(0, table.parseHead0());
+    errno = EDOM;
     EXPECT_EQ(18990400, table.getMapEntry(0, entry));
     EXPECT_EQ(0, errno);
     ISCSIEPFileMAP map(folder.write("map", EPFileBuilder::map()));
