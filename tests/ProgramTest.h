@@ -78,12 +78,15 @@ protected:
                "'; {\n" + command + "\n}";
     }
 
+    std::string content(const std::string& name) const {
+        std::ifstream file(path(name), std::ios::binary);
+        return {std::istreambuf_iterator<char>(file), {}};
+    }
+
     void expect(const Case& c) const {
         EXPECT_EQ(c.status, exitStatus(std::system((script(c.command) + " >.out 2>.err").c_str())));
-        for (const auto& [name, text] : {std::pair(".out", c.out), std::pair(".err", c.err)}) {
-            std::ifstream file(path(name), std::ios::binary);
-            EXPECT_PRED2(matches, std::string(std::istreambuf_iterator<char>(file), {}), text);
-        }
+        EXPECT_PRED2(matches, content(".out"), c.out);
+        EXPECT_PRED2(matches, content(".err"), c.err);
     }
 
 private:

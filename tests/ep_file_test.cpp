@@ -201,7 +201,7 @@ TEST(EPFile, DumpsMayBeMadeOnSeveralThreads) {
     const auto dump = [path = folder.write("map", EPFileBuilder::map())] {
         ISCSIEPFileMAP file(path);
         std::string text;
-        for (int i = 0; i < 50 && file.parseFile() == 0; ++i) text = file.ISCSIEPFile::toString();
+        for (int i = 0; i < 50 && file.parseFile() == 0; ++i) text = file.toString();
         return text;
     };
     std::vector<std::future<std::string>> dumps(4);

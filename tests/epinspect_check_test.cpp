@@ -31,6 +31,7 @@ protected:
         write("none", mapOf({}));
         write("pools", mapOf({m + pool1 + 4, m + pool1 + 5, 0, m + 5, m + 16 * pool1, 0, 5}));
         write("x", mapOf({m + 10, m + 11, m + 12, m + 13, 0, m + 11, 12}));
+        write("one", mapOf({0}));
         write("y", mapOf({m + synced + 12, m + synced + 13, m + 14, m + 16 * pool1 + 10}));
         write("other/x", mapOf({m + 10}));
         std::vector<std::uint64_t> large(20000), moved(20000), scattered(20000);
@@ -64,6 +65,10 @@ const Case cases[] = {
     {"diff writes both entries as JSON", "epinspect diff none y --json", 3, R"({"kind":"difference","file":"none","otherFile":"y","first":0,"count":4,"difference":"only-second","a":null,"b":{"extentAddress":12,"poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":true}}
 {"kind":"summary","file":"none","otherFile":"y","summary":true,"same":0,"onlyFirst":0,"onlySecond":4,"moved":0,"flags":0}
 )", ""},
+    {"diff joins what stands against a hole and what stands against nothing", "epinspect diff x one; epinspect diff one x", 3,
+     "0-3: only in the first: mapped, pool 0, extents 10-13\n5-6: only in the first: mapped, pool 0, extent 11 ...\n"
+     "7 entries: 1 same, 6 only in the first, 0 only in the second, 0 moved, 0 with other flags\n"
+     "0-3: only in the second: mapped, pool 0, extents 10-13\n…", ""},
     {"diff takes a hole for nothing", "cp a b; truncate -s +24 b; epinspect diff a b && epinspect diff b a", 0,
      "12 entries: no difference\n12 entries: no difference\n", ""},
     {"diff joins what two blocks share", "epinspect diff large moved", 3,
@@ -73,6 +78,7 @@ const Case cases[] = {
      "/volume1/@iSCSI/LUN/BLUN…lun1_00000: LUN 1: 63-64: mapped synced, pool 0, extents 63-64\n"
      "/volume2/@iSCSI/LUN/THIN…lun2_00000: LUN 2: 47-48: mapped synced, pool 32, extents 63-64\n"
      "4352 entries in 2 maps: 2 matches of 4 entries\n", ""},
+    {"find counts maps without a match", "epinspect find one --extent 0x3", 0, "1 entry in 1 map: 0 matches of 0 entries\n", ""},
     {"find reads addresses both ways and passes over holes",
      "epinspect find pools a --extent 0-5 --pool 0; epinspect find pools --extent 5 | head -n 1", 0,
      "pools: 3: mapped, pool 0, extent 5\npools: 6: unmapped, pool 0, extent 5\n"
@@ -85,13 +91,26 @@ const Case cases[] = {
 )", "epinspect: gone: …\n"},
     {"check is silent on a sound store", "epinspect check --root store", 0, "10 files, 4352 entries, 0 findings\n", ""},
     {"check finds every fault once", "epsample --broken broken; epinspect check --root broken >all; status=$?;"
-     R"(sed -nE 's,^.*/(THIN.{36})?([^/:]*): ([a-z-]*): .*,\3 in \2,p; /^[0-9]/p' all | paste -sd,; exit $status)", 3,
-     "kind in EP_FRI,data-start in EP_DAT_00000,serial-number in EP_DAT_00001,total-count in total-count_00000,"
-     "mapped-count in mapped-count_00000,sync-count in sync-count_00000,pool-count in pool-count_00000,"
-     "partial-entry in partial-entry_00000,unmapped-bits in unmapped-bits_00000,address-bits in address-bits_00000,"
-     "missing-data-file in missing-data-file_00000,beyond-data-file in beyond-data-file_00000,"
-     "lun-size in lun-size_00000,missing-map in missing-map_00000,magic in EP_TBL,version in EP_JNL,"
-     "extent-size in EP_TBL,shared-extents in shared-extents_00000,23 files, 191 entries, 18 findings\n", ""},
+     R"(sed -E 's,(^|: )/[^ ]*/(THIN.{36})?,\1,' all; exit $status)", 3,
+     "EP_FRI: kind: type 3, a data file, but named like a free-index file\n"
+     "EP_DAT_00000: data-start: 0x4000, inside the header block of 24576 bytes\n"
+     "EP_DAT_00001: serial-number: 7 stored, the name says 1\n"
+     "total-count_00000: total-count: 16 stored, 15 entries found\n"
+     "mapped-count_00000: mapped-count: 13 stored, 12 mapped entries found\n"
+     "sync-count_00000: sync-count: 7 stored, 8 synced entries found\n"
+     "pool-count_00000: pool-count: 1025 stored, SEG[0] holds at most 1024\n"
+     "partial-entry_00000: partial-entry: the file of 24708 bytes ends inside entry 16, 4 of its 8 bytes are there\n"
+     "unmapped-bits_00000: unmapped-bits: entry 12: unmapped, but holds 0x6c\n"
+     "address-bits_00000: address-bits: entry 3: 0x9011000000000073, of which bits 48 to 51 are 0x1: they count in extent address and pool number\n"
+     "missing-data-file_00000: missing-data-file: entry 3: extent 67108995, for which there is no EP_DAT_00001\n"
+     "beyond-data-file_00000: beyond-data-file: entry 3: extent 1024, behind the end of EP_DAT_00000, which holds 1024 extents\n"
+     "lun-size_00000: lun-size: 16 entries of 65536 bytes are 1048576 bytes, LUN 11 has 1114112\n"
+     "missing-map_00000: missing-map: LUN 12 is configured, but has no map file\n"
+     "EP_TBL: magic: 0x0, most files have 0x1122334455667788\nEP_JNL: version: 1, most files have 33752069\n"
+     "EP_TBL: extent-size: 131072 stored, LUN 13 has 65536\n"
+     "shared-extents_00000: shared-extents: entry 3: pool 16, extent 162, used by entry 2 of this map too\n"
+     "23 files, 191 entries, 18 findings\n"
+     "Not compared: missing-data-file, beyond-data-file: entries with bits 48 to 51 set: address-bits_00000\n", ""},
     {"check finds extents that are shared", "epinspect check y x ./x other/x large", 3,
      "x: unmapped-bits: entry 6: unmapped, but holds 0xc\n"
      "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
@@ -102,7 +121,8 @@ const Case cases[] = {
      "/volume1/@iSCSI/LUN/m: missing-data-file: entries 5-6: extent 8388608 in the first, for which there is no EP_DAT_00002\n"
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, behind the end of EP_DAT_00001, which holds 2 extents\n"
      "3 files, 7 entries, 3 findings\nNot compared: lun-size, extent-size, missing-map: no LUN is configured with an id from 0 to 255\n", ""},
-    {"check writes findings as JSON", "epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
+    {"check writes findings as JSON", "epsample --broken bad; epinspect check --root bad --json | sed -n 2p; epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"/volume1/@iSCSI/EP/EP_DAT_00000","rule":"data-start","stored":"0x4000","found":24576,"message":"/volume1/@iSCSI/EP/EP_DAT_00000: data-start: 0x4000, inside the header block of 24576 bytes"}
+{"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
 )", ""},
     {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,; s/lun1/new/' var/db/iscsi/luns.json;"
      "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,

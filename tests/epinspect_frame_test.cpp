@@ -73,16 +73,16 @@ const Case cases[] = {
      "epinspect path fri store/volume1/x; epinspect path map 1 --root .", 1, "/volume1/@iSCSI/EP/EP_TBL\n",
      says({"store/volume1/x: path names no volume (EP_ERR_NO_PATH, 18990401)",
            "LUN 1" + noLun + "The LUN list is missing or cannot be read (code 9002)"})},
-    {"refuses extent addresses without a position", "for n in 8796093022207 8796093022208; do "
-     "epinspect path dat /volume1/x --extent-address $n --extent-size 1M; done", 1,
-     "/volume1/@iSCSI/EP/EP_DAT_2097151\n",
+    {"refuses extent addresses without a position", "for a in '9 --extent-size 0' "
+     "'8796093022207 --extent-size 1M' '8796093022208 --extent-size 1M'; do epinspect path dat /volume1/x --extent-address $a; done", 1,
+     "/volume1/@iSCSI/EP/EP_DAT_00000\n/volume1/@iSCSI/EP/EP_DAT_2097151\n",
      says({"/volume1/x: position out of any file's range (EP_ERR_SEEK_FAILED, 18990041)"})},
     {"finds files below root however they are spelt", "for f in /var/db/iscsi/EP_JNL var/db/iscsi/EP_JNL "
      "store/var/db/iscsi/EP_JNL ./store//var/../var/db/iscsi/EP_JNL \"$PWD/store/var/db/iscsi/EP_JNL\"; "
      "do epinspect --root=./store// dump --json \"$f\"; done | grep -c '\"kind\":\"jnl\"'", 0, "5\n", ""},
     {"looks for the LUN list below root only", "mkdir -p r/var/db/iscsi; ln -s ../../../../luns.json r/var/db/iscsi; "
      "epinspect --root r/ lun 7", 1, "", says({"r/var/db/iscsi/luns.json: not used: a link leads out of the folder of "
-     "--root", "LUN 7" + noLun + "…"})},
+     "--root", "LUN 7" + noLun + "The LUN list is missing or cannot be read (code 9002)"})},
     {"refuses links out of root", "mkdir r; cp data r/EP_DAT_1; ln -s EP_DAT_1 r/EP_DAT_2; ln -s ../data r/out; "
      "ln -s out r/in; cp data r2; ln -s ../r2 r/beside; epinspect --root r dump --json EP_DAT_1 EP_DAT_2 out in beside",
      1, "{\"kind\":\"dat\",…\n{\"kind\":\"dat\",…\n{\"kind\":\"error\",…{\"kind\":\"error\",…{\"kind\":\"error\",…\n",

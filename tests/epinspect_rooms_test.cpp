@@ -1,11 +1,21 @@
 // The rooms of epinspect on their own: numbers, runs, the chart, the system log, progress.
+#include <cinttypes>
+#include <climits>
+#include <clocale>
 #include <cstdarg>
+#include <cstdlib>
+#include <cwchar>
+#include <cwctype>
 #include <map>
+#include <new>
+#include <set>
 #include <sstream>
 #include <thread>
 
 #include "CommandLine.h"
 #include "Numbers.h"
+#include "Output.h"
+#include "Program.h"
 #include "ProgramTest.h"
 #include "Progress.h"
 #include "Session.h"
@@ -19,7 +29,8 @@ namespace {
 
 using Numbers = std::map<std::string, std::uint64_t>;
 
-std::string forwarded;  ///< what went to the system log
+std::string forwarded;   ///< what went to the system log
+bool haveMemory = true;  ///< operator new fails otherwise
 
 /// "FIRST+COUNT@ADDRESS " of each run in the blocks of entries.
 std::string runsOf(const std::vector<std::vector<MapEntry>>& blocks) {
@@ -49,6 +60,13 @@ extern "C" [[gnu::visibility("default"), gnu::format(printf, 3, 0)]] void __vsys
     keepForwarded(priority, format, arguments);
 }
 extern "C" void syslog(int priority, const char* format, ...);
+
+[[gnu::noinline]] void* operator new(std::size_t size) {
+    if (void* memory = haveMemory ? std::malloc(size) : nullptr) return memory;
+    throw std::bad_alloc();
+}
+[[gnu::noinline]] void operator delete(void* memory) noexcept { std::free(memory); }
+[[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
 
 // clang-format off
 TEST(Numbers, AreDecimalOrHexadecimalAndNothingElse) {
@@ -146,4 +164,30 @@ TEST(Progress, TellsHowFarAndHowLongAndIsGoneAtTheEnd) {
         for (const std::uint64_t done : {0U, 160U, 320U}) progress.show(done);
     };
     EXPECT_EQ(" 40%  160 of 400 entries, 2 s \r\033[K=0", Terminal(31, work).shown());
+}
+
+TEST(Program, SaysThatMemoryRanOut) {
+    const auto work = [] {
+        char word[] = "epinspect";
+        char* arguments[] = {word, nullptr};
+        haveMemory = false;
+        _exit(runProgram(1, arguments));
+    };
+    EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, work).shown());
+}
+
+TEST(Output, EscapesEveryPrintableCharacterThatIsInvisibleOrTurnsTheDirection) {
+    std::set<std::uint32_t> invisible = {0x2800};  // the braille pattern without dots; the others as Unicode has them
+    FILE* properties =
+        popen(R"(perl -e 'for (160..0x10FFFF) { print "$_ " if chr =~ /\p{DI}|\p{Cf}|\p{Zl}|\p{Zp}/ }')", "r");
+    for (std::uint32_t number = 0; std::fscanf(properties, "%" SCNu32, &number) == 1;) invisible.insert(number);
+    EXPECT_EQ(0, pclose(properties));
+    ASSERT_NE(nullptr, std::setlocale(LC_CTYPE, "C.UTF-8"));
+    for (wchar_t character = 160; character <= 0x10FFFF; ++character) {
+        if (std::iswprint(static_cast<std::wint_t>(character)) == 0) continue;
+        char bytes[MB_LEN_MAX];
+        std::mbstate_t state = {};
+        const std::string text(bytes, std::wcrtomb(bytes, character, &state));
+        ASSERT_EQ(invisible.count(static_cast<std::uint32_t>(character)) == 0, printable(text) == text) << character;
+    }
 }

@@ -53,8 +53,9 @@ TEST(Epsample, StoresFitTogetherAndNothingIsOverwritten) {
     const TempDir folder;
     // clang-format off
     const std::tuple<std::string, int, const char*> runs[] = {  // arguments, exit status, a part of the message
-        {"plain", 0, ""}, {"tiny --map-entries 0x2ff", 0, ""}, {"deep/big --map-entries 4198401", 0, ""},
-        {"--broken broken", 0, ""}, {"--version", 0, ""}, {"--help >/dev/full", 1, "standard output"},
+        {"plain", 0, ""}, {"tiny --map-entries 0X2ff", 0, ""}, {"deep/big --map-entries 4198401", 0, ""},
+        {"--broken broken", 0, ""}, {"-V >said", 0, "epsample 1.0.0\n"},
+        {"-h >said", 0, "Usage: epsample "}, {"--help >/dev/full", 1, "standard output"},
         {"plain", 1, "plain: not empty"}, {"said", 1, "said: not a folder"}, {"said/x", 1, "said/x: Not a directory"},
         {"cut", 1, "cut: what has been written is not"}, {"", 2, "Try 'epsample --help'."}, {"''", 2, "DIR"},
         {"a b", 2, "'b': only"}, {"a --map-entries 1x", 2, "'1x'"}, {"a --broken --map-entries 3", 2, "exclude"},
@@ -65,7 +66,8 @@ TEST(Epsample, StoresFitTogetherAndNothingIsOverwritten) {
         EXPECT_EQ(status << 8, std::system((before + PROGRAMS "/epsample " + arguments + " 2>said").c_str()));
         std::ifstream stream(folder.path("said"));
         const std::string said{std::istreambuf_iterator<char>(stream), {}};
-        EXPECT_TRUE(status == 0 ? said.empty() : said.find(message) != std::string::npos) << arguments << '\n' << said;
+        EXPECT_TRUE(*message == '\0' ? said.empty() : said.find(message) != std::string::npos) << arguments << '\n'
+                                                                                               << said;
     }
     for (const char* store : {"plain", "tiny", "deep/big"})
         for (const unsigned int lid : {1U, 2U}) expectConsistent(folder.path(store), lid);

@@ -21,11 +21,15 @@ bool isOneOf(std::string_view names, std::string_view name) {
     return false;
 }
 
-/// A row of the help: what is typed, and what it means.
+constexpr char noBreak = '\x1f';  ///< stands for a blank at which no line ends
+
+/// A row of the help: what is typed, and what it means, which starts a line of its own where the first is too long.
 std::string helpRow(const std::string& typed, const std::string& meaning, unsigned int column) {
-    std::string text = "  " + typed;
-    text.append(text.size() + 2 > column ? 2 : column - text.size(), ' ');
-    return wrapped(text + meaning, outputWidth(), column);
+    const std::string text = "  " + typed;
+    if (text.size() + 2 > column) {
+        return text + "\n" + wrapped(std::string(column, ' ') + meaning, outputWidth(), column);
+    }
+    return wrapped(text + std::string(column - text.size(), ' ') + meaning, outputWidth(), column);
 }
 
 bool isOptional(Command::Need need) { return need == Command::Need::oneOrNone || need == Command::Need::severalOrNone; }
@@ -72,7 +76,7 @@ std::string Command::synopsis() const {
     };
     for (const Parameter& argument : arguments_) add(argument, argument.name);
     for (const Parameter& option : options_) {
-        add(option, option.name + std::string(*option.value == '\0' ? "" : " ") + option.value);
+        add(option, option.name + (*option.value == '\0' ? "" : noBreak + std::string(option.value)));
     }
     return text;
 }
@@ -81,6 +85,7 @@ std::string Command::help(const std::vector<Parameter>& everywhere) const {
     constexpr unsigned int column = 24;
     std::string text = wrapped(about_ + std::string("."), outputWidth(), 0);
     text += "\n" + wrapped("Usage: " + synopsis(), outputWidth(), 7);
+    std::replace(text.begin(), text.end(), noBreak, ' ');
     for (const Group& group : groups_) {
         text += "\n" + std::string(group.heading) + ":\n";
         for (const auto& command : group.commands) {

@@ -23,18 +23,22 @@ bool isUTF8(const std::string& text) {
     }
 }
 
+/// The members that tell a path: "NAME", and "NAMEHex" where it is not UTF-8.
+std::string pathMembers(const std::string& name, const std::string& path) {
+    const std::string members = "\"" + name + "\":" + escaped(path);
+    if (isUTF8(path)) return members;
+    std::string digits(2 * path.size(), '\0');
+    ISCSI::TOOL::PutHexDigits(reinterpret_cast<const unsigned char*>(path.data()), path.size(), digits.data());
+    return members + ",\"" + name + "Hex\":\"" + digits + "\"";
+}
+
 }  // namespace
 
-Json::Json(const std::string& file) : file_(R"(,"file":)" + (file.empty() ? "null" : escaped(file))) {
-    if (isUTF8(file)) return;
-    std::string digits(2 * file.size(), '\0');
-    ISCSI::TOOL::PutHexDigits(reinterpret_cast<const unsigned char*>(file.data()), file.size(), digits.data());
-    file_ += R"(,"fileHex":")" + digits + "\"";
-}
+Json::Json(const std::string& file) : file_(file.empty() ? R"("file":null)" : pathMembers("file", file)) {}
 
 Json& Json::begin(const char* kind) {
     line_.clear();
-    line_.add(R"({"kind":")", kind, "\"", file_);
+    line_.add(R"({"kind":")", kind, "\",", file_);
     inner_ = true;
     return *this;
 }
@@ -49,6 +53,8 @@ Json& Json::text(std::string_view name, std::string_view value) {
     line_.add(escaped(value));
     return *this;
 }
+
+Json& Json::path(const std::string& name, const std::string& value) { return ready(pathMembers(name, value)); }
 
 Json& Json::texts(std::string_view name, const std::vector<std::string>& values) {
     beginList(name);

@@ -61,6 +61,10 @@ public:
 
     /// Bytes that are not UTF-8 become U+FFFD; all else is plain ASCII.
     Json& text(std::string_view name, std::string_view value);
+
+    /// The same of a path, whose bytes "NAMEHex" tells where they are not UTF-8.
+    Json& path(const std::string& name, const std::string& value);
+
     Json& texts(std::string_view name, const std::vector<std::string>& values);
 
     /// Members that are JSON already: "name":value, and so on.
@@ -81,7 +85,7 @@ private:
 
     void anyKey(std::string_view name);
 
-    std::string file_;  ///< the member "file", and "fileHex" where it is needed, ready to be written
+    std::string file_;  ///< the member "file" ready to be written, "fileHex" too where it is needed
     Text line_;
     bool inner_ = false;  ///< something precedes what comes next
 };

@@ -70,7 +70,7 @@ void Report::printAsJson(const Finding& finding) {
     write(*json_, "stored", finding.stored);
     write(*json_, "found", finding.found);
     if (finding.entries) json_->number("first", finding.entries->first).number("count", finding.entries->count);
-    if (finding.others) json_->text("otherFile", *finding.others->file).number("otherFirst", finding.others->first);
+    if (finding.others) json_->path("otherFile", *finding.others->file).number("otherFirst", finding.others->first);
     if (finding.lid) json_->number("lid", *finding.lid);
     json_->text("message", lineOf(finding)).end();
 }

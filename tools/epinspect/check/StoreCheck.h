@@ -17,12 +17,13 @@
 #include "check/SharedExtents.h"
 #include "check/VolumeData.h"
 #include "store/ChosenFiles.h"
+#include "store/Luns.h"
 
 namespace epinspect {
 
 struct CheckOptions {
     std::vector<std::string> files;  ///< none: all of the store
-    Range lids = {0, 255};
+    Range lids = usualLids;
     std::optional<std::uint32_t> extentSize;  ///< of maps whose LUN is not known
 };
 

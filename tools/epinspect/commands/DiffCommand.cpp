@@ -65,7 +65,7 @@ void writeSide(Json& json, const char (&name)[keySize], const DiffRun::Side& sid
 }
 
 void printRun(Json& json, const std::string& otherFile, const DiffRun& run) {
-    json.begin("difference").text("otherFile", otherFile).number("first", run.first).number("count", run.count);
+    json.begin("difference").path("otherFile", otherFile).number("first", run.first).number("count", run.count);
     json.text("difference", nameOf(run.difference).json);
     writeSide(json, "a", run.a);
     writeSide(json, "b", run.b);
@@ -85,7 +85,7 @@ void printSummary(const DiffSummary& summary) {
 
 void printSummary(Json& json, const std::string& otherFile, const DiffSummary& summary) {
     json.begin("summary")
-        .text("otherFile", otherFile)
+        .path("otherFile", otherFile)
         .boolean("summary", true)
         .number("same", summary.same())
         .number("onlyFirst", summary.onlyFirst)

@@ -7,6 +7,7 @@
 #include "map/MapOutput.h"
 #include "map/RunWalk.h"
 #include "store/ChosenFiles.h"
+#include "store/Luns.h"
 #include "store/OpenMap.h"
 #include "store/RunSearch.h"
 
@@ -96,7 +97,7 @@ void printSummaryAsJson(const FindSummary& summary) {
 void run(const FindOptions& options, Session& session) {
     if (!options.search.extents && !options.search.pool) throw UsageError{"--extent or --pool is missing"};
     FindSummary summary;
-    ChosenFiles(session, options.files, {0, 255}).forEach([&](const StoreFile& file) {
+    ChosenFiles(session, options.files, usualLids).forEach([&](const StoreFile& file) {
         const bool isMap = file.kind != nullptr && file.kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
         if (options.files.empty() && (!isMap || file.missing)) return;
         searchMap(options, session, file, summary);

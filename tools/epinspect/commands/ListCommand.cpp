@@ -16,8 +16,6 @@ namespace tool = ISCSI::TOOL;
 
 namespace {
 
-constexpr Range usualLids = {0, 255};
-
 /// How many entries the map file `file` holds; nothing when there are none to be counted, which is said.
 std::optional<std::uint64_t> entriesOf(Session& session, const StoreFile& file) {
     if (file.missing || file.kind->type != tool::EP_FILE_TYPE_MAP) return std::nullopt;

@@ -12,6 +12,9 @@
 
 namespace epinspect {
 
+/// The ids that are tried unless the user names others.
+constexpr Range usualLids = {0, 255};
+
 /// A LUN, and where its map file lies on the target.
 struct Lun {
     ISCSI::TOOL::ISCSILUNConfInfo record;
