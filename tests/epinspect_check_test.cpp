@@ -65,6 +65,12 @@ const Case cases[] = {
     {"diff writes both entries as JSON", "epinspect diff none y --json", 3, R"({"kind":"difference","file":"none","otherFile":"y","first":0,"count":4,"difference":"only-second","a":null,"b":{"extentAddress":12,"poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":true}}
 {"kind":"summary","file":"none","otherFile":"y","summary":true,"same":0,"onlyFirst":0,"onlySecond":4,"moved":0,"flags":0}
 )", ""},
+    {"diff names differences in JSON", "epinspect diff a b --json | cut -d, -f 4-6 | head -n 5", 0, R"("first":1,"count":2,"difference":"moved"
+"first":3,"count":2,"difference":"flags"
+"first":5,"count":1,"difference":"only-first"
+"first":7,"count":1,"difference":"only-second"
+"first":8,"count":1,"difference":"only-first"
+)", ""},
     {"diff joins what stands against a hole and what stands against nothing", "epinspect diff x one; epinspect diff one x", 3,
      "0-3: only in the first: mapped, pool 0, extents 10-13\n5-6: only in the first: mapped, pool 0, extent 11 ...\n"
      "7 entries: 1 same, 6 only in the first, 0 only in the second, 0 moved, 0 with other flags\n"
@@ -111,6 +117,9 @@ const Case cases[] = {
      "shared-extents_00000: shared-extents: entry 3: pool 16, extent 162, used by entry 2 of this map too\n"
      "23 files, 191 entries, 18 findings\n"
      "Not compared: missing-data-file, beyond-data-file: entries with bits 48 to 51 set: address-bits_00000\n", ""},
+    {"check compares a map that is named with its volume's table", "epsample --broken broken; "
+     "epinspect check --root broken broken/volume3/@iSCSI/LUN/*", 3,
+     "/volume3/@iSCSI/EP/EP_TBL: extent-size: 131072 stored, LUN 13 has 65536\n1 file, 16 entries, 1 finding\nNot compared: magic, version: there is no other file\n", ""},
     {"check finds extents that are shared", "epinspect check y x ./x other/x large", 3,
      "x: unmapped-bits: entry 6: unmapped, but holds 0xc\n"
      "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
@@ -125,14 +134,15 @@ const Case cases[] = {
 {"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
 )", ""},
     {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,; s/lun1/new/' var/db/iscsi/luns.json;"
-     "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,
+     "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; truncate -s 99 volume1/*/EP/EP_DAT_00001; mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,
      "/volume1/@iSCSI/LUN/BLUN…new_00000: missing-map: LUN 1 is configured, but has no map file\n"
      "/share/@iSCSI/LUN/THIN…lun2_00000: missing-map: LUN 2 is configured, but has no map file\n"
-     "8 files, 4352 entries, 2 findings\nNot compared: beyond-data-file: a data file cannot be read: /volume2/…\n"
+     "7 files, 4352 entries, 2 findings\nNot compared: beyond-data-file: a data file cannot be read: /volume1/… and 1 more\n"
      "Not compared: extent-size: no table file that could be read: /volume1/@iSCSI/EP/EP_TBL\n"
      "Not compared: extent-size: the path of the LUN's map file names no volume: /share/…\n"
      "Not compared: lun-size, extent-size: no LUN is configured for this map: /volume1/… and 1 more\n"
      "Not compared: what the file holds: it is missing: /volume1/@iSCSI/EP/EP_TBL\n",
+     "epinspect: /volume1/@iSCSI/EP/EP_DAT_00001: ends too early (EP_ERR_READ_FAILED, 18990039)\n"
      "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"diff and find and check say that a map became shorter",
      "for what in 'diff s none' 'find s --pool 0' 'check s'; do cp scattered s; { epinspect $what; echo $?; } |"

@@ -21,7 +21,6 @@
 #include "Session.h"
 #include "map/MapChart.h"
 #include "map/MapRuns.h"
-#include "store/Luns.h"
 
 using namespace epinspect;
 
@@ -43,6 +42,14 @@ std::string runsOf(const std::vector<std::vector<MapEntry>>& blocks) {
     for (const auto& block : blocks) runs.add(std::exchange(first, first + block.size()), block, emit);
     runs.finish(emit);
     return text.str();
+}
+
+int run(std::initializer_list<const char*> words, bool withMemory = true) {
+    std::vector<char*> arguments;
+    for (const char* word : words) arguments.push_back(const_cast<char*>(word));
+    arguments.push_back(nullptr);
+    haveMemory = withMemory;
+    return runProgram(static_cast<int>(words.size()), arguments.data());
 }
 
 }  // namespace
@@ -146,9 +153,9 @@ TEST(Chart, StartsRowsWithAnIndexHoweverNarrow) {
 TEST(SystemLog, GetsEveryLineButThoseAboutACopyAndThoseOfIdsTriedOut) {
     forwarded.clear();
     syslog(3, "line %d", 1);
-    Session session, ofACopy;
+    Session ofACopy;
     setenv("KELPISCSIEP_LUNS", "/dev/null", 1);
-    EXPECT_FALSE(forEachLun(session, {1, 3}, [](const Lun&) {}));
+    EXPECT_EQ(1, run({"epinspect", "lun", "1-3"}));
     syslog(4, "line %d", 2);
     ofACopy.setRoot(".");
     syslog(3, "line %d", 3);
@@ -167,13 +174,7 @@ TEST(Progress, TellsHowFarAndHowLongAndIsGoneAtTheEnd) {
 }
 
 TEST(Program, SaysThatMemoryRanOut) {
-    const auto work = [] {
-        char word[] = "epinspect";
-        char* arguments[] = {word, nullptr};
-        haveMemory = false;
-        _exit(runProgram(1, arguments));
-    };
-    EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, work).shown());
+    EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, [] { _exit(run({"epinspect"}, false)); }).shown());
 }
 
 TEST(Output, EscapesEveryPrintableCharacterThatIsInvisibleOrTurnsTheDirection) {

@@ -74,7 +74,6 @@ void MapRules::take(Stretch& stretch, const MapRun& part) {
 
 void MapRules::end(Stretch& stretch) {
     if (stretch.entries.count > 0) (this->*stretch.tell)(stretch.entries);
-    stretch.entries.count = 0;
 }
 
 void MapRules::addFinding(const char* rule, const MapRun& entries, const Value& stored, const Value& found,

@@ -18,8 +18,7 @@ constexpr Shades meanings = {"none", "<1/3", "<2/3", "most", "all"};
 
 unsigned int shadeOf(std::uint64_t mapped, std::uint64_t entries) {
     if (mapped == 0) return 0;
-    if (mapped == entries) return 4;
-    return 1 + static_cast<unsigned int>(3 * mapped / entries);
+    return 1 + static_cast<unsigned int>(3 * mapped / entries);  // 4 where all are
 }
 
 }  // namespace
