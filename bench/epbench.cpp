@@ -113,12 +113,12 @@ const std::string& mapFile() {
 }
 
 const std::string& longMapFile() {
-    static const std::string path = writeMap("long map", longMapEntries, 1);
+    static const std::string path = writeMap("long-map", longMapEntries, 1);
     return path;
 }
 
 const std::string& fragmentedMapFile() {
-    static const std::string path = writeMap("fragmented map", mapEntries, 2);
+    static const std::string path = writeMap("fragmented-map", mapEntries, 2);
     return path;
 }
 
@@ -162,9 +162,18 @@ void shell(benchmark::State& state, const std::string& command, std::uint64_t it
     state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(items));
 }
 
-/// epinspect on a map of `entries`, which is made when it is first needed.
+/// A command on a map of `entries`, which is made when it is first needed.
 void mapProgram(benchmark::State& state, const std::string& (*path)(), std::uint64_t entries, const char* command) {
-    shell(state, EPINSPECT + (" " + std::string(command)) + " '" + path() + "'", entries);
+    shell(state, command + (" '" + path()) + "'", entries);
+}
+
+/// A command that compares the long map with a copy of it.
+void comparison(benchmark::State& state, const char* command) {
+    static const std::string copy = [] {
+        std::filesystem::copy_file(longMapFile(), longMapFile() + "2");
+        return longMapFile() + "2";
+    }();
+    shell(state, command + (" '" + longMapFile()) + "' '" + copy + "'", longMapEntries);
 }
 
 constexpr std::uint64_t lunSize = std::uint64_t{512} << 20U;
@@ -329,12 +338,17 @@ int main(int argc, char** argv) {
     add("entry/walk", wholeMapWalk);
     add("entry/walk floor", wholeMapFloor, mapFile, mapEntries);
     add("map/floor", wholeMapFloor, longMapFile, longMapEntries);
-    add("map/one run", mapProgram, longMapFile, longMapEntries, "map");
-    add("map/fragments", mapProgram, fragmentedMapFile, mapEntries, "map");
-    add("map/fragments as JSON", mapProgram, fragmentedMapFile, mapEntries, "map --json");
-    add("map/fragments as a chart", mapProgram, fragmentedMapFile, mapEntries, "map --chart");
-    add("map/find", mapProgram, longMapFile, longMapEntries, "find --pool 1");
-    add("map/check", mapProgram, longMapFile, longMapEntries, "check --extent-size 1M --luns 0");
+    add("map/one run", mapProgram, longMapFile, longMapEntries, EPINSPECT " map");
+    add("map/fragments", mapProgram, fragmentedMapFile, mapEntries, EPINSPECT " map");
+    add("map/fragments as JSON", mapProgram, fragmentedMapFile, mapEntries, EPINSPECT " map --json");
+    add("map/fragments as a chart", mapProgram, fragmentedMapFile, mapEntries, EPINSPECT " map --chart");
+    add("map/fragments, od", mapProgram, fragmentedMapFile, mapEntries, "od -An -v -tx8 -j24576");
+    add("map/find", mapProgram, longMapFile, longMapEntries, EPINSPECT " find --pool 1");
+    add("map/check", mapProgram, longMapFile, longMapEntries, EPINSPECT " check --extent-size 1M --luns 0");
+    add("map/check of fragments", mapProgram, fragmentedMapFile, mapEntries,
+        EPINSPECT " check --extent-size 1M --luns 0");
+    add("map/diff", comparison, EPINSPECT " diff");
+    add("map/cmp", comparison, "cmp");
     add("lun/read", lunProgram);
     add("lun/dd", ddProgram);
     add("extent/floor", extentFloor);
@@ -359,8 +373,12 @@ int main(int argc, char** argv) {
     reporter.printRatio("whole-map walk: time against looking at the top bits", "entry/walk", "entry/walk floor");
     reporter.printRatio("epinspect map --json of fragments: time against its text", "map/fragments as JSON",
                         "map/fragments");
+    reporter.printRatio("epinspect map of fragments: speed against od", "map/fragments, od", "map/fragments");
     reporter.printRatio("epinspect find: time against map", "map/find", "map/one run");
     reporter.printRatio("epinspect check: time against map", "map/check", "map/one run");
+    reporter.printRatio("epinspect check of fragments: time against map", "map/check of fragments", "map/fragments");
+    reporter.printRatio("epinspect diff: time against map", "map/diff", "map/one run");
+    reporter.printRatio("epinspect diff: speed against cmp", "map/cmp", "map/diff");
     reporter.printRatio("epinspect read of a long run: speed against dd bs=1M", "lun/dd", "lun/read");
     for (const char* map : {"one run", "fragments", "fragments as JSON", "fragments as a chart"}) {
         reporter.printRatio(std::string("epinspect map, ") + map + ": time per entry against looking at the top bits",

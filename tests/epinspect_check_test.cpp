@@ -32,7 +32,8 @@ protected:
         write("pools", mapOf({m + pool1 + 4, m + pool1 + 5, 0, m + 5, m + 16 * pool1, 0, 5}));
         write("x", mapOf({m + 10, m + 11, m + 12, m + 13, 0, m + 11, 12}));
         write("one", mapOf({0}));
-        write("y", mapOf({m + synced + 12, m + synced + 13, m + 14, m + 16 * pool1 + 10}));
+        write("late", EPFileBuilder::data().set(head0::dataStartOffset, 24577));
+        write("y", mapOf({m + synced + 12, m + 13, m + 14, m + 16 * pool1 + 10}));
         write("other/x", mapOf({m + 10}));
         std::vector<std::uint64_t> large(20000), moved(20000), scattered(20000);
         for (std::size_t i = 0; i < 20000; ++i) {
@@ -120,11 +121,12 @@ const Case cases[] = {
     {"check compares a map that is named with its volume's table", "epsample --broken broken; "
      "epinspect check --root broken broken/volume3/@iSCSI/LUN/*", 3,
      "/volume3/@iSCSI/EP/EP_TBL: extent-size: 131072 stored, LUN 13 has 65536\n1 file, 16 entries, 1 finding\nNot compared: magic, version: there is no other file\n", ""},
-    {"check finds extents that are shared", "epinspect check y x ./x other/x large", 3,
+    {"check finds extents that are shared", "epinspect check late y x ./x other/x large", 3,
+     "late: data-start: 0x6001, behind the end of the file, which has 24576 bytes\n"
      "x: unmapped-bits: entry 6: unmapped, but holds 0xc\n"
      "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
      "y: shared-extents: entries 0-1: pool 0, extents 12-13, used by entries 2-3 of x too\n"
-     "4 files, 20012 entries, 3 findings\nNot compared: …the extent size is not known, --extent-size tells it: …shared-extents: maps in different folders whose paths name no volume\n", ""},
+     "5 files, 20012 entries, 4 findings\nNot compared: …the extent size is not known, --extent-size tells it: …shared-extents: maps in different folders whose paths name no volume\n", ""},
     {"check looks into data files", "epinspect check --root . --extent-size 1M", 3,
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, behind the end of EP_DAT_00000, which holds 4194303 extents\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entries 5-6: extent 8388608 in the first, for which there is no EP_DAT_00002\n"

@@ -29,7 +29,7 @@ std::uint32_t volumeIn(std::string_view name) {
     name.remove_prefix(prefix.size());
     std::int32_t number = 0;
     const auto result = std::from_chars(name.data(), name.data() + name.size(), number);
-    const bool plain = !name.empty() && name[0] >= '1' && name[0] <= '9' && result.ptr == name.data() + name.size();
+    const bool plain = !name.empty() && name[0] >= '1' && result.ptr == name.data() + name.size();
     return plain && result.ec == std::errc() ? static_cast<std::uint32_t>(number) : 0;
 }
 
