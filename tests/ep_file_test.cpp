@@ -218,30 +218,15 @@ TEST(EPFile, SlotsAndMembersStandInTheDocumentedOrder) {
     const ISCSIEPFileJNL j;
     const ISCSIEPMapEntryInfo e;
     const ISCSILUNConfInfo l;
+    // clang-format off
     const std::vector<const void*> members[] = {
-        {&m.path,
-         &m.headerBlock,
-         &m.head0Checksum,
-         &m.head0Version,
-         &m.head0MagicCode,
-         &m.head0Type,
-         &m.head0UUID,
-         &m.head0DataStartOffset,
-         &m.head0CreateTime,
-         &m.head1Checksum,
-         &m.attribute,
-         &m.totalCount,
-         &m.parentUUID,
-         &m.var0Checksum,
-         &m.seg0Checksum,
-         &m.sessionUUID,
-         &m.var2Checksum,
-         &m.syncCount,
-         &m.trackUUID,
-         &m.poolUUIDs},
+        {&m.path, &m.headerBlock, &m.head0Checksum, &m.head0Version, &m.head0MagicCode, &m.head0Type, &m.head0UUID,
+         &m.head0DataStartOffset, &m.head0CreateTime, &m.head1Checksum, &m.attribute, &m.totalCount, &m.parentUUID,
+         &m.var0Checksum, &m.seg0Checksum, &m.sessionUUID, &m.var2Checksum, &m.syncCount, &m.trackUUID, &m.poolUUIDs},
         {&j.head1Checksum, &j.totalCount, &j.var0Checksum, &j.shutdownTag, &j.syncCount, &j.var1Checksum,
          &j.lastTransID, &j.lastRecordStart, &j.lastFlushErrno, &j.lastRecoveryError, &j.emptyRecordStart},
         {&e.extentAddress, &e.poolNumber, &e.mapped, &e.vpushed, &e.vpulled, &e.synced},
         {&l.lid, &l.extentSize, &l.size, &l.restoreTime, &l.type, &l.uuid, &l.rootPath, &l.name}};
+    // clang-format on
     for (const auto& ofClass : members) EXPECT_TRUE(std::is_sorted(ofClass.begin(), ofClass.end()));
 }

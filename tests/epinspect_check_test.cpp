@@ -35,6 +35,10 @@ protected:
         write("late", EPFileBuilder::data().set(head0::dataStartOffset, 24577));
         write("y", mapOf({m + synced + 12, m + 13, m + 14, m + 16 * pool1 + 10}));
         write("other/x", mapOf({m + 10}));
+        write("p/odd", EPFileBuilder::data().set(head0::version, 9).set(head0::magicCode, 9));
+        write("p/x", mapOf({m}));
+        write("p/volume1/@iSCSI/LUN/m", mapOf({m}));
+        write("p/volume1/@iSCSI/LUN/t", EPFileBuilder::table().set(head0::version, 8));
         std::vector<std::uint64_t> large(20000), moved(20000), scattered(20000);
         for (std::size_t i = 0; i < 20000; ++i) {
             large[i] = m + 4096 + i;
@@ -85,7 +89,8 @@ const Case cases[] = {
      "/volume1/@iSCSI/LUN/BLUN…lun1_00000: LUN 1: 63-64: mapped synced, pool 0, extents 63-64\n"
      "/volume2/@iSCSI/LUN/THIN…lun2_00000: LUN 2: 47-48: mapped synced, pool 32, extents 63-64\n"
      "4352 entries in 2 maps: 2 matches of 4 entries\n", ""},
-    {"find counts maps without a match", "epinspect find one --extent 0x3", 0, "1 entry in 1 map: 0 matches of 0 entries\n", ""},
+    {"find counts one", "epinspect find one --extent 0x3; epinspect find x --extent 13", 0,
+     "1 entry in 1 map: 0 matches of 0 entries\nx: 3: mapped, …\n7 entries in 1 map: 1 match of 1 entry\n", ""},
     {"find reads addresses both ways and passes over holes",
      "epinspect find pools a --extent 0-5 --pool 0; epinspect find pools --extent 5 | head -n 1", 0,
      "pools: 3: mapped, pool 0, extent 5\npools: 6: unmapped, pool 0, extent 5\n"
@@ -132,7 +137,8 @@ const Case cases[] = {
      "/volume1/@iSCSI/LUN/m: missing-data-file: entries 5-6: extent 8388608 in the first, for which there is no EP_DAT_00002\n"
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, behind the end of EP_DAT_00001, which holds 2 extents\n"
      "3 files, 7 entries, 3 findings\nNot compared: lun-size, extent-size, missing-map: no LUN is configured with an id from 0 to 255\n", ""},
-    {"check writes findings as JSON", "epsample --broken bad; epinspect check --root bad --json | sed -n 2p; epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"/volume1/@iSCSI/EP/EP_DAT_00000","rule":"data-start","stored":"0x4000","found":24576,"message":"/volume1/@iSCSI/EP/EP_DAT_00000: data-start: 0x4000, inside the header block of 24576 bytes"}
+    {"check writes findings as JSON", "epsample --broken bad; epinspect check --root bad --json | sed -n '2p;14s/.*\"rule\"/\"rule\"/p'; epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"/volume1/@iSCSI/EP/EP_DAT_00000","rule":"data-start","stored":"0x4000","found":24576,"message":"/volume1/@iSCSI/EP/EP_DAT_00000: data-start: 0x4000, inside the header block of 24576 bytes"}
+"rule":"missing-map","stored":"LUN 12","found":"no file","lid":12,"message":"…LUN 12 is configured, but has no map file"}
 {"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
 )", ""},
     {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,; s/lun1/new/' var/db/iscsi/luns.json;"
@@ -146,6 +152,15 @@ const Case cases[] = {
      "Not compared: what the file holds: it is missing: /volume1/@iSCSI/EP/EP_TBL\n",
      "epinspect: /volume1/@iSCSI/EP/EP_DAT_00001: ends too early (EP_ERR_READ_FAILED, 18990039)\n"
      "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)\n"},
+    {"check says what named files lack", "cd p; >volume1/@iSCSI/EP; epinspect check --root . odd x volume1/@iSCSI/LUN/* --extent-size 1M", 1,
+     "volume1/@iSCSI/LUN/t: kind: type 1, but named like a map file\nodd: magic: 0x9, most files have 0x1122334455667788\n"
+     "4 files, 2 entries, 2 findings\nNot compared: kind: the file's name tells none: odd and 1 more\n"
+     "Not compared: lun-size, extent-size: no LUN is configured for this map: x and 1 more\n"
+     "Not compared: missing-data-file, beyond-data-file: the data files of the volume cannot be listed: volume1/@iSCSI/LUN/m\n"
+     "Not compared: missing-data-file, beyond-data-file: the path names no volume: x\n"
+     "Not compared: serial-number: the file's name holds no number: odd\nNot compared: version: no value that most files have\n"
+     "Not compared: what else concerns a map file: the type is another: volume1/@iSCSI/LUN/t\n",
+     "epinspect: /volume1/@iSCSI/EP/: cannot be opened: Not a directory (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"diff and find and check say that a map became shorter",
      "for what in 'diff s none' 'find s --pool 0' 'check s'; do cp scattered s; { epinspect $what; echo $?; } |"
      " { read first; truncate -s 90000 s; tail -n 1; }; done", 0, "1\n1\n1\n", shorter + shorter + shorter},

@@ -102,6 +102,8 @@ const Case cases[] = {
     usage("map x --chart --json", "--chart excludes --json", " map"),
     usage("dump --as foo x", "--as: 'foo': not one of tbl, dat, fri, jnl, map, head", " dump"),
     usage("entry x -1", "INDEX: '-1': not a number, nor FIRST-LAST", " entry"),
+    usage("lun 9-8", "LID: '9-8': range runs backwards", " lun"),
+    usage("locate 1 5X", "OFFSET: '5X': not a size; K, M, G, T, KiB, MiB, GiB or TiB may follow a number", " locate"),
     usage("lun 0-4294967296", "LID: '0-4294967296': number out of range", " lun"),
     usage("path map 4294967296", "LID: '4294967296': number out of range", " path map"),
     usage("extent data 0 --extent-size 4G", "--extent-size: '4G': number out of range", " extent"),

@@ -129,9 +129,10 @@ const Case cases[] = {
      ep + "0 position 2121728 (extent 2 of the file)\n" + assumed + "; extent 2, as --address-bits says\n…",
      "epinspect: LUN 5 byte 2097152: " + open2 +
      "epinspect: LUN 5 byte 2097152: position out of any file's range (EP_ERR_SEEK_FAILED, 18990041)\n"},
-    {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M", 1,
+    {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M; epinspect --root far locate 5 1M --count-from file | tail -n 1", 0,
      "…\n" + ep + "2 position unknown (extent 8388608 of the file)\n" + assumed + "; extents counted from the volume's "
-     "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), behind its end\n…\n",
+     "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), behind its end\n…\n" + assumed +
+     "; extents counted within the data file, as --count-from says\n",
      "epinspect: " + ep + "2: LUN 5 byte 3145728: " + notFound +
      "epinspect: " + ep + "0: LUN 5 byte 4718592: " + beyond0 + "…" + lun5 +
      ": LUN 5 byte 5242880: beyond the end, the map's entries stand for 5242880 bytes (…)\n"},

@@ -53,6 +53,8 @@ TEST_F(OnTerminal, BytesAreShownInHexadecimalOnly) {
     EXPECT_EQ("0000000000000000\n=0", shown("epinspect extent data 0 --extent-size 8"));
     EXPECT_EQ("epinspect: --raw: standard output is a terminal. Try 'epinspect extent --help'.\n=2",
               shown("epinspect extent data 0 --extent-size 8 --raw"));
+    EXPECT_EQ(says({"standard output is a terminal, not a file or a pipe. Try 'epinspect read --help'."}) + "=2",
+              shown("epinspect --root store read 1"));
 }
 
 TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {

@@ -56,9 +56,9 @@ TEST(Epsample, StoresFitTogetherAndNothingIsOverwritten) {
         {"plain", 0, ""}, {"tiny --map-entries 0X2ff", 0, ""}, {"deep/big --map-entries 4198401", 0, ""},
         {"--broken broken", 0, ""}, {"-V >said", 0, "epsample 1.0.0\n"},
         {"-h >said", 0, "Usage: epsample "}, {"--help >/dev/full", 1, "standard output"},
-        {"plain", 1, "plain: not empty"}, {"said", 1, "said: not a folder"}, {"said/x", 1, "said/x: Not a directory"},
-        {"cut", 1, "cut: what has been written is not"}, {"", 2, "Try 'epsample --help'."}, {"''", 2, "DIR"},
-        {"a b", 2, "'b': only"}, {"a --map-entries 1x", 2, "'1x'"}, {"a --broken --map-entries 3", 2, "exclude"},
+        {"plain", 1, "epsample: plain: not empty, and nothing is overwritten; name a new folder or an empty one\n"}, {"said", 1, "said: not a folder"}, {"said/x", 1, "said/x: Not a directory"},
+        {"cut", 1, "epsample: cut: what has been written is not a whole store\n"}, {"", 2, "epsample: DIR is missing\nTry 'epsample --help'.\n"}, {"''", 2, "DIR"},
+        {"a b", 2, "'b': only one DIR is possible\n"}, {"a --map-entries 1x", 2, "--map-entries: '1x' is not a number from 0 to 4294967296\n"}, {"a --broken --map-entries 3", 2, "--map-entries and --broken exclude each other"},
         {"a --map-entries 4294967297", 2, "from 0 to 4294967296"}};
     // clang-format on
     for (const auto& [arguments, status, message] : runs) {

@@ -63,7 +63,6 @@ Command& Command::group(const char* heading) {
 }
 
 Command& Command::add(const char* name, const char* about) {
-    if (groups_.empty()) group("Subcommands");
     return *groups_.back().commands.emplace_back(std::make_unique<Command>(name_ + " " + name, about));
 }
 

@@ -69,7 +69,7 @@ public:
     /// Makes a heading in the help for the subcommands that come after it.
     Command& group(const char* heading);
 
-    /// A subcommand of this one.
+    /// A subcommand of this one, below the latest heading, which there must be.
     Command& add(const char* name, const char* about);
 
 private:
