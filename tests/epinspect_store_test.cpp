@@ -88,11 +88,13 @@ const Case cases[] = {
      "      /volume1/@iSCSI/LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11lun1_00000\ntbl   …2/@iSCSI/EP/EP_TBL\nfri   …2/@iSCSI/EP/EP_FRI\n"
      "dat      16801792  /volume2/@iSCSI/EP/EP_DAT_00000\nmap         26624  LUN 2  256 entries\n…lun2_00000\n", ""},
     {"list tells what LUNs lack", "mkdir far/volume3; for v in 091 -91 91x; do ln -s volume91 far/volume$v; "
-     "done; epinspect --root far list --luns 5-6", 0, "jnl       missing  /var/db/iscsi/EP_JNL\n"
+     "done; epinspect --root far list --luns 5-6; epinspect --root far list --luns 6 --json | tail -n 1", 0, "jnl       missing  /var/db/iscsi/EP_JNL\n"
      "tbl       missing  /volume91/@iSCSI/EP/EP_TBL\nfri       missing  /volume91/@iSCSI/EP/EP_FRI\n"
      "dat       3694592  " + ep + "0\ndat 4398047059968  " + ep + "1\n"
      "map         24616  LUN 5  5 entries\n      THIN " + uuid + " five\n      " + lun5 + "\n"
-     "map       missing  LUN 6  THIN " + uuid + "\n      /other/@iSCSI/LUN/THIN" + uuid + "_00000\n", ""},
+     "map       missing  LUN 6  THIN " + uuid + "\n      /other/@iSCSI/LUN/THIN" + uuid + "_00000\n" + file +
+     "/other/@iSCSI/LUN/THIN" + uuid + R"(_00000","fileKind":"map","size":null,"missing":true,"typeName":"THIN","uuid":")" +
+     uuid + R"(","name":"","lid":6})" "\n", ""},
     {"list needs no LUN list", "cd far/volume91/@iSCSI; mv EP/*0 EP/EP_DAT_99999; >EP/EP_DAT_100000; "
      "rm -r ../../var EP/*1; cp LUN/THIN* LUN/a-b; epinspect --root ../.. list --json", 0,
      file + ep.substr(0, ep.size() - 4) + R"(99999","fileKind":"dat","size":3694592,"missing":false})" "\n" +
@@ -129,10 +131,11 @@ const Case cases[] = {
      ep + "0 position 2121728 (extent 2 of the file)\n" + assumed + "; extent 2, as --address-bits says\n…",
      "epinspect: LUN 5 byte 2097152: " + open2 +
      "epinspect: LUN 5 byte 2097152: position out of any file's range (EP_ERR_SEEK_FAILED, 18990041)\n"},
-    {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M; epinspect --root far locate 5 1M --count-from file | tail -n 1", 0,
+    {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M; epinspect --root far locate 5 1M --count-from file | tail -n 1; "
+     "epinspect --root far locate 5 3M --count-from volume --json 2>/dev/null | grep -o '\"extent\":.*'", 0,
      "…\n" + ep + "2 position unknown (extent 8388608 of the file)\n" + assumed + "; extents counted from the volume's "
      "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), behind its end\n…\n" + assumed +
-     "; extents counted within the data file, as --count-from says\n",
+     "; extents counted within the data file, as --count-from says\n" R"("extent":8388608,"position":null,"inside":false}]})" "\n",
      "epinspect: " + ep + "2: LUN 5 byte 3145728: " + notFound +
      "epinspect: " + ep + "0: LUN 5 byte 4718592: " + beyond0 + "…" + lun5 +
      ": LUN 5 byte 5242880: beyond the end, the map's entries stand for 5242880 bytes (…)\n"},
