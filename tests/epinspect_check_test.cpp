@@ -36,7 +36,7 @@ protected:
         write("y", mapOf({m + synced + 12, m + 13, m + 14, m + 16 * pool1 + 10}));
         write("other/x", mapOf({m + 10}));
         write("p/odd", EPFileBuilder::data().set(head0::version, 9).set(head0::magicCode, 9));
-        write("p/x", mapOf({m}));
+        write("p/x", mapOf({m}).set(map::seg0PoolCount, 1024));
         write("p/volume1/@iSCSI/LUN/m", mapOf({m}));
         write("p/volume1/@iSCSI/LUN/t", EPFileBuilder::table().set(head0::version, 8));
         std::vector<std::uint64_t> large(20000), moved(20000), scattered(20000);
@@ -53,7 +53,8 @@ protected:
         write("volume1/@iSCSI/EP/EP_DAT_00000", data.set(serialNumber, 0).resize(24575 + (std::uint64_t{1} << 42U)));
         write("volume1/@iSCSI/EP/EP_DAT_00001", data.set(serialNumber, 1).resize(24576 + (2U << 20U)));
         const std::uint64_t n = m + 0x400000;
-        write("volume1/@iSCSI/LUN/m", mapOf({n - 2, n - 1, n, n + 1, n + 2, m + 0x800000, m + 0x800000000000}));
+        write("volume1/@iSCSI/LUN/m",
+              mapOf({n - 2, n - 1, n, n + 1, n + 2, m + 0x800000, m + 0x7ffffffffff, m + 0x80000000000}));
     }
 };
 
@@ -134,9 +135,9 @@ const Case cases[] = {
      "5 files, 20012 entries, 4 findings\nNot compared: …the extent size is not known, --extent-size tells it: …shared-extents: maps in different folders whose paths name no volume\n", ""},
     {"check looks into data files", "epinspect check --root . --extent-size 1M", 3,
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, behind the end of EP_DAT_00000, which holds 4194303 extents\n"
-     "/volume1/@iSCSI/LUN/m: missing-data-file: entries 5-6: extent 8388608 in the first, for which there is no EP_DAT_00002\n"
+     "/volume1/@iSCSI/LUN/m: missing-data-file: entries 5-7: extent 8388608 in the first, for which there is no EP_DAT_00002\n"
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, behind the end of EP_DAT_00001, which holds 2 extents\n"
-     "3 files, 7 entries, 3 findings\nNot compared: lun-size, extent-size, missing-map: no LUN is configured with an id from 0 to 255\n", ""},
+     "3 files, 8 entries, 3 findings\nNot compared: lun-size, extent-size, missing-map: no LUN is configured with an id from 0 to 255\n", ""},
     {"check writes findings as JSON", "epsample --broken bad; epinspect check --root bad --json | sed -n '2p;14s/.*\"rule\"/\"rule\"/p'; epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"/volume1/@iSCSI/EP/EP_DAT_00000","rule":"data-start","stored":"0x4000","found":24576,"message":"/volume1/@iSCSI/EP/EP_DAT_00000: data-start: 0x4000, inside the header block of 24576 bytes"}
 "rule":"missing-map","stored":"LUN 12","found":"no file","lid":12,"message":"…LUN 12 is configured, but has no map file"}
 {"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}

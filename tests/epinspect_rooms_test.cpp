@@ -126,18 +126,18 @@ TEST(Runs, MergeNeighboursThatAreAlike) {
 }
 
 TEST(Chart, ShadesACellByItsShareOfMappedEntries) {
-    MapChart chart(0, 6330, 40);  // 16 rows of 33 cells, of 12 entries each; the last cell has but 6
+    MapChart chart(0, 6160, 40);  // 16 rows of 33 cells, of 12 entries each; the last cell has but 4
     for (const unsigned int mapped : {0U, 1U, 3U, 4U, 7U, 8U, 11U, 12U}) {
         chart.add(true, mapped);
         chart.add(false, 12 - mapped);
     }
-    chart.add(false, 6330 - 8 * 12 - 6);
-    chart.add(true, 6);
+    chart.add(false, 6160 - 8 * 12 - 4);
+    chart.add(true, 4);
     const std::string drawn = chart.draw(false);
     EXPECT_EQ("   0 |.--++**#.........................|\n 396 |", drawn.substr(0, 47));
     EXPECT_EQ("   0 |·░░▒▒▓▓█·", chart.draw(true).substr(0, 31));
     EXPECT_EQ(
-        "\n5940 |................................#|\nOne cell: 12 entries\n"
+        "\n5940 |..................#|\nOne cell: 12 entries\n"
         "Mapped: . none  - <1/3  + <2/3  * most\n        # all\n",
         drawn.substr(drawn.rfind("\n5940")));
 }

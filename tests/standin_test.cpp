@@ -45,7 +45,7 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
     setenv("KELPISCSIEP_LUNS", path.c_str(), 1);
     // clang-format off
     const std::tuple<int, std::string, Lines> cases[] = {  // the code, and what stands in the list instead of a text
-        {0, "9223372036854775809", {"18446744073709551615"}}, {0, "-5", {"2147483647", "0"}},
+        {0, "9223372036854775809", {"18446744073709551615"}}, {0, "-5", {"2147483647", R"(0, "more": {})"}},
         {bad, "9223372036854775809", {"18446744073709551616", "-1"}}, {bad, "-2147483648", {"-2147483649"}},
         {bad, "-5", {"2147483648", "18446744073709551611", "1.5", "[1]"}},
         {bad, "-5", {R"(1, "type": null)", R"(1, "type": true)", R"(1, "type": 1.5)", R"(1, "type": [])", R"(1, "type": {})"}},
