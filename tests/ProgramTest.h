@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <cctype>
+#include <csignal>
 #include <fstream>
 #include <functional>
 #include <string>
@@ -109,6 +110,7 @@ public:
     ~Terminal() { close(terminal_); }
 
     void interrupt() const { EXPECT_EQ(1, write(terminal_, "\003", 1)); }
+    void signal(int number) const { EXPECT_EQ(0, kill(-process_, number)); }
 
     /// All that is shown until `text` is, or to the end.
     std::string shownUntil(const std::string& text) {

@@ -54,7 +54,9 @@ const Case cases[] = {
      "{\"kind\":\"lun\",\"file\":\"" + map1 + R"(","lid":1,"extentSize":1048576,"size":4294967296,)"
      R"("restoreTime":1600000120,"type":263,"uuid":"6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11","rootPath":"/volume1",)"
      R"("name":"lun1","typeName":"BLUN","missing":false})" "\n"
-     "{\"kind\":\"lun\",\"file\":\"" + map2 + "\",\"lid\":2,…}\n", ""},
+     "{\"kind\":\"lun\",\"file\":\"" + map2 + "\",\"lid\":2,\"extentSize\":65536,\"size\":16777216,"
+     R"("restoreTime":0,"type":7,"uuid":"0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522","rootPath":"/volume2","name":"lun2",)"
+     R"("typeName":"THIN","missing":false})" "\n", ""},
     {"prefers the LUN list of the environment", "KELPISCSIEP_LUNS=luns.json epinspect --root store lun --json 7", 0,
      R"({"kind":"lun","file":"/volume3/@iSCSI/LUN/…","lid":7,"extentSize":4096,"size":8192,"restoreTime":5,"type":-2,)"
      R"("uuid":"u-7","rootPath":"/volume3","name":"c\u0007\"d","typeName":"…","missing":true})" "\n", ""},
@@ -105,7 +107,6 @@ const Case cases[] = {
     usage("lun 9-8", "LID: '9-8': range runs backwards", " lun"),
     usage("locate 1 5X", "OFFSET: '5X': not a size; K, M, G, T, KiB, MiB, GiB or TiB may follow a number", " locate"),
     usage("lun 0-4294967296", "LID: '0-4294967296': number out of range", " lun"),
-    usage("path map 4294967296", "LID: '4294967296': number out of range", " path map"),
     usage("extent data 0 --extent-size 4G", "--extent-size: '4G': number out of range", " extent"),
     usage("--root EP_TBL dump x", "--root: 'EP_TBL': not a folder", ""),
     usage("--root '' dump x", "--root: '': No such file or directory", ""),

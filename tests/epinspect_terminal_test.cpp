@@ -64,7 +64,7 @@ TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {
     drawing.interrupt();
     EXPECT_PRED2(matches, drawing.shown(), "  …%…\r\033[K=130");
     listing.shownUntil(" left");
-    listing.interrupt();  // which it ignores, as it was told when it started
+    listing.signal(SIGINT);  // which it ignores, as it was told when it started
     std::filesystem::resize_file(path("endless"), 24576);
     EXPECT_PRED2(matches, listing.shown(),
                  "  …%…\r\033[Kepinspect: endless: entry …: the file has become shorter while it was read (…)\n=1");

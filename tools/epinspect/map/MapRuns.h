@@ -58,11 +58,10 @@ public:
         }
     }
 
-    /// No more entries come: calls emit() for the run that was still open.
+    /// No more entries come: calls emit() for the run that is still open.
     template <typename Emit>
     void finish(Emit&& emit) {
         if (run_.count > 0) emit(run_);
-        run_.count = 0;
     }
 
 private:
