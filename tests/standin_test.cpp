@@ -69,7 +69,8 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
             std::ofstream(path) << std::string(list).replace(list.find(from), from.size(), to);
             EXPECT_EQ(expected, ask()) << from << " -> " << to.substr(0, 80);
         }
-    for (const std::string& other : {folder.path("none"), folder.path(""), std::string("/dev/zero")})
+    for (const std::string& other :
+         {folder.path("none"), folder.path(""), std::string("/dev/zero"), std::string("/proc/self/mem")})
         EXPECT_EQ(unreadable, (setenv("KELPISCSIEP_LUNS", other.c_str(), 1), ask())) << other;
 
     unsetenv("KELPISCSIEP_LUNS");
