@@ -124,9 +124,10 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
 "rule":"shared-extents","stored":162,"found":"shared-extents_00000","first":3,"count":1,"otherFile":"shared-extents_00000","otherFirst":2,"message":"shared-extents_00000: shared-extents: entry 3: pool 16, extent 162, used by entry 2 of this map too"}
 {"kind":"summary","file":null,"summary":true,"files":23,"entries":191,"findings":18,"notCompared":["missing-data-file, beyond-data-file: entries with bits 48 to 51 set: address-bits_00000"]}
 )", ""},
-    {"check compares a map that is named with its volume's table", "epsample --broken broken; "
-     "epinspect check --root broken broken/volume3/@iSCSI/LUN/*", 3,
-     "/volume3/@iSCSI/EP/EP_TBL: extent-size: 131072 stored, LUN 13 has 65536\n1 file, 16 entries, 1 finding\nNot compared: magic, version: there is no other file\n", ""},
+    {"check compares maps that are named with their LUNs and tables", "epsample --broken broken; "
+     "epinspect check --root broken broken/volume2/*/LUN/*lun-size* broken/volume3/@iSCSI/LUN/*", 3,
+     "broken/…lun-size_00000: lun-size: 16 entries of 65536 bytes are 1048576 bytes, LUN 11 has 1114112\n"
+     "/volume3/@iSCSI/EP/EP_TBL: extent-size: 131072 stored, LUN 13 has 65536\n2 files, 32 entries, 2 findings\n", ""},
     {"check finds extents that are shared", "epinspect check late y x ./x other/x large", 3,
      "late: data-start: 0x6001, behind the end of the file, which has 24576 bytes\n"
      "x: unmapped-bits: entry 6: unmapped, but holds 0xc\n"

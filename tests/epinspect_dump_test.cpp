@@ -17,12 +17,11 @@ protected:
     }
 };
 
-const std::string uuids[] = {"",
-                             "10111213-1415-1617-1819-1a1b1c1d1e1f",
-                             "20212223-2425-2627-2829-2a2b2c2d2e2f",
-                             "30313233-3435-3637-3839-3a3b3c3d3e3f",
-                             "40414243-4445-4647-4849-4a4b4c4d4e4f",
-                             "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf"};
+// clang-format off
+const std::string uuids[] = {
+    "", "10111213-1415-1617-1819-1a1b1c1d1e1f", "20212223-2425-2627-2829-2a2b2c2d2e2f",
+    "30313233-3435-3637-3839-3a3b3c3d3e3f", "40414243-4445-4647-4849-4a4b4c4d4e4f",
+    "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf"};
 
 std::string text(unsigned int type, const char* sections) {
     return head0Dump(std::to_string(type), uuids[type], "0x6000") + sections;
@@ -38,7 +37,6 @@ std::string json(const char* kind, const char* file, unsigned int type, const ch
 const std::string noFile =
     ": cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)";
 
-// clang-format off
 const Case cases[] = {
     {"shows a table file", "epinspect dump EP_TBL", 0, text(1, tableDump), ""},
     {"shows a free index file", "epinspect dump EP_FRI", 0, text(2, freeIndexDump), ""},
