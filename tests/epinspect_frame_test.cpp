@@ -114,18 +114,17 @@ const Case cases[] = {
     {"takes options anywhere and repeatedly", "epinspect -vv entry --json --json -- gone 0", 1, "{\"kind\":\"error\",…",
      says({"iSCSI:ISCSIEPFile.cpp:37:readHeader Failed to open file. path: gone",
            "iSCSI:ISCSIEPFile.cpp:59:parseHead0 Failed to read header. path: gone", "gone" + missing})},
-    {"helps", "for c in entry '' map path 'path jnl' 'path dat'; do epinspect $c --help --nonsense; done | grep -A5 -E "
-     "'Usage|Arguments:'; epinspect read -h | grep -A1 -e '--[ac]'; epinspect help path jnl; epinspect -V --nonsense", 0,
-     "Usage: epinspect entry MAPFILE INDEX... [--json]\n\nArguments:\n  MAPFILE               Map file of a LUN\n"
-     "  INDEX                 Index of an entry, from 0; FIRST-LAST for all from FIRST\n"
-     "                        to LAST\n\nOptions:\n…Usage: epinspect SUBCOMMAND ... [-V, --version]\n"
+    {"helps", "for c in '' map path 'path jnl' 'path dat'; do epinspect $c --help --nonsense; done | grep -A5 Usage; "
+     "epinspect read -h | grep -A1 -e '--[ac]'; epinspect help path | sed -n '6,8p'; epinspect help path jnl; epinspect -V --nonsense", 0,
+     "Usage: epinspect SUBCOMMAND ... [-V, --version]\n\nFiles of a store:\n  list      …"
      "…Usage: epinspect map MAPFILE [--first N] [--count N] [--chart] [--json]\n…Usage: epinspect path SUBCOMMAND ...\n"
      "…Usage: epinspect path jnl [EPFILE]\n…Usage: epinspect path dat EPFILE --extent-size SIZE --extent-address N\n"
      "…       [--address-bits 48|52] [--count-from file|volume]\n\n--\n"
      "  --address-bits 48|52  How many bits of an entry are its extent address;\n"
      "                        matters where bits 48 to 51 are set\n  --count-from file|volume\n"
      "                        From where extents are counted: within the data file, or\n"
-     "The journal of the machine.\n\nUsage: epinspect path jnl [EPFILE]\n\n"
+     "  tbl                   The table file of a volume\n  fri                   The free-index file of a volume\n"
+     "  jnl                   The journal of the machine\nThe journal of the machine.\n\nUsage: epinspect path jnl [EPFILE]\n\n"
      "Arguments:\n  EPFILE                An EP file of the volume; it is not opened\n\nOptions everywhere:\n"
      "  --root DIR            Folder that stands for / of the target\n"
      "  -v, --verbose         Show the library's log lines on standard error\n"

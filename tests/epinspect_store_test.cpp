@@ -75,6 +75,8 @@ protected:
 
 const std::string assumed = "assumed: entry i holds bytes from i x extent size", file = R"({"kind":"file","file":")";
 const std::string openFailed = " (EP_ERR_OPEN_FAILED, 18990038)\n";
+const std::string no = "THIN00000000-0000-4000-8000x000000000005",
+                  same = R"(","fileKind":"map","size":24616,"missing":false,"entries":5})";
 const std::string notFound = "cannot be opened: No such file or directory" + openFailed;
 const std::string beyond0 = "beyond the end, the file holds 3670016 bytes of extents (EP_ERR_READ_FAILED, 18990039)\n";
 const std::string open2 =
@@ -98,12 +100,11 @@ const Case cases[] = {
      "/other/@iSCSI/LUN/THIN" + uuid + R"(_00000","fileKind":"map","size":null,"missing":true,"typeName":"THIN","uuid":")" +
      uuid + R"(","name":"","lid":6})" "\n", ""},
     {"list needs no LUN list", "cd far/volume91/@iSCSI; mv EP/*0 EP/EP_DAT_99999; >EP/EP_DAT_100000; "
-     "rm -r ../../var EP/*1; cp LUN/THIN* LUN/a-b; epinspect --root ../.. list --json", 0,
+     "rm -r ../../var EP/*1; for n in " + no + " a-b; do cp LUN/*five* LUN/$n; done; epinspect --root ../.. list --json", 0,
      file + ep.substr(0, ep.size() - 4) + R"(99999","fileKind":"dat","size":3694592,"missing":false})" "\n" +
      file + ep.substr(0, ep.size() - 4) + R"(100000","fileKind":"dat","size":0,"missing":false})" "\n" +
      file + lun5 + R"(","fileKind":"map","size":24616,"missing":false,"entries":5,"typeName":"THIN","uuid":")" + uuid +
-     R"(","name":"five"})" "\n" + file + maps + R"(a-b","fileKind":"map","size":24616,"missing":false,"entries":5})"
-     "\n", "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read (code 9002)\n"},
+     R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-b" + same + "\n", "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read (code 9002)\n"},
     {"list says what may not be opened", "rm far/var/db/iscsi/*; cd far/volume91/@iSCSI; mv EP LUN/folder; "
      "ln -s /usr EP; rm LUN/THIN*; mkfifo LUN/pipe; ln -s none LUN/link; ln -s self LUN/self; "
      "epinspect --root ../.. list --luns 7; epinspect --root LUN/folder list", 1,
@@ -159,8 +160,9 @@ const Case cases[] = {
      "store/volume1/@iSCSI/EP/EP_DAT_00001 $i --extent-size 1M | head -n 1; done", 0, "file 1 extent 0\nfile 1 extent 1\n"
      "file 1 extent 514\nfile 1 extent 2047\nfile 1 extent 2048\nfile 1 extent 4095\nfile 1 extent 4096\nfile 1 extent 5200\n", ""},
     {"neither goes beyond the LUN", "for a in 'read 5 --offset 6M' 'read 5 --length 7M' 'read 6' 'read 7'; "
-     "do epinspect --root far $a; echo $?; done", 0, "1\n1\n1\n1\n",
-     "…byte 6291456: beyond the end, the LUN has 6291456 bytes (…: LUN 6: extent size cannot be used (…No such LUN…"},
+     "do epinspect --root far $a; echo $?; done; "
+     "cp far" + lun5 + " m; epinspect read m --extent-size 1M --length 1 | od -An -tx1", 0, "1\n1\n1\n1\n 00\n",
+     "…byte 6291456: beyond the end, the LUN has 6291456 bytes (…: LUN 6: extent size cannot be used (…No such LUN…epinspect: m: byte 0: path names no volume (…1 of 1 bytes…"},
     {"wrong usage is named", "for a in 'read none' 'read 0X1FFFFFFFF' 'locate 5 1x' 'locate 5 1 --address-bits 50'; "
      "do epinspect $a; done; epinspect read 5 --count-from LUN", 2, "", "epinspect: --extent-size is missing: a map file does not tell it…LUN: '0X1FFFFFFFF'…"
      "OFFSET: '1x'…--address-bits: '50': not 48 or 52…--count-from: 'LUN': not file or volume…"},
