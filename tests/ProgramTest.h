@@ -7,7 +7,6 @@
 #include <unistd.h>
 
 #include <cctype>
-#include <csignal>
 #include <fstream>
 #include <functional>
 #include <string>

@@ -35,7 +35,7 @@ protected:
         write("late", EPFileBuilder::data().set(head0::dataStartOffset, 24577));
         write("y", mapOf({m + synced + 12, m + 13, m + 14, m + 16 * pool1 + 10}));
         write("other/x", mapOf({m + 10}));
-        write("p/odd", EPFileBuilder::data().set(head0::version, 9).set(head0::magicCode, 9));
+        write("p/EP_DAT_7x", EPFileBuilder::data().set(head0::version, 9).set(head0::magicCode, 9));
         write("p/x", mapOf({m}).set(map::seg0PoolCount, 1024));
         write("p/volume1/@iSCSI/LUN/m", mapOf({m}));
         write("p/volume1/@iSCSI/LUN/t", EPFileBuilder::table().set(head0::version, 8));
@@ -152,13 +152,13 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "Not compared: what the file holds: it is missing: /volume1/@iSCSI/EP/EP_TBL\n",
      "epinspect: /volume1/@iSCSI/EP/EP_DAT_00001: ends too early (EP_ERR_READ_FAILED, 18990039)\n"
      "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)\n"},
-    {"check says what named files lack", "cd p; >volume1/@iSCSI/EP; epinspect check --root . odd x volume1/@iSCSI/LUN/* --extent-size 1M", 1,
-     "volume1/@iSCSI/LUN/t: kind: type 1, but named like a map file\nodd: magic: 0x9, most files have 0x1122334455667788\n"
-     "4 files, 2 entries, 2 findings\nNot compared: kind: the file's name tells none: odd and 1 more\n"
+    {"check says what named files lack", "cd p; >volume1/@iSCSI/EP; epinspect check --root . EP_DAT_7x x volume1/@iSCSI/LUN/* --extent-size 1M", 1,
+     "volume1/@iSCSI/LUN/t: kind: type 1, but named like a map file\nEP_DAT_7x: magic: 0x9, most files have 0x1122334455667788\n"
+     "4 files, 2 entries, 2 findings\nNot compared: kind: the file's name tells none: x\n"
      "Not compared: lun-size, extent-size: no LUN is configured for this map: x and 1 more\n"
      "Not compared: missing-data-file, beyond-data-file: the data files of the volume cannot be listed: volume1/@iSCSI/LUN/m\n"
      "Not compared: missing-data-file, beyond-data-file: the path names no volume: x\n"
-     "Not compared: serial-number: the file's name holds no number: odd\nNot compared: version: no value that most files have\n"
+     "Not compared: serial-number: the file's name holds no number: EP_DAT_7x\nNot compared: version: no value that most files have\n"
      "Not compared: what else concerns a map file: the type is another: volume1/@iSCSI/LUN/t\n",
      "epinspect: /volume1/@iSCSI/EP/: cannot be opened: Not a directory (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"diff and find and check say that a map became shorter",

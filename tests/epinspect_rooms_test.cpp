@@ -1,10 +1,7 @@
 // The rooms of epinspect on their own: numbers, runs, the chart, the system log, progress.
-#include <cinttypes>
-#include <climits>
 #include <clocale>
 #include <cstdarg>
 #include <cstdlib>
-#include <cwchar>
 #include <cwctype>
 #include <map>
 #include <new>
@@ -181,12 +178,12 @@ TEST(Output, EscapesEveryPrintableCharacterThatIsInvisibleOrTurnsTheDirection) {
     std::set<std::uint32_t> invisible = {0x2800};  // the braille pattern without dots; the others as Unicode has them
     FILE* properties =
         popen(R"(perl -e 'for (160..0x10FFFF) { print "$_ " if chr =~ /\p{DI}|\p{Cf}|\p{Zl}|\p{Zp}/ }')", "r");
-    for (std::uint32_t number = 0; std::fscanf(properties, "%" SCNu32, &number) == 1;) invisible.insert(number);
+    for (std::uint32_t number = 0; std::fscanf(properties, "%u", &number) == 1;) invisible.insert(number);
     EXPECT_EQ(0, pclose(properties));
     ASSERT_NE(nullptr, std::setlocale(LC_CTYPE, "C.UTF-8"));
     for (wchar_t character = 160; character <= 0x10FFFF; ++character) {
         if (std::iswprint(static_cast<std::wint_t>(character)) == 0) continue;
-        char bytes[MB_LEN_MAX];
+        char bytes[16];
         std::mbstate_t state = {};
         const std::string text(bytes, std::wcrtomb(bytes, character, &state));
         ASSERT_EQ(invisible.count(static_cast<std::uint32_t>(character)) == 0, printable(text) == text) << character;

@@ -75,7 +75,7 @@ protected:
 
 const std::string assumed = "assumed: entry i holds bytes from i x extent size", file = R"({"kind":"file","file":")";
 const std::string openFailed = " (EP_ERR_OPEN_FAILED, 18990038)\n";
-const std::string no = "THIN00000000-0000-4000-8000x000000000005",
+const std::string no = "THIN00000000-0000-4000-8000x000000000005_00000",
                   same = R"(","fileKind":"map","size":24616,"missing":false,"entries":5})";
 const std::string notFound = "cannot be opened: No such file or directory" + openFailed;
 const std::string beyond0 = "beyond the end, the file holds 3670016 bytes of extents (EP_ERR_READ_FAILED, 18990039)\n";

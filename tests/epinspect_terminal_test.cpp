@@ -30,6 +30,7 @@ TEST_F(OnTerminal, AChartIsAsWideAsTheTerminal) {
                   "Mapped: · none  ░ <1/3  ▒ <2/3  ▓ most\n        █ all\n100 entries in 2 runs: 99 mapped, 0\n" +
                   "unmapped, 1 hole; 0 vpushed, 0 vpulled,\n0 synced\n=0",
               shown("epinspect map hundred --chart", 40));
+    EXPECT_EQ(shown("epinspect map hundred --chart"), shown("epinspect map hundred --chart", 0));  // it tells none
     EXPECT_EQ("  0 |" + full(74) + "|\n 74 |" + full(25) + "·|\n" + legend +
                   "99 mapped, 0 unmapped, 1 hole; 0 vpushed, 0 vpulled, 0\nsynced\n=0",
               shown("epinspect map hundred --chart"));
@@ -60,7 +61,11 @@ TEST_F(OnTerminal, BytesAreShownInHexadecimalOnly) {
 TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {
     Terminal drawing(80, script("epinspect map endless --chart")),
         listing(80, script("trap '' INT; epinspect map endless >list"));
+    Terminal reading(80, script("epinspect read endless --extent-size 1G --offset 90T --length 90T >/dev/null"));
+    Terminal trying(80, script("KELPISCSIEP_LUNS=none epinspect lun 0-4294967295 --json >none"));
     EXPECT_PRED2(matches, drawing.shownUntil(" left"), "  …%  … of 137438950400 entries, … s left");
+    EXPECT_PRED2(matches, reading.shownUntil(" left"), " …%  … of 98956046499840 bytes, … s left");
+    EXPECT_PRED2(matches, trying.shownUntil(" left"), "  …% …of 4294967296 LUN ids, … s left");
     drawing.interrupt();
     EXPECT_PRED2(matches, drawing.shown(), "  …%…\r\033[K=130");
     listing.shownUntil(" left");
