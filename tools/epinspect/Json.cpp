@@ -25,11 +25,11 @@ bool isUTF8(const std::string& text) {
 
 /// The members that tell a path: "NAME", and "NAMEHex" where it is not UTF-8.
 std::string pathMembers(const std::string& name, const std::string& path) {
-    const std::string members = "\"" + name + "\":" + escaped(path);
+    std::string members = "\"" + name + "\":" + escaped(path);
     if (isUTF8(path)) return members;
     std::string digits(2 * path.size(), '\0');
     ISCSI::TOOL::PutHexDigits(reinterpret_cast<const unsigned char*>(path.data()), path.size(), digits.data());
-    return members + ",\"" + name + "Hex\":\"" + digits + "\"";
+    return members.append(",\"").append(name).append("Hex\":\"").append(digits).append("\"");
 }
 
 }  // namespace
