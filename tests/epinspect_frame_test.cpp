@@ -20,8 +20,7 @@ protected:
 const std::string map1 = "/volume1/@iSCSI/LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11lun1_00000";
 const std::string map2 = "/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000";
 const std::string data0 = "store/volume1/@iSCSI/EP/EP_DAT_00000";
-const std::string noLun = ": configuration cannot be loaded: ";
-const std::string noSuchLun = noLun + "No such LUN (code 9001)";
+const std::string noLun = ": configuration cannot be loaded: ", noSuchLun = noLun + "No such LUN (code 9001)";
 const std::string leadsOut =
     ": cannot be opened: a link leads out of the folder of --root (EP_ERR_OPEN_FAILED, 18990038)";
 
@@ -114,16 +113,14 @@ const Case cases[] = {
      says({"iSCSI:ISCSIEPFile.cpp:37:readHeader Failed to open file. path: gone",
            "iSCSI:ISCSIEPFile.cpp:59:parseHead0 Failed to read header. path: gone", "gone" + missing})},
     {"helps", "for c in '' map path 'path jnl' 'path dat'; do epinspect $c --help --nonsense; done | grep -A5 Usage; "
-     "epinspect read -h | grep -A1 -e '--[ac]'; epinspect help path | sed -n '6,8p'; epinspect help path jnl; epinspect -V --nonsense", 0,
-     "Usage: epinspect SUBCOMMAND ... [-V, --version]\n\nFiles of a store:\n  list      …"
-     "…Usage: epinspect map MAPFILE [--first N] [--count N] [--chart] [--json]\n…Usage: epinspect path SUBCOMMAND ...\n"
-     "…Usage: epinspect path jnl [EPFILE]\n…Usage: epinspect path dat EPFILE --extent-size SIZE --extent-address N\n"
+     "epinspect read -h | grep -A1 -e '--[ac]'; epinspect help path | sed -n 6p; epinspect help path jnl; epinspect -V --nonsense", 0,
+     "Usage: epinspect SUBCOMMAND ... [-V, --version]\n…Usage: epinspect map MAPFILE [--first N] [--count N] [--chart] [--json]\n…"
+     "Usage: epinspect path SUBCOMMAND ...\n…Usage: epinspect path dat EPFILE --extent-size SIZE --extent-address N\n"
      "…       [--address-bits 48|52] [--count-from file|volume]\n\n--\n"
      "  --address-bits 48|52  How many bits of an entry are its extent address;\n"
      "                        matters where bits 48 to 51 are set\n  --count-from file|volume\n"
      "                        From where extents are counted: within the data file, or\n"
-     "  tbl                   The table file of a volume\n  fri                   The free-index file of a volume\n"
-     "  jnl                   The journal of the machine\nThe journal of the machine.\n\nUsage: epinspect path jnl [EPFILE]\n\n"
+     "  tbl                   The table file of a volume\nThe journal of the machine.\n\nUsage: epinspect path jnl [EPFILE]\n\n"
      "Arguments:\n  EPFILE                An EP file of the volume; it is not opened\n\nOptions everywhere:\n"
      "  --root DIR            Folder that stands for / of the target\n"
      "  -v, --verbose         Show the library's log lines on standard error\n"

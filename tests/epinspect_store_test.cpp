@@ -3,7 +3,6 @@
 #include <sys/syscall.h>
 
 #include <cerrno>
-#include <tuple>
 
 #include "Program.h"
 #include "ProgramTest.h"
@@ -156,9 +155,6 @@ const Case cases[] = {
      "epinspect --root far read 5 --count-from file --offset 512K --length 524292 2>/dev/null | tail -c 4", 0, "thereehere", ""},
     {"read follows runs and holes", "epinspect --root store read 2 --offset 9371640 | grep -abo 'extent [0-9]*' | "
      "awk -F: '!seen[$2]++'", 0, "15:extent 80\n65551:extent 128\n3145743:extent 175\n", ""},
-    {"the data files of the sample store hold marks", "for i in 0 1 514 2047 2048 4095 4096 5200; do epinspect extent --raw "
-     "store/volume1/@iSCSI/EP/EP_DAT_00001 $i --extent-size 1M | head -n 1; done", 0, "file 1 extent 0\nfile 1 extent 1\n"
-     "file 1 extent 514\nfile 1 extent 2047\nfile 1 extent 2048\nfile 1 extent 4095\nfile 1 extent 4096\nfile 1 extent 5200\n", ""},
     {"neither goes beyond the LUN", "for a in 'read 5 --offset 6M' 'read 5 --length 7M' 'read 6' 'read 7'; "
      "do epinspect --root far $a; echo $?; done; "
      "cp far" + lun5 + " m; epinspect read m --extent-size 1M --length 1 | od -An -tx1", 0, "1\n1\n1\n1\n 00\n",
