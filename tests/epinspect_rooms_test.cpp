@@ -10,9 +10,9 @@
 #include <thread>
 
 #include "CommandLine.h"
+#include "InProcess.h"
 #include "Numbers.h"
 #include "Output.h"
-#include "Program.h"
 #include "ProgramTest.h"
 #include "Progress.h"
 #include "Session.h"
@@ -39,14 +39,6 @@ std::string runsOf(const std::vector<std::vector<MapEntry>>& blocks) {
     for (const auto& block : blocks) runs.add(std::exchange(first, first + block.size()), block, emit);
     runs.finish(emit);
     return text.str();
-}
-
-int run(std::initializer_list<const char*> words, bool withMemory = true) {
-    std::vector<char*> arguments;
-    for (const char* word : words) arguments.push_back(const_cast<char*>(word));
-    arguments.push_back(nullptr);
-    haveMemory = withMemory;
-    return runProgram(static_cast<int>(words.size()), arguments.data());
 }
 
 }  // namespace
@@ -152,7 +144,7 @@ TEST(SystemLog, GetsEveryLineButThoseAboutACopyAndThoseOfIdsTriedOut) {
     syslog(3, "line %d", 1);
     Session ofACopy;
     setenv("KELPISCSIEP_LUNS", "/dev/null", 1);
-    EXPECT_EQ(1, run({"epinspect", "lun", "1-3"}));
+    EXPECT_EQ(1, runHere({"epinspect", "lun", "1-3"}));
     syslog(4, "line %d", 2);
     ofACopy.setRoot(".");
     syslog(3, "line %d", 3);
@@ -171,7 +163,8 @@ TEST(Progress, TellsHowFarAndHowLongAndIsGoneAtTheEnd) {
 }
 
 TEST(Program, SaysThatMemoryRanOut) {
-    EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, [] { _exit(run({"epinspect"}, false)); }).shown());
+    const auto work = [] { _exit(runHere({"epinspect"}, [] { haveMemory = false; })); };
+    EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, work).shown());
 }
 
 TEST(Output, EscapesEveryPrintableCharacterThatIsInvisibleOrTurnsTheDirection) {

@@ -4,7 +4,7 @@
 
 #include <cerrno>
 
-#include "Program.h"
+#include "InProcess.h"
 #include "ProgramTest.h"
 #include "store/ExtentPlace.h"
 
@@ -177,9 +177,8 @@ TEST_F(Store, ReadLosesNoMoreThanWhatCannotBeRead) {
             dup2(open(path(".err").c_str(), O_CREAT | O_TRUNC | O_WRONLY, 0600), STDERR_FILENO);
             unsetenv("KELPISCSIEP_LUNS");
             std::tie(badResult, badPosition) = std::pair(result, bad);
-            const std::string root = path("far"), offset = "--offset=4194404", length = "--length=600000";
-            const char* words[] = {"", "--root", root.c_str(), "read", "5", offset.c_str(), length.c_str(), nullptr};
-            _exit(epinspect::runProgram(7, const_cast<char**>(words)));
+            const std::string root = path("far");
+            _exit(runHere({"", "--root", root.c_str(), "read", "5", "--offset=4194404", "--length=600000"}));
         }
         int status = 0;
         EXPECT_EQ(child, waitpid(child, &status, 0));

@@ -8,7 +8,7 @@
 
 using namespace ISCSI::TOOL;
 
-/// Expects that all there is of a LUN fits together: its configuration, map, table and data files.
+/// Expects that all there is of a LUN fits together: its configuration, its map of `count` entries, table, data files.
 static void expectConsistent(const std::string& root, unsigned int lid, std::uint64_t count) {
     setenv("KELPISCSIEP_LUNS", (root + "/var/db/iscsi/luns.json").c_str(), 1);
     ISCSILUNConfInfo lun(lid);
@@ -54,7 +54,7 @@ TEST(Epsample, StoresFitTogetherAndNothingIsOverwritten) {
     // clang-format off
     const std::tuple<std::string, int, const char*> runs[] = {  // arguments, exit status, a part of the message
         {"plain", 0, ""}, {"tiny --map-entries 0X2ff", 0, ""}, {"deep/big --map-entries 4198401", 0, ""},
-        {"--broken broken", 0, ""}, {"-V >said", 0, "epsample 1.0.0\n"},
+        {"--broken broken", 0, ""}, {"--version >said", 0, "epsample 1.0.0\n"},
         {"-h >said", 0, "Usage: epsample "}, {"--help >/dev/full", 1, "standard output"},
         {"plain", 1, "epsample: plain: not empty, and nothing is overwritten; name a new folder or an empty one\n"}, {"said", 1, "said: not a folder"}, {"said/x", 1, "said/x: Not a directory"},
         {"cut", 1, "epsample: cut: what has been written is not a whole store\n"}, {"", 2, "epsample: DIR is missing\nTry 'epsample --help'.\n"}, {"''", 2, "DIR"},
