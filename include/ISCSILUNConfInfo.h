@@ -21,6 +21,14 @@ public:
     /// was. Throws nothing but std::bad_alloc, with every field as it was.
     int loadFromConfig();
 
+    /// The platform library's text for one of its codes; empty where it has none. Keeps errno. Throws nothing but
+    /// std::bad_alloc.
+    static std::string getErrorText(int error);
+
+    /// The name of the LUN type `type` ("BLUN"), as toString() shows it and the map file's name starts with it;
+    /// "UNKNOWN" for a type code without a name. Throws nothing but std::bad_alloc.
+    std::string getTypeName() const;
+
     /// The record as one line without a line end. Throws nothing but std::bad_alloc.
     std::string toString() const;
 

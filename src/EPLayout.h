@@ -3,6 +3,7 @@
 #pragma once
 
 #include "ISCSIEPFile.h"
+#include "etc/ISCSIEPFormat.h"
 
 namespace ISCSI::TOOL {
 
@@ -15,13 +16,10 @@ inline constexpr unsigned int EP_SEG0 = 8192;
 
 inline constexpr unsigned int EP_SECTION_SIZE = 64;  ///< of the HEAD and VAR sections
 inline constexpr unsigned int EP_UUID_SIZE = 16;
-inline constexpr unsigned int EP_MAP_ENTRY_SIZE = 8;
-inline constexpr unsigned int EP_POOL_COUNT_MAX = (EP_HEADER_BLOCK_SIZE - EP_SEG0) / EP_UUID_SIZE;
 
 static_assert(EP_HEAD0 + EP_SECTION_SIZE == EP_HEAD1 && EP_HEAD1 + EP_SECTION_SIZE <= EP_VAR0);
 static_assert(EP_VAR0 + EP_SECTION_SIZE == EP_VAR1 && EP_VAR1 + EP_SECTION_SIZE == EP_VAR2);
 static_assert(EP_VAR2 + EP_SECTION_SIZE <= EP_SEG0);
 static_assert(EP_SEG0 + EP_POOL_COUNT_MAX * EP_UUID_SIZE == EP_HEADER_BLOCK_SIZE);
-static_assert(EP_HEADER_BLOCK_SIZE == 24576 && EP_POOL_COUNT_MAX == 1024);
 
 }  // namespace ISCSI::TOOL

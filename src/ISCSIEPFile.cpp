@@ -8,8 +8,8 @@
 #include "EPFileStream.h"
 #include "EPLayout.h"
 #include "ISCSILUNConfInfo.h"
-#include "ISCSILUNText.h"
 #include "LittleEndian.h"
+#include "etc/ISCSIEPFormat.h"
 #include "etc/ISCSIEPLog.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
@@ -73,10 +73,9 @@ namespace {
 /// The whole number that follows "/volume" at the start of `path`; none when there is no such number or when it does
 /// not fit a signed 32-bit integer.
 std::optional<int> volumeIdIn(const std::string& path) {
-    static constexpr char prefix[] = "/volume";
-    constexpr auto prefixLength = sizeof prefix - 1;
+    constexpr auto prefixLength = sizeof EP_VOLUME_PREFIX - 1;
     errno = 0;  // the system is not to blame
-    if (path.compare(0, prefixLength, prefix) != 0) return std::nullopt;
+    if (path.compare(0, prefixLength, EP_VOLUME_PREFIX) != 0) return std::nullopt;
     const char* digits = path.c_str() + prefixLength;
     char* end = nullptr;
     const long long id = std::strtoll(digits, &end, 10);  // ends at its own limits when there are too many digits
@@ -88,13 +87,13 @@ std::optional<int> volumeIdIn(const std::string& path) {
 }
 
 std::string volumeFile(int volumeId, const std::string& name) {
-    return "/volume" + std::to_string(volumeId) + "/@iSCSI/EP/" + name;
+    return EP_VOLUME_PREFIX + std::to_string(volumeId) + EP_VOLUME_FOLDER + name;
 }
 
 }  // namespace
 
 int ISCSIEPFile::getJNLFilePath(std::string& filePath) const {
-    filePath = "/var/db/iscsi/EP_JNL";
+    filePath = std::string(EP_JNL_FOLDER) + EP_JNL_FILE_NAME;
     return 0;
 }
 
@@ -108,7 +107,7 @@ int ISCSIEPFile::getTBLFilePath(std::string& filePath) const {
         EP_LOG_ERR(110, "Failed to get volume ID. path: %s", path.c_str());
         return EP_ERR_NO_PATH;
     }
-    filePath = volumeFile(*id, "EP_TBL");
+    filePath = volumeFile(*id, EP_TBL_FILE_NAME);
     return 0;
 }
 
@@ -122,13 +121,12 @@ int ISCSIEPFile::getFRIFilePath(std::string& filePath) const {
         EP_LOG_ERR(133, "Failed to get volume ID. path: %s", path.c_str());
         return EP_ERR_NO_PATH;
     }
-    filePath = volumeFile(*id, "EP_FRI");
+    filePath = volumeFile(*id, EP_FRI_FILE_NAME);
     return 0;
 }
 
 int ISCSIEPFile::getDATFilePath(unsigned int extentSize, unsigned long long extentAddress,
                                 std::string& filePath) const {
-    constexpr unsigned int bitsPerFile = 42;  // each data file holds 4 TiB
     const std::optional<int> id = volumeIdIn(path);
     if (!id) {
         EP_LOG_ERR(153, "Failed to get DAT file path. path: %s", path.c_str());
@@ -138,9 +136,9 @@ int ISCSIEPFile::getDATFilePath(unsigned int extentSize, unsigned long long exte
         EP_LOG_ERR(157, "Failed to get volume ID. path: %s", path.c_str());
         return EP_ERR_NO_PATH;
     }
-    const std::string number = std::to_string((extentSize * extentAddress) >> bitsPerFile);
-    const std::string zeros(number.size() < 5 ? 5 - number.size() : 0, '0');
-    filePath = volumeFile(*id, "EP_DAT_" + zeros + number);
+    const std::string number = std::to_string(extentSize * extentAddress / EP_DAT_FILE_SPAN);
+    const std::string zeros(number.size() < EP_DAT_NUMBER_DIGITS ? EP_DAT_NUMBER_DIGITS - number.size() : 0, '0');
+    filePath = volumeFile(*id, EP_DAT_FILE_PREFIX + zeros + number);
     return 0;
 }
 
@@ -151,7 +149,7 @@ int ISCSIEPFile::getMAPFilePath(unsigned int lid, std::string& filePath) const {
         EP_LOG_ERR(180, "Failed to get LUN conf info. path: %s", path.c_str());
         return error;
     }
-    filePath = lun.rootPath + "/@iSCSI/LUN/" + GetLUNTypeInString(lun.type) + lun.uuid + lun.name + "_00000";
+    filePath = lun.rootPath + EP_MAP_FOLDER + lun.getTypeName() + lun.uuid + lun.name + "_00000";
     return 0;
 }
 

@@ -13,6 +13,7 @@
 #include "EPLayout.h"
 #include "EPLookup.h"
 #include "LittleEndian.h"
+#include "etc/ISCSIEPFormat.h"
 #include "etc/ISCSIEPLog.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
@@ -41,20 +42,14 @@ constexpr EPLookupIdentity countLookup = EPLookupIdentity(__FILE_NAME__, "getEnt
                                              .seekFailsAt(214)
                                              .readFailsAt(215);
 
-// Bits 48 to 51 count in both fields until the program that writes map files settles to which they belong.
-constexpr std::uint64_t extentAddressMask = 0x000FFFFFFFFFFFFF;
-constexpr std::uint64_t poolNumberMask = 0x0FFF000000000000;
-constexpr unsigned int poolNumberShift = 48;
-
 ISCSIEPMapEntryInfo decodeEntry(const unsigned char* bytes) {
     const std::uint64_t entry = le64(bytes);
-    const auto flag = [entry](unsigned int bit) { return ((entry >> bit) & 1U) != 0; };
-    return {entry & extentAddressMask,
-            static_cast<unsigned int>((entry & poolNumberMask) >> poolNumberShift),
-            flag(63),
-            flag(62),
-            flag(61),
-            flag(60)};
+    return {entry & EP_MAP_ENTRY_ADDRESS_MASK,
+            static_cast<unsigned int>((entry & EP_MAP_ENTRY_POOL_MASK) >> EP_MAP_ENTRY_POOL_SHIFT),
+            (entry & EP_MAP_ENTRY_MAPPED) != 0,
+            (entry & EP_MAP_ENTRY_VPUSHED) != 0,
+            (entry & EP_MAP_ENTRY_VPULLED) != 0,
+            (entry & EP_MAP_ENTRY_SYNCED) != 0};
 }
 
 /// Appends the text of the UUID at `bytes` to `list`. Returns 0 or EP_ERR_BAD_UUID.

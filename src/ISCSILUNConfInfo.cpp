@@ -70,13 +70,21 @@ int ISCSILUNConfInfo::loadFromConfig() {
     return 0;
 }
 
+std::string ISCSILUNConfInfo::getErrorText(int error) {
+    const ErrnoKeeper keeper;
+    const char* text = KELPiSCSIStrError(error);
+    return text != nullptr ? text : "";
+}
+
+std::string ISCSILUNConfInfo::getTypeName() const { return GetLUNTypeInString(type); }
+
 std::string ISCSILUNConfInfo::toString() const {
     return LineText()
         .dec("lid", lid)
         .dec("extent_size", extentSize, GetSizeInString(extentSize))
         .dec("size", size, GetSizeInString(size))
         .text("restore time", GetTimeInString(restoreTime))
-        .text("type", GetLUNTypeInString(type))
+        .text("type", getTypeName())
         .text("uuid", uuid)
         .text("rootpath", rootPath)
         .text("name", name)

@@ -45,6 +45,7 @@ extern "C" __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsig
 }
 
 extern "C" __attribute__((visibility("default"))) const char* KELPiSCSIStrError(int code) {
+    errno = EDOM;
     return code == -77 ? "no such thing" : nullptr;
 }
 
@@ -64,6 +65,9 @@ TEST(LunConf, ARecordIsLoadedWholeOrNotAtAll) {
     EXPECT_EQ(Lines{"iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig Failed to get LUN config by LUN ID. info: " + line +
                     ". error: -77 (no such thing)"},
               takeLog());
+    EXPECT_EQ(EIO, errno);
+    EXPECT_EQ("no such thing", ISCSILUNConfInfo::getErrorText(-77));
+    EXPECT_EQ("", ISCSILUNConfInfo::getErrorText(4));
     EXPECT_EQ(EIO, errno);
     answer(0xa1b2c3d4, 0xf1e2d3c4b5a69788, -0x0e1d2c3c);
     EXPECT_EQ(0, lun.loadFromConfig());
@@ -106,6 +110,7 @@ TEST(LunConf, TypesAreNamedByEqualityOnlyAndByteCountsSplitIntoUnits) {
     ISCSILUNConfInfo lun;
     for (lun.type = -2; lun.type < 2000; ++lun.type) {
         const std::string name = names.count(lun.type) > 0 ? names.at(lun.type) : "UNKNOWN";
+        EXPECT_EQ(name, lun.getTypeName()) << lun.type;
         EXPECT_NE(std::string::npos, lun.toString().find(" ,type: " + name + " ,uuid")) << lun.type;
     }
     for (const auto& [count, text] : counts) {

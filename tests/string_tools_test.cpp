@@ -1,3 +1,5 @@
+#include <map>
+
 #include "../src/DumpText.h"
 #include "Support.h"
 #include "etc/ISCSIQuorinStringTool.h"
@@ -32,6 +34,20 @@ TEST(StringTools, BytesBecomeHexadecimalAndUUIDTextAndNoBytesAreRefused) {
         EXPECT_EQ(0, GetHexInString(all.data(), length, text));
         EXPECT_EQ(expected.substr(0, 2 * std::size_t{length}), text);
     }
+}
+
+TEST(ErrorNames, AreThoseOfTheLibrarysOwnCodesAndOfNoOthers) {
+    const std::map<int, std::string> names = {
+        {18990003, "EP_ERR_BAD_ARGUMENT"}, {18990038, "EP_ERR_OPEN_FAILED"},     {18990039, "EP_ERR_READ_FAILED"},
+        {18990041, "EP_ERR_SEEK_FAILED"},  {18990209, "EP_ERR_BAD_UUID"},        {18990400, "EP_ERR_WRONG_FILE_TYPE"},
+        {18990401, "EP_ERR_NO_PATH"},      {18990507, "EP_ERR_BAD_EXTENT_SIZE"},
+    };
+    for (int code = 18990000; code < 18990600; ++code) {
+        const char* name = GetErrorName(code);
+        EXPECT_EQ(names.count(code) > 0 ? names.at(code) : "", name != nullptr ? name : "") << code;
+    }
+    EXPECT_EQ(nullptr, GetErrorName(0));
+    EXPECT_EQ(nullptr, GetErrorName(9001));
 }
 
 TEST(StringTools, LongLabelsAndSectionNamesKeepTheDumpInShape) {

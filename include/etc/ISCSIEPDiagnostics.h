@@ -1,4 +1,4 @@
-// What every public header needs: error codes, and the mark of an exported class.
+// What every public header needs: error codes and their names, and the mark of an exported class.
 #pragma once
 
 /// Marks a class as part of the shared library's interface.
@@ -17,5 +17,29 @@ inline constexpr int EP_ERR_BAD_UUID = 18990209;         ///< 16 bytes could not
 inline constexpr int EP_ERR_WRONG_FILE_TYPE = 18990400;  ///< HEAD[0] names another type than the operation needs
 inline constexpr int EP_ERR_NO_PATH = 18990401;          ///< the path of an EP file could not be worked out
 inline constexpr int EP_ERR_BAD_EXTENT_SIZE = 18990507;  ///< an extent size is zero, or more than memory holds
+
+/// The name of one of these codes ("EP_ERR_OPEN_FAILED"); null for 0 and for any other code.
+inline const char* GetErrorName(int error) {
+    switch (error) {
+        case EP_ERR_BAD_ARGUMENT:
+            return "EP_ERR_BAD_ARGUMENT";
+        case EP_ERR_OPEN_FAILED:
+            return "EP_ERR_OPEN_FAILED";
+        case EP_ERR_READ_FAILED:
+            return "EP_ERR_READ_FAILED";
+        case EP_ERR_SEEK_FAILED:
+            return "EP_ERR_SEEK_FAILED";
+        case EP_ERR_BAD_UUID:
+            return "EP_ERR_BAD_UUID";
+        case EP_ERR_WRONG_FILE_TYPE:
+            return "EP_ERR_WRONG_FILE_TYPE";
+        case EP_ERR_NO_PATH:
+            return "EP_ERR_NO_PATH";
+        case EP_ERR_BAD_EXTENT_SIZE:
+            return "EP_ERR_BAD_EXTENT_SIZE";
+        default:
+            return nullptr;
+    }
+}
 
 }  // namespace ISCSI::TOOL

@@ -1,0 +1,45 @@
+// What the format of EP files fixes, beside the header block: the bits of a map entry, how much a data file and a map's
+// pool list hold, and where the files lie. Whoever needs one of these facts takes it from here.
+#pragma once
+
+namespace ISCSI::TOOL {
+
+/// Bytes of a stored map entry, a little-endian number of 64 bits. Its flags:
+inline constexpr unsigned int EP_MAP_ENTRY_SIZE = 8;
+inline constexpr unsigned long long EP_MAP_ENTRY_MAPPED = 1ULL << 63;
+inline constexpr unsigned long long EP_MAP_ENTRY_VPUSHED = 1ULL << 62;
+inline constexpr unsigned long long EP_MAP_ENTRY_VPULLED = 1ULL << 61;
+inline constexpr unsigned long long EP_MAP_ENTRY_SYNCED = 1ULL << 60;
+
+/// Its other bits: extent address and pool number. Bits 48 to 51 count in both, until the program that writes map files
+/// settles to which they belong. Taking them out of one of these two masks settles it, everything else follows.
+inline constexpr unsigned long long EP_MAP_ENTRY_ADDRESS_MASK = 0x000FFFFFFFFFFFFF;
+inline constexpr unsigned long long EP_MAP_ENTRY_POOL_MASK = 0x0FFF000000000000;
+
+/// The bits that count in both fields, 0 once that is settled; and the place of the pool number's lowest bit.
+inline constexpr unsigned long long EP_MAP_ENTRY_AMBIGUOUS_MASK = EP_MAP_ENTRY_ADDRESS_MASK & EP_MAP_ENTRY_POOL_MASK;
+inline constexpr unsigned int EP_MAP_ENTRY_POOL_SHIFT = __builtin_ctzll(EP_MAP_ENTRY_POOL_MASK);
+
+static_assert((EP_MAP_ENTRY_ADDRESS_MASK | EP_MAP_ENTRY_POOL_MASK) == EP_MAP_ENTRY_SYNCED - 1,
+              "every bit below the flags belongs to a field");
+
+/// How many pool UUIDs a map file holds at most.
+inline constexpr unsigned int EP_POOL_COUNT_MAX = 1024;
+
+/// Bytes of its volume that a data file stands for: data file number N holds those from N times as many on.
+inline constexpr unsigned long long EP_DAT_FILE_SPAN = 1ULL << 42;
+
+/// The names of the files. The number of a data file follows in decimal, of at least five digits.
+inline constexpr char EP_JNL_FILE_NAME[] = "EP_JNL";
+inline constexpr char EP_TBL_FILE_NAME[] = "EP_TBL";
+inline constexpr char EP_FRI_FILE_NAME[] = "EP_FRI";
+inline constexpr char EP_DAT_FILE_PREFIX[] = "EP_DAT_";
+inline constexpr unsigned int EP_DAT_NUMBER_DIGITS = 5;
+
+/// Their folders, each with the slashes around it.
+inline constexpr char EP_JNL_FOLDER[] = "/var/db/iscsi/";  ///< the machine's journal
+inline constexpr char EP_VOLUME_PREFIX[] = "/volume";      ///< a volume, its number follows
+inline constexpr char EP_VOLUME_FOLDER[] = "/@iSCSI/EP/";  ///< on a volume: table, free-index and data files
+inline constexpr char EP_MAP_FOLDER[] = "/@iSCSI/LUN/";    ///< below a LUN's root path: its map file
+
+}  // namespace ISCSI::TOOL
