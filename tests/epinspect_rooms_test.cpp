@@ -9,14 +9,14 @@
 #include <sstream>
 #include <thread>
 
-#include "CommandLine.h"
+#include "frame/CommandLine.h"
 #include "InProcess.h"
-#include "Numbers.h"
-#include "Output.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "ProgramTest.h"
-#include "Progress.h"
-#include "Session.h"
-#include "map/MapChart.h"
+#include "frame/Progress.h"
+#include "frame/Session.h"
+#include "commands/MapChart.h"
 #include "map/MapRuns.h"
 
 using namespace epinspect;

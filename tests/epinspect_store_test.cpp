@@ -24,12 +24,12 @@ __attribute__((visibility("default"))) ssize_t readAroundBadPosition(int descrip
 
 namespace {
 
-using epinspect::positionOf;
+using inspection::positionOf;
 
 constexpr std::uint64_t mapped = 0x8000000000000000, MiB = 1048576, TiB4 = 4398046511104;
 
 std::string placeIn(std::uint64_t address, std::uint32_t extentSize) {
-    const auto place = epinspect::placeOf(address, extentSize);
+    const auto place = inspection::placeOf(address, extentSize);
     if (!place) return "none";
     return std::to_string(place->dataFile) + " " + std::to_string(place->inFile) + " " + std::to_string(place->next);
 }

@@ -5,9 +5,9 @@
 #include <exception>
 #include <new>
 
-#include "CommandLine.h"
-#include "Output.h"
 #include "commands/Commands.h"
+#include "frame/CommandLine.h"
+#include "frame/Output.h"
 
 namespace epinspect {
 

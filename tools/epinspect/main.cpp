@@ -1,8 +1,8 @@
 // epinspect: shows what EP files hold, and never writes one.
 #include <clocale>
 
-#include "Output.h"
 #include "Program.h"
+#include "frame/Output.h"
 
 int main(int argc, char** argv) {
     epinspect::prepareStreams();

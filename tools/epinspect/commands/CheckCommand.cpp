@@ -3,6 +3,8 @@
 
 #include "check/StoreCheck.h"
 #include "commands/Commands.h"
+#include "frame/Numbers.h"
+#include "commands/FindingOutput.h"
 
 namespace epinspect {
 
@@ -25,7 +27,12 @@ void addCheck(Command& parent, Session& session) {
                 "Bytes of an extent, for maps whose LUN is not known; K, M, G or KiB, MiB, GiB may follow",
                 options->extentSize, parseExtentSize)
         .flag("--json", "One JSON object a finding, then one that sums up", session.json)
-        .action([options, &session] { StoreCheck(session, *options).run(); });
+        .action([options, &session] {
+            FindingOutput output(session);
+            Report report([&output](const Finding& finding) { output.print(finding); });
+            StoreCheck(session, *options, report).run();
+            output.printSummary(report);
+        });
 }
 
 }  // namespace epinspect

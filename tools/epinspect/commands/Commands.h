@@ -1,8 +1,8 @@
 // The subcommands. Each function adds one to `parent`: its arguments and options, and what is done when it is typed.
 #pragma once
 
-#include "CommandLine.h"
-#include "Session.h"
+#include "frame/CommandLine.h"
+#include "frame/Session.h"
 
 namespace epinspect {
 

@@ -2,12 +2,12 @@
 #include <cerrno>
 #include <memory>
 
-#include "Json.h"
-#include "Output.h"
 #include "commands/Commands.h"
+#include "commands/MapOutput.h"
+#include "frame/Json.h"
+#include "frame/Output.h"
 #include "map/MapDiff.h"
-#include "map/MapOutput.h"
-#include "map/RunWalk.h"
+#include "map/MapWalk.h"
 #include "store/OpenMap.h"
 
 namespace epinspect {
@@ -38,12 +38,12 @@ DifferenceName nameOf(Difference difference) {
 }
 
 /// A side of a difference; of entries that are no run the first one, which the mark behind it says.
-void writeSide(Text& line, const DiffRun::Side& side, std::uint64_t count) {
+void writeSide(LineBuffer& line, const DiffRun::Side& side, std::uint64_t count) {
     writeEntries(line, *side.entry, side.isRun ? count : 1);
     if (!side.isRun) line.add(" ...");
 }
 
-void printRun(Text& line, const DiffRun& run) {
+void printRun(LineBuffer& line, const DiffRun& run) {
     line.clear();
     writeRange(line, run.first, run.count);
     line.add(": ", nameOf(run.difference).text, ": ");
@@ -101,7 +101,9 @@ bool readBlock(Session& session, const std::string& name, const OpenedMap& map, 
     const auto count = std::min(wanted, map.entries - std::min(first, map.entries));
     const int error = map.file->getMapEntries(first, count, block);
     const int reason = errno;
-    return allCame(session, name, first + (error == 0 ? block.size() : 0), error, reason, block.size() == count);
+    const auto failure = endOfRead(name, first + (error == 0 ? block.size() : 0), error, reason, block.size() == count);
+    if (failure) session.failed(*failure);
+    return !failure;
 }
 
 /// Compares both maps and gives runs of differences to each(run). Returns whether all entries could be read.
@@ -109,13 +111,12 @@ template <typename Each>
 bool compareMaps(const DiffOptions& options, Session& session, const OpenedMap (&maps)[2], std::uint64_t entries,
                  Each&& each) {
     constexpr std::uint64_t blockSize = 4096;
-    Progress progress("entries", entries, Progress::Beside::listing);
     std::vector<MapEntry> a;
     std::vector<MapEntry> b;
     MapDiff diff;
     bool complete = true;
     for (std::uint64_t first = 0; first < entries && complete; first += blockSize) {
-        progress.show(first);
+        session.progress("entries", first, entries);
         const auto wanted = std::min(entries - first, blockSize);
         complete = readBlock(session, options.files[0], maps[0], first, wanted, a) &&
                    readBlock(session, options.files[1], maps[1], first, wanted, b);
@@ -131,7 +132,7 @@ void run(const DiffOptions& options, Session& session) {
     DiffSummary summary;
     summary.entries = std::max(maps[0].entries, maps[1].entries);
     Json json(options.files[0]);
-    Text line;
+    LineBuffer line;
     const auto each = [&](const DiffRun& run) {
         session.differences = true;
         summary.add(run);

@@ -1,11 +1,12 @@
 // epinspect dump: header blocks as the library shows them.
 #include <memory>
 
-#include "Json.h"
-#include "Output.h"
 #include "commands/Commands.h"
+#include "frame/Json.h"
+#include "frame/Output.h"
 #include "store/Doubts.h"
 #include "store/FileKind.h"
+#include "store/HeaderFields.h"
 
 namespace epinspect {
 
@@ -25,25 +26,50 @@ const FileKind* kindFromType(Session& session, const std::string& name, const st
     if (!session.succeeded(head.parseHead0(), {name, ""})) return nullptr;
     const FileKind* kind = kindByType(head.head0Type);
     if (kind != nullptr) return kind;
-    complain(name + ": neither name nor type tells its kind, only HEAD[0] is shown");
+    session.remark(name, "neither name nor type tells its kind, only HEAD[0] is shown");
     return &headKind;
+}
+
+const FileKind* parseKind(const std::string& name) {
+    const FileKind* kind = kindCalled(name);
+    if (kind == nullptr) throw UsageError{"not one of " + kindNames()};
+    return kind;
+}
+
+void writeField(Json& object, const HeaderField& field) {
+    switch (field.form) {
+        case HeaderField::Form::number:
+        case HeaderField::Form::time:
+            object.number(std::string_view(field.name), field.number);
+            break;
+        case HeaderField::Form::hexadecimal:
+            object.hexadecimal(std::string_view(field.name), field.number);
+            break;
+        case HeaderField::Form::text:
+            object.text(field.name, field.texts[0]);
+            break;
+        case HeaderField::Form::texts:
+            object.texts(field.name, field.texts);
+            break;
+    }
 }
 
 void dumpFile(const DumpOptions& options, Session& session, const std::string& name) {
     const std::optional<std::string> path = session.openablePath(name);
     if (!path) return;
-    const FileKind* byName = options.kind == nullptr ? kindByName(session.targetPath(name)) : nullptr;
+    const FileKind* byName = options.kind == nullptr ? kindByName(session.root.targetPath(name)) : nullptr;
     const FileKind* kind = options.kind != nullptr ? options.kind : byName;
     if (kind == nullptr) kind = kindFromType(session, name, *path);
     if (kind == nullptr) return;
     const auto file = kind->make(*path);
     if (!session.succeeded(kind->parse(*file), {name, ""})) return;
-    sayKindDoubts(*file, name, byName);
-    sayDataStartDoubts(*file, name);
-    if (kind->type == tool::EP_FILE_TYPE_MAP) sayPartialEntry(*file, name);
+    remarkOnKind(session, *file, name, byName);
+    remarkOnDataStart(session, *file, name);
+    if (kind->type == tool::EP_FILE_TYPE_MAP) remarkOnPartialEntry(session, *file, name);
     if (session.json) {
         Json object(name);
-        kind->writeMembers(object.begin(kind->name), *file);
+        object.begin(kind->name);
+        for (const HeaderField& field : headerFieldsOf(*file)) writeField(object, field);
         object.end();
         return;
     }

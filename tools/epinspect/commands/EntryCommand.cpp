@@ -2,10 +2,11 @@
 #include <algorithm>
 #include <memory>
 
-#include "Json.h"
-#include "Output.h"
 #include "commands/Commands.h"
-#include "map/MapOutput.h"
+#include "commands/MapOutput.h"
+#include "frame/Json.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "map/MapWalk.h"
 #include "store/Doubts.h"
 
@@ -35,15 +36,16 @@ void printRange(const EntryOptions& options, Session& session, Json* json, tool:
     unsigned long long count = 0;
     if (range.first < range.last && !session.succeeded(file.getEntryCount(count), {options.file, ""})) return;
     const std::uint64_t end = std::clamp<std::uint64_t>(count, range.first, range.last);
-    Progress progress("entries", end - range.first, Progress::Beside::listing);
-    const WalkEnd walk = walkMap(file, range, progress, [&](std::uint64_t index, const auto& entries) {
+    const WalkEnd walk = walkMap(file, range, [&](std::uint64_t index, const auto& entries) {
         for (const MapEntry& entry : entries) printEntry(json, file, index++, entry);
+        session.progress("entries", index - range.first, end - range.first + 1);
     });
     const std::uint64_t next = range.first + walk.met;
     const std::string place = "entry " + std::to_string(next);
-    if (!session.succeeded(walk.error, {options.file, place}, walk.reason) || next - 1 == range.last) return;
+    if (walk.error != 0) return session.failed({{options.file, place}, walk.error, walk.reason, {}});
+    if (next - 1 == range.last) return;
     if (!session.succeeded(file.getEntryCount(count), {options.file, place})) return;
-    session.failBeyondEnd(options.file, place, count);
+    session.failed(pastEnd(options.file, place, count));
 }
 
 void run(const EntryOptions& options, Session& session) {
@@ -51,7 +53,7 @@ void run(const EntryOptions& options, Session& session) {
     if (!path) return;
     tool::ISCSIEPFileMAP file(*path);
     if (!session.succeeded(file.parseHead0(), {options.file, ""})) return;
-    sayDataStartDoubts(file, options.file);
+    remarkOnDataStart(session, file, options.file);
     Json json(options.file);
     for (const Range range : options.ranges) printRange(options, session, session.json ? &json : nullptr, file, range);
 }

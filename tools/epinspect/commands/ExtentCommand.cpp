@@ -6,10 +6,9 @@
 #include <memory>
 #include <vector>
 
-#include "Numbers.h"
-#include "Output.h"
-#include "Progress.h"
 #include "commands/Commands.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "store/Doubts.h"
 #include "store/FileSize.h"
 
@@ -30,16 +29,15 @@ struct ExtentOptions {
 std::optional<std::uint64_t> extentCount(const tool::ISCSIEPFileDAT& file, std::uint32_t extentSize) {
     const auto size = sizeOf(file.path);
     if (!size) return std::nullopt;
-    return *size < file.head0DataStartOffset ? 0 : (*size - file.head0DataStartOffset) / extentSize;
+    return payloadOf(file, *size) / extentSize;
 }
 
 /// Prints the extent block by block, so that its size does not matter. Returns 0 or the code of the read that failed.
-int printExtent(const ExtentOptions& options, tool::ISCSIEPFileDAT& file) {
+int printExtent(const ExtentOptions& options, Session& session, tool::ISCSIEPFileDAT& file) {
     constexpr unsigned int blockSize = 256U << 10U;
     const unsigned int size = std::min(options.extentSize, blockSize);
     std::vector<unsigned char> bytes(size);
     std::string digits(options.raw ? 0 : 2 * std::size_t{size}, '\0');
-    Progress progress("bytes", options.extentSize, Progress::Beside::listing);
     for (unsigned int offset = 0; offset < options.extentSize;) {
         const unsigned int length = std::min(options.extentSize - offset, blockSize);
         const int error = file.getExtentBytes(options.index, options.extentSize, offset, length, bytes.data());
@@ -51,7 +49,7 @@ int printExtent(const ExtentOptions& options, tool::ISCSIEPFileDAT& file) {
             print({digits.data(), 2 * std::size_t{length}});
         }
         offset += length;
-        progress.show(offset);
+        session.progress("bytes", offset, options.extentSize);
     }
     if (!options.raw) print("\n");
     return 0;
@@ -65,14 +63,14 @@ void run(const ExtentOptions& options, Session& session) {
     const std::string place = "extent " + std::to_string(options.index);
     // Nothing is read yet: this tells whether there can be extents at all.
     if (!session.succeeded(file.getExtentBytes(0, options.extentSize, 0, 0, nullptr), {options.file, place})) return;
-    sayDataStartDoubts(file, options.file);
+    remarkOnDataStart(session, file, options.file);
     const auto count = extentCount(file, options.extentSize);
     if (!count) {
         session.succeeded(tool::EP_ERR_OPEN_FAILED, {options.file, place});
     } else if (options.index >= *count) {
-        session.failBeyondEnd(options.file, place, *count);
+        session.failed(pastEnd(options.file, place, *count));
     } else {
-        session.succeeded(printExtent(options, file), {options.file, place});
+        session.succeeded(printExtent(options, session, file), {options.file, place});
     }
 }
 

@@ -1,15 +1,16 @@
 // epinspect find: which map entries point at given extents or at a pool.
 #include <memory>
 
-#include "Json.h"
-#include "Output.h"
 #include "commands/Commands.h"
-#include "map/MapOutput.h"
-#include "map/RunWalk.h"
+#include "commands/MapOutput.h"
+#include "frame/Json.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
+#include "map/MapWalk.h"
+#include "map/RunSearch.h"
 #include "store/ChosenFiles.h"
 #include "store/Luns.h"
 #include "store/OpenMap.h"
-#include "store/RunSearch.h"
 
 namespace epinspect {
 
@@ -30,11 +31,11 @@ struct SearchedMap {
     const Lun* lun;
     const ISCSI::TOOL::ISCSIEPFileMAP& file;
     Json json;
-    Text line;
+    LineBuffer line;
 };
 
 void printMatch(SearchedMap& map, const RunMatch& match) {
-    Text& line = map.line;
+    LineBuffer& line = map.line;
     line.clear();
     line.add(forReader(map.name), ": ");
     if (map.lun != nullptr) line.add("LUN ").decimal(map.lun->record.lid).add(": ");
@@ -60,7 +61,7 @@ void searchMap(const FindOptions& options, Session& session, const StoreFile& fi
     const OpenedMap map = openMap(session, file.path);
     if (!map.file) return;
     ++summary.files;
-    SearchedMap searched = {file.path, file.lun, *map.file, Json(file.path), Text()};
+    SearchedMap searched = {file.path, file.lun, *map.file, Json(file.path), LineBuffer()};
     const auto each = [&](const MapRun& run) {
         summary.entries += run.count;
         options.search.in(run, [&](const RunMatch& match) {
@@ -74,7 +75,9 @@ void searchMap(const FindOptions& options, Session& session, const StoreFile& fi
         });
     };
     if (map.entries == 0) return;
-    walkRuns(session, file.path, *map.file, {0, map.entries - 1}, Progress::Beside::listing, each);
+    const auto progress = [&](std::uint64_t done) { session.progress("entries", done, map.entries); };
+    const auto failure = walkRuns(file.path, *map.file, {0, map.entries - 1}, progress, each);
+    if (failure) session.failed(*failure);
 }
 
 void printSummary(const FindSummary& summary) {

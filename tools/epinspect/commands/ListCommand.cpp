@@ -4,9 +4,10 @@
 #include <algorithm>
 #include <memory>
 
-#include "Json.h"
-#include "Output.h"
 #include "commands/Commands.h"
+#include "frame/Json.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "store/Doubts.h"
 #include "store/Store.h"
 
@@ -21,10 +22,10 @@ std::optional<std::uint64_t> entriesOf(Session& session, const StoreFile& file) 
     if (file.missing || file.kind->type != tool::EP_FILE_TYPE_MAP) return std::nullopt;
     tool::ISCSIEPFileMAP map(file.hostPath);
     if (!session.succeeded(map.parseHead0(), {file.path, ""})) return std::nullopt;
-    sayKindDoubts(map, file.path, file.kind);
+    remarkOnKind(session, map, file.path, file.kind);
     if (map.head0Type != tool::EP_FILE_TYPE_MAP) return std::nullopt;
-    sayDataStartDoubts(map, file.path);
-    sayPartialEntry(map, file.path);
+    remarkOnDataStart(session, map, file.path);
+    remarkOnPartialEntry(session, map, file.path);
     unsigned long long entries = 0;
     if (!session.succeeded(map.getEntryCount(entries), {file.path, ""})) return std::nullopt;
     return entries;
@@ -62,14 +63,14 @@ void writeFile(const StoreFile& file, const std::optional<std::uint64_t>& entrie
 
 /// Says why no LUN of `lids` is known: a failure when the user asked for these.
 void sayNoLuns(Session& session, Range lids, bool askedFor) {
-    const QuietLog quiet;
+    const Trial trial(session);
     Lun lun;
     const int error = loadLun(session, static_cast<std::uint32_t>(lids.first), lun);
     if (askedFor) {
         session.succeeded(error, subjectOf(lids));
     } else {
-        complain(subjectOf(lids).part + ": none is known: " + platformText(error) + " (code " + std::to_string(error) +
-                 ")");
+        complain(subjectOf(lids).part + ": none is known: " + tool::ISCSILUNConfInfo::getErrorText(error) + " (code " +
+                 std::to_string(error) + ")");
     }
 }
 

@@ -2,12 +2,12 @@
 #include <memory>
 #include <vector>
 
-#include "Json.h"
-#include "Numbers.h"
-#include "Output.h"
 #include "commands/Commands.h"
+#include "commands/MapOutput.h"
 #include "commands/PlaceOptions.h"
-#include "map/MapOutput.h"
+#include "frame/Json.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "map/MapWalk.h"
 #include "store/DataFiles.h"
 #include "store/LunMap.h"
@@ -50,7 +50,7 @@ std::vector<Candidate> candidatesIn(const DataFile& data, const ExtentPlace& pla
     std::vector<Candidate> candidates;
     for (const CountFrom way : {CountFrom::file, CountFrom::volume}) {
         if (countFrom.value_or(way) != way) continue;
-        const std::uint64_t extent = way == CountFrom::file ? place.inFile : place.inVolume;
+        const std::uint64_t extent = place.counted(way);
         const auto inData = positionOf(0, extent, lun.extentSize, remainder);
         Candidate candidate = {way, extent, std::nullopt, inData && *inData < data.dataSize};
         if (data.file != nullptr) {
@@ -61,10 +61,10 @@ std::vector<Candidate> candidatesIn(const DataFile& data, const ExtentPlace& pla
     return candidates;
 }
 
-/// Says what the way of counting rests on, and takes away a candidate that it rules out.
-void settleCounting(Byte& byte, const std::optional<CountFrom>& countFrom) {
-    if (countFrom) {
-        byte.assumed.emplace_back(*countFrom == CountFrom::file
+/// Says what the way of counting rests on.
+void settleCounting(Byte& byte, const PlaceChoice& choice, const std::optional<CountFrom>& counting) {
+    if (choice.countFrom) {
+        byte.assumed.emplace_back(*choice.countFrom == CountFrom::file
                                       ? "extents counted within the data file, as --count-from says"
                                       : "extents counted from the volume's start, as --count-from says");
         return;
@@ -73,33 +73,33 @@ void settleCounting(Byte& byte, const std::optional<CountFrom>& countFrom) {
     const Candidate& inVolume = byte.candidates[1];
     if (inFile.extent == inVolume.extent || !inFile.inside) return;
     byte.assumed.emplace_back(
-        inVolume.inside ? "from where extents are counted is open, both places lie inside the data file (--count-from "
-                          "chooses)"
-                        : "extents counted within the data file (counted from the volume's start they would lie behind "
-                          "its end)");
+        !counting ? "from where extents are counted is open, both places lie inside the data file (--count-from "
+                    "chooses)"
+                  : "extents counted within the data file (counted from the volume's start they would lie behind "
+                    "its end)");
 }
 
 /// Finds the candidates for a byte whose entry is mapped; reports why there is none, or none that can be read.
 void findCandidates(const PlaceChoice& choice, Session& session, const LunMap& lun, DataFiles& files, Byte& byte) {
     const Subject subject = lun.subject(partOf(byte));
     const auto address = extentAddressOf(byte.entry, choice);
-    if (!address) return session.fail(subject, openAddressText(byte.entry), tool::EP_ERR_NO_PATH);
-    if (hasOpenBits(byte.entry)) {
+    if (!address) return session.fail(subject, ambiguousAddressText(byte.entry), tool::EP_ERR_NO_PATH);
+    if (isAmbiguous(byte.entry)) {
         byte.assumed.push_back("extent " + std::to_string(*address) + ", as --address-bits says");
     }
     const auto place = placeOf(*address, lun.extentSize);
     if (!place) {
-        session.succeeded(tool::EP_ERR_SEEK_FAILED, subject, 0);
+        session.failed({subject, tool::EP_ERR_SEEK_FAILED, 0, {}});
         return;
     }
-    const DataFile& data = files.at(*place);
+    const DataFile& data = files.at(place->dataFile);
     const Subject inData = {data.path.empty() ? lun.file : data.path, subject.part};
-    session.succeeded(data.error, inData, data.reason);
+    if (data.failure) session.failed({inData, data.failure->error, data.failure->reason, data.failure->what});
     if (data.path.empty()) return;
     byte.dataFile = data.path;
     byte.candidates = candidatesIn(data, *place, lun, byte.remainder, choice.countFrom);
-    settleCounting(byte, choice.countFrom);
-    if (data.error == 0 && !byte.candidates[0].inside) {
+    settleCounting(byte, choice, countingOf(*place, lun.extentSize, byte.remainder, data.dataSize, choice));
+    if (!data.failure && !byte.candidates[0].inside) {
         session.fail(inData, "beyond the end, the file holds " + std::to_string(data.dataSize) + " bytes of extents",
                      tool::EP_ERR_READ_FAILED);
     }
@@ -132,7 +132,7 @@ void writePlace(const LunMap& lun, const Byte& byte) {
 
 /// The byte's entry, which is known whatever comes after.
 void printEntry(const LunMap& lun, const Byte& byte) {
-    Text text;
+    LineBuffer text;
     const Subject subject = lun.subject(partOf(byte));
     text.add(forReader(subject.file), subject.file.empty() ? "" : " ", subject.part, ": entry ").decimal(byte.index);
     text.add(", byte ").decimal(byte.remainder).add(" of its extent\n");
@@ -146,7 +146,7 @@ void printPlaces(const Byte& byte) {
         const bool same = shown[0].extent == shown[1].extent;
         if (same || (shown[0].inside && !shown[1].inside)) shown.pop_back();
     }
-    Text text;
+    LineBuffer text;
     for (const Candidate& candidate : shown) {
         text.add(forReader(byte.dataFile), " position ");
         if (candidate.position) {
@@ -171,8 +171,8 @@ void printPlaces(const Byte& byte) {
 
 void locate(const PlaceChoice& choice, Session& session, const LunMap& lun, DataFiles& files, std::uint64_t offset) {
     Byte byte{offset, offset / lun.extentSize, static_cast<std::uint32_t>(offset % lun.extentSize), {}};
-    if (offset >= lun.size) return lun.failBeyondEnd(session, partOf(byte));
-    if (byte.index >= lun.entries) return lun.failBeyondMap(session, partOf(byte));
+    if (offset >= lun.size) return session.failed(lun.pastEnd(partOf(byte)));
+    if (byte.index >= lun.entries) return session.failed(lun.pastMap(partOf(byte)));
     const Subject inMap = {lun.file, lun.subject(partOf(byte)).part};
     if (!session.succeeded(lun.map->getMapEntry(byte.index, byte.entry), inMap)) return;
     if (!session.json) printEntry(lun, byte);
@@ -189,9 +189,9 @@ void locate(const PlaceChoice& choice, Session& session, const LunMap& lun, Data
 }
 
 void run(const LocateOptions& options, Session& session) {
-    const std::optional<LunMap> lun = openLunMap(session, options.place.lun, options.place.extentSize);
+    const std::optional<LunMap> lun = openLun(session, options.place);
     if (!lun) return;
-    DataFiles files(session, lun->targetPath, lun->extentSize);
+    DataFiles files(session, lun->targetPath, true);
     for (const std::uint64_t offset : options.offsets) locate(options.place.choice, session, *lun, files, offset);
 }
 

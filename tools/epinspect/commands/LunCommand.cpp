@@ -1,8 +1,10 @@
 // epinspect lun: the configuration of LUNs and where their map files lie.
 #include <memory>
 
-#include "Output.h"
 #include "commands/Commands.h"
+#include "frame/Json.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "store/Luns.h"
 
 namespace epinspect {
@@ -15,15 +17,25 @@ void printLun(const Session& session, const Lun& lun) {
         return;
     }
     Json object(lun.mapPath);
-    writeMembers(object.begin("lun"), lun.record);
-    object.text("typeName", typeNameOf(lun.record)).boolean("missing", !session.exists(lun.mapPath)).end();
+    object.begin("lun")
+        .number("lid", lun.record.lid)
+        .number("extentSize", lun.record.extentSize)
+        .number("size", lun.record.size)
+        .number("restoreTime", lun.record.restoreTime)
+        .number("type", lun.record.type)
+        .text("uuid", lun.record.uuid)
+        .text("rootPath", lun.record.rootPath)
+        .text("name", lun.record.name)
+        .text("typeName", lun.record.getTypeName())
+        .boolean("missing", !session.root.exists(lun.mapPath))
+        .end();
 }
 
 void printLuns(Session& session, Range range) {
     const auto print = [&session](const Lun& lun) { printLun(session, lun); };
     if (range.first < range.last && forEachLun(session, range, print)) return;
-    std::optional<QuietLog> quiet;
-    if (range.first < range.last) quiet.emplace();
+    std::optional<Trial> trial;
+    if (range.first < range.last) trial.emplace(session);
     // A single id; or none of the range exists, and the first one tells why.
     Lun lun;
     if (session.succeeded(loadLun(session, static_cast<std::uint32_t>(range.first), lun), subjectOf(range))) print(lun);

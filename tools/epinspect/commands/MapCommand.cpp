@@ -2,12 +2,13 @@
 #include <limits>
 #include <memory>
 
-#include "Json.h"
-#include "Output.h"
 #include "commands/Commands.h"
-#include "map/MapChart.h"
-#include "map/MapOutput.h"
-#include "map/RunWalk.h"
+#include "commands/MapChart.h"
+#include "commands/MapOutput.h"
+#include "frame/Json.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
+#include "map/MapWalk.h"
 #include "store/OpenMap.h"
 
 namespace epinspect {
@@ -50,14 +51,14 @@ void run(const MapOptions& options, Session& session) {
     tool::ISCSIEPFileMAP& file = *map.file;
     const std::uint64_t total = map.entries;
     if (options.first > 0 && options.first >= total) {
-        session.failBeyondEnd(options.file, "entry " + std::to_string(options.first), total);
+        session.failed(pastEnd(options.file, "entry " + std::to_string(options.first), total));
         return;
     }
     const std::uint64_t count = std::min(options.count, total - options.first);
     MapChart chart(options.first, count, outputWidth());
     MapSummary summary;
     Json json(options.file);
-    Text line;
+    LineBuffer line;
     const auto each = [&](const MapRun& run) {
         summary.add(run);
         if (options.chart) {
@@ -71,9 +72,11 @@ void run(const MapOptions& options, Session& session) {
             print(line.view());
         }
     };
-    const auto beside = options.chart ? Progress::Beside::nothing : Progress::Beside::listing;
+    session.listing = !options.chart;
     const Range range = {options.first, options.first + count - 1};
-    if (count > 0 && !walkRuns(session, options.file, file, range, beside, each)) return;
+    const auto progress = [&](std::uint64_t done) { session.progress("entries", done, count); };
+    const auto failure = count > 0 ? walkRuns(options.file, file, range, progress, each) : std::nullopt;
+    if (failure) return session.failed(*failure);
     if (session.json) {
         printSummary(json, summary);
     } else if (options.chart) {

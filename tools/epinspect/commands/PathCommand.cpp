@@ -5,9 +5,9 @@
 #include <limits>
 #include <memory>
 
-#include "Numbers.h"
-#include "Output.h"
 #include "commands/Commands.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "store/Luns.h"
 
 namespace epinspect {
@@ -33,7 +33,7 @@ Command& addKind(Command& path, Session& session, const Options& options, const 
         .argument("EPFILE", "An EP file of the volume; it is not opened", options->file, need)
         .action([options, &session, find] {
             std::string result;
-            const ISCSIEPFile file(session.targetPath(options->file));
+            const ISCSIEPFile file(session.root.targetPath(options->file));
             if (session.succeeded(find(file, result), {options->file, ""})) print(forReader(result) + "\n");
         });
 }

@@ -1,6 +1,6 @@
 #include "commands/PlaceOptions.h"
 
-#include "Numbers.h"
+#include "frame/Numbers.h"
 
 namespace epinspect {
 
@@ -19,7 +19,22 @@ CountFrom parseCountFrom(const std::string& text) {
     throw UsageError{"not file or volume"};
 }
 
+LunName parseLunName(const std::string& text) {
+    const std::string prefix = text.substr(0, 2);
+    const bool number = prefix == "0x" || prefix == "0X" ||
+                        (!text.empty() && text.find_first_not_of("0123456789") == std::string::npos);
+    if (number) return {parseNumber32(text), ""};
+    return {std::nullopt, text};
+}
+
 }  // namespace
+
+std::optional<LunMap> openLun(Session& session, const PlaceOptions& options) {
+    if (!options.lun.lid && !options.extentSize) {
+        throw UsageError{"--extent-size is missing: a map file does not tell it"};
+    }
+    return openLunMap(session, options.lun, options.extentSize);
+}
 
 void addLunArgument(Command& command, PlaceOptions& options) {
     command.argument("LUN", "LUN id, or the path of a map file (then --extent-size is needed)", options.lun,

@@ -4,7 +4,8 @@
 #include <cstdint>
 #include <optional>
 
-#include "CommandLine.h"
+#include "frame/CommandLine.h"
+#include "frame/Session.h"
 #include "store/ExtentPlace.h"
 #include "store/LunMap.h"
 
@@ -15,6 +16,9 @@ struct PlaceOptions {
     std::optional<std::uint32_t> extentSize;
     PlaceChoice choice;
 };
+
+/// Opens the map of the LUN; reports what fails. Throws UsageError.
+std::optional<LunMap> openLun(Session& session, const PlaceOptions& options);
 
 void addLunArgument(Command& command, PlaceOptions& options);
 void addPlaceOptions(Command& command, PlaceOptions& options);

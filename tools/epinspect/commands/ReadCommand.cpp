@@ -2,10 +2,10 @@
 #include <algorithm>
 #include <memory>
 
-#include "Numbers.h"
-#include "Output.h"
 #include "commands/Commands.h"
 #include "commands/PlaceOptions.h"
+#include "frame/Numbers.h"
+#include "frame/Output.h"
 #include "store/LunMap.h"
 #include "store/LunReader.h"
 
@@ -21,14 +21,22 @@ struct ReadOptions {
 
 void run(const ReadOptions& options, Session& session) {
     if (outputIsTerminal()) throw UsageError{"standard output is a terminal, not a file or a pipe"};
-    const std::optional<LunMap> lun = openLunMap(session, options.place.lun, options.place.extentSize);
+    const std::optional<LunMap> lun = openLun(session, options.place);
     if (!lun) return;
     const std::uint64_t there = lun->size - std::min(lun->size, options.offset);
     if (there == 0 && (options.offset > 0 || options.length > 0U)) {
-        return lun->failBeyondEnd(session, "byte " + std::to_string(options.offset));
+        return session.failed(lun->pastEnd("byte " + std::to_string(options.offset)));
     }
-    if (options.length > there) return lun->failBeyondEnd(session, "byte " + std::to_string(lun->size));
-    LunReader(session, *lun, options.place.choice, options.offset, options.length.value_or(there)).print();
+    if (options.length > there) return session.failed(lun->pastEnd("byte " + std::to_string(lun->size)));
+    const std::uint64_t length = options.length.value_or(there);
+    session.listing = false;
+    const auto write = [](const unsigned char* bytes, std::size_t count) {
+        print({reinterpret_cast<const char*>(bytes), count});
+    };
+    const std::uint64_t missing = LunReader(session, *lun, options.place.choice, options.offset, length, write).run();
+    if (missing == 0) return;
+    session.remark(textOf(lun->subject("")), std::to_string(missing) + " of " + std::to_string(length) +
+                                                 " bytes could not be read, zeros stand in their place");
 }
 
 }  // namespace

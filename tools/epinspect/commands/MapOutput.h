@@ -1,0 +1,26 @@
+// How entries and runs are written.
+#pragma once
+
+#include "frame/Inspection.h"
+#include "frame/Json.h"
+#include "frame/LineBuffer.h"
+#include "map/MapRuns.h"
+
+namespace epinspect {
+
+/// Appends "FIRST-LAST", or the one number when both are the same.
+void writeRange(LineBuffer& text, std::uint64_t first, std::uint64_t count);
+
+/// Appends what a run is whose first entry is `entry`: "hole", or flags, pool and extent addresses.
+void writeEntries(LineBuffer& text, const MapEntry& entry, std::uint64_t count);
+
+/// Appends the line of a run.
+void writeRun(LineBuffer& text, const MapRun& run);
+
+/// Writes the six members of an entry.
+void writeMembers(Json& object, const MapEntry& entry);
+
+/// Writes "first", "count", "entryOffset", and "hole" or the members of the first entry.
+void writeRun(Json& object, const MapRun& run, std::uint64_t entryOffset);
+
+}  // namespace epinspect

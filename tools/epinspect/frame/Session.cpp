@@ -1,0 +1,59 @@
+#include "frame/Session.h"
+
+#include <etc/ISCSIEPDiagnostics.h>
+
+#include "frame/Json.h"
+#include "frame/Output.h"
+#include "frame/UsageError.h"
+
+namespace epinspect {
+
+void Session::setRoot(const std::string& folder) {
+    const std::error_code error = root.set(folder);
+    if (error == std::errc::not_a_directory) throw UsageError{"not a folder"};
+    if (error) throw UsageError{error.message()};
+    quiet_.emplace();
+}
+
+void Session::failed(const Failure& failure) {
+    failed_ = true;
+    const std::string message = messageOf(failure);
+    if (json) {
+        Json object(failure.subject.file);
+        object.begin("error");
+        if (const char* name = ISCSI::TOOL::GetErrorName(failure.error)) {
+            object.text("error", name);
+        } else {
+            object.null("error");
+        }
+        object.number("code", failure.error).text("message", message).end();
+    }
+    complain(message);
+}
+
+void Session::remark(const std::string& subject, const std::string& text) { complain(subject + ": " + text); }
+
+void Session::progress(const char* things, std::uint64_t done, std::uint64_t total) {
+    if (!progress_ || !progress_->isOf(things, total)) {
+        progress_.reset();
+        progress_.emplace(things, total, listing ? Progress::Beside::listing : Progress::Beside::nothing);
+    }
+    progress_->show(done);
+    if (done == total) progress_.reset();
+}
+
+void Session::trying(bool begins) {
+    trials_ += begins ? 1U : -1U;
+    if (trials_ == 0) {
+        quietTrials_.reset();
+    } else if (!quietTrials_) {
+        quietTrials_.emplace();
+    }
+}
+
+int Session::status() const {
+    if (failed_) return 1;
+    return differences ? 3 : 0;
+}
+
+}  // namespace epinspect

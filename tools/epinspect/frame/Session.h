@@ -1,0 +1,45 @@
+// What holds for a whole run of epinspect: the options every subcommand takes, and how it went so far.
+#pragma once
+
+#include <optional>
+#include <string>
+
+#include "frame/Inspection.h"
+#include "frame/Progress.h"
+#include "frame/SystemLog.h"
+#include "store/Context.h"
+
+namespace epinspect {
+
+class Session : public Context {
+public:
+    bool json = false;         ///< --json: failures are objects on standard output too
+    bool differences = false;  ///< all was read, and there are findings or differences
+    bool listing = true;       ///< lines go to standard output while a long work goes on
+
+    /// Makes `folder` stand for / of the target; from then on nothing goes to the system log. Throws UsageError when it
+    /// cannot.
+    void setRoot(const std::string& folder);
+
+    /// Prints the message, as an object too with --json. The exit status is 1 from then on. Throws OutputFailure.
+    void failed(const Failure& failure) override;
+
+    void remark(const std::string& subject, const std::string& text) override;
+    void progress(const char* things, std::uint64_t done, std::uint64_t total) override;
+    void trying(bool begins) override;
+
+    /// Takes the line that shows the progress away, for good.
+    void endProgress() { progress_.reset(); }
+
+    /// The exit status that the run so far amounts to.
+    int status() const;
+
+private:
+    bool failed_ = false;
+    std::optional<QuietLog> quiet_;
+    unsigned int trials_ = 0;
+    std::optional<QuietLog> quietTrials_;
+    std::optional<Progress> progress_;
+};
+
+}  // namespace epinspect

@@ -1,0 +1,51 @@
+// The library calls syslog(); the one defined here takes that call. openlog() with LOG_PERROR would show the lines too,
+// but not escaped for a terminal, and could not keep them off the system log.
+#include "frame/SystemLog.h"
+
+#include <syslog.h>
+
+#include <cstdarg>
+#include <cstdio>
+
+#include "frame/Output.h"
+
+namespace {
+
+bool shown = false;
+unsigned int quiet = 0;
+
+constexpr std::size_t lineSize = 9216;  // the longest line holds a LUN record's texts
+
+/// Throws nothing: the caller is the library, which does not expect it.
+void show(const char* line) noexcept {
+    try {
+        epinspect::complain(line);
+    } catch (...) {
+        epinspect::complainPlainly({"out of memory for a log line"});
+    }
+}
+
+}  // namespace
+
+namespace epinspect {
+
+void showLogLines() { shown = true; }
+
+QuietLog::QuietLog() { ++quiet; }
+QuietLog::~QuietLog() { --quiet; }
+
+}  // namespace epinspect
+
+extern "C" __attribute__((visibility("default"), format(printf, 2, 3))) void syslog(int priority, const char* format,
+                                                                                    ...) {
+    char line[lineSize];
+    va_list arguments;
+    va_start(arguments, format);
+    std::vsnprintf(line, sizeof line, format, arguments);
+    va_end(arguments);
+    if (shown) show(line);
+    if (quiet > 0) return;
+    va_start(arguments, format);
+    vsyslog(priority, format, arguments);
+    va_end(arguments);
+}

@@ -1,0 +1,160 @@
+#include "check/MapRules.h"
+
+#include <algorithm>
+
+#include <etc/ISCSIEPFormat.h>
+
+#include "store/FileNames.h"
+
+namespace inspection {
+
+namespace {
+
+constexpr std::uint32_t mostPools = ISCSI::TOOL::EP_POOL_COUNT_MAX;
+
+/// The entries of `run` from the one that is `skipped` behind the first on.
+MapRun partOf(const MapRun& run, std::uint64_t skipped, std::uint64_t count) {
+    MapRun part = {run.first + skipped, count, run.entry};
+    part.entry.extentAddress += skipped;
+    return part;
+}
+
+}  // namespace
+
+void MapRules::useDataFiles(DataFiles& dataFiles, std::uint32_t extentSize) {
+    dataFiles_ = &dataFiles;
+    extentSize_ = extentSize;
+}
+
+void MapRules::add(const MapRun& run) {
+    summary_.add(run);
+    if (isHole(run.entry)) return;
+    checkUnmappedBits(run);
+    checkAddressBits(run);
+    if (run.entry.mapped && dataFiles_ != nullptr) checkDataFiles(run);
+}
+
+void MapRules::finish(bool complete) {
+    for (Stretch* stretch : {&unmappedBits_, &addressBits_, &missingDataFile_, &beyondDataFile_}) end(*stretch);
+    report_.countEntries(summary_.entries);
+    checkPoolCount();
+    checkPartialEntry();
+    if (complete) {
+        checkTotalCount();
+        checkMappedCount();
+        checkSyncCount();
+    } else {
+        report_.notCompared("total-count, mapped-count, sync-count: not all entries could be read", file_.path);
+    }
+    if (ambiguousBits_) {
+        report_.notCompared("missing-data-file, beyond-data-file: entries with bits 48 to 51 set", file_.path);
+    }
+    if (!unreadable_.empty()) report_.notCompared("beyond-data-file: a data file cannot be read", file_.path);
+}
+
+void MapRules::take(Stretch& stretch, const MapRun& part) {
+    if (stretch.entries.count > 0 && stretch.entries.first + stretch.entries.count == part.first) {
+        stretch.entries.count += part.count;
+    } else {
+        end(stretch);
+        stretch.entries = part;
+    }
+}
+
+void MapRules::end(Stretch& stretch) {
+    if (stretch.entries.count > 0) (this->*stretch.report)(stretch.entries);
+}
+
+void MapRules::addFinding(Rule rule, const MapRun& entries, const Value& stored, const Value& found) const {
+    Finding finding = {file_.path, rule, stored, found};
+    finding.entries = Finding::Entries{entries.first, entries.count, entries.entry};
+    report_.add(finding);
+}
+
+void MapRules::checkCount(Rule rule, std::uint64_t stored, std::uint64_t found) const {
+    if (stored != found) report_.add({file_.path, rule, Value::number(stored), Value::number(found)});
+}
+
+void MapRules::checkTotalCount() const { checkCount(Rule::totalCount, content_.totalCount, summary_.entries); }
+
+void MapRules::checkMappedCount() const { checkCount(Rule::mappedCount, content_.mappedCount, summary_.mapped); }
+
+void MapRules::checkSyncCount() const { checkCount(Rule::syncCount, content_.syncCount, summary_.synced); }
+
+void MapRules::checkPoolCount() const {
+    if (content_.seg0PoolCount <= mostPools) return;
+    report_.add({file_.path, Rule::poolCount, Value::number(content_.seg0PoolCount), Value::number(mostPools)});
+}
+
+void MapRules::checkPartialEntry() const {
+    const auto partial = partialEntryOf(content_, file_.size);
+    if (!partial) return;
+    Finding finding = {file_.path, Rule::partialEntry, Value::number(file_.size), Value::number(partial->bytes)};
+    finding.partial = partial;
+    report_.add(finding);
+}
+
+void MapRules::checkUnmappedBits(const MapRun& run) {
+    if (!run.entry.mapped) take(unmappedBits_, run);
+}
+
+void MapRules::reportUnmappedBits(const MapRun& entries) const {
+    addFinding(Rule::unmappedBits, entries, Value::hexadecimal(bitsOf(entries.entry)), Value::hexadecimal(0));
+}
+
+void MapRules::checkAddressBits(const MapRun& run) {
+    if (isAmbiguous(run.entry)) take(addressBits_, run);
+}
+
+void MapRules::reportAddressBits(const MapRun& entries) const {
+    addFinding(Rule::addressBits, entries, Value::hexadecimal(bitsOf(entries.entry)),
+               Value::hexadecimal(ambiguousBitsOf(entries.entry)));
+}
+
+void MapRules::checkDataFiles(const MapRun& run) {
+    if (isAmbiguous(run.entry)) {
+        ambiguousBits_ = true;
+        return;
+    }
+    for (std::uint64_t done = 0; done < run.count;) {
+        const std::uint64_t address = run.entry.extentAddress + done;
+        const auto place = placeOf(address, extentSize_);
+        if (!place) return take(missingDataFile_, partOf(run, done, run.count - done));
+        const std::uint64_t count = std::min(run.count - done, place->next - address);
+        checkDataFile(partOf(run, done, count), *place);
+        done += count;
+    }
+}
+
+/// Compares entries whose extents start in one data file, the first one at `place`. Counted from the volume's start an
+/// extent lies further on than counted within the data file: past the end by that reading, it is so by both.
+void MapRules::checkDataFile(const MapRun& part, const ExtentPlace& place) {
+    const DataFile& data = dataFiles_->at(place.dataFile);
+    if (data.missing) return take(missingDataFile_, part);
+    if (data.failure) {
+        unreadable_.emplace(place.dataFile, *data.failure);
+        return;
+    }
+    const std::uint64_t held = data.dataSize / extentSize_;
+    const std::uint64_t inside = held > place.inFile ? std::min(part.count, held - place.inFile) : 0;
+    if (inside < part.count) take(beyondDataFile_, partOf(part, inside, part.count - inside));
+}
+
+void MapRules::reportMissingDataFile(const MapRun& entries) const {
+    const std::uint64_t address = entries.entry.extentAddress;
+    const auto place = placeOf(address, extentSize_);
+    addFinding(Rule::missingDataFile, entries, Value::number(address),
+               Value::text("no " + (place ? dataFileName(place->dataFile) : "data file")));
+}
+
+void MapRules::reportBeyondDataFile(const MapRun& entries) const {
+    const std::uint64_t address = entries.entry.extentAddress;
+    const std::uint64_t number = placeOf(address, extentSize_)->dataFile;
+    Finding finding = {file_.path, Rule::beyondDataFile, Value::number(address),
+                       Value::number(dataFiles_->at(number).dataSize / extentSize_)};
+    finding.entries = Finding::Entries{entries.first, entries.count, entries.entry};
+    finding.dataFile = number;
+    report_.add(finding);
+}
+
+}  // namespace inspection

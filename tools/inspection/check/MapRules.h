@@ -1,0 +1,76 @@
+// Rules for a map file: what its header says of its entries, and what the entries point at.
+#pragma once
+
+#include <ISCSIEPFileMAP.h>
+
+#include <cstdint>
+#include <map>
+
+#include "check/Report.h"
+#include "map/MapRuns.h"
+#include "store/DataFiles.h"
+#include "store/ExtentPlace.h"
+#include "store/Store.h"
+
+namespace inspection {
+
+/// Takes the runs of one map, in their order, from a single walk that serves all rules. Neighbouring entries that break
+/// one rule are one finding, which shows the first of them.
+class MapRules {
+public:
+    MapRules(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFileMAP& content, Report& report)
+        : file_(file), content_(content), report_(report) {}
+
+    /// Compares entries with the data files too, where extents of `extentSize` bytes lie, not 0.
+    void useDataFiles(DataFiles& dataFiles, std::uint32_t extentSize);
+
+    void add(const MapRun& run);
+
+    /// No more entries come; `complete`: these were all.
+    void finish(bool complete);
+
+    /// The data files that could not be read, by number, and why.
+    const std::map<std::uint64_t, Failure>& unreadable() const { return unreadable_; }
+
+private:
+    /// Neighbouring entries that break a rule, as far as they have come, and how that is reported.
+    struct Stretch {
+        void (MapRules::*report)(const MapRun& entries) const;
+        MapRun entries = {};
+    };
+
+    void take(Stretch& stretch, const MapRun& part);
+    void end(Stretch& stretch);
+    void addFinding(Rule rule, const MapRun& entries, const Value& stored, const Value& found) const;
+
+    void checkCount(Rule rule, std::uint64_t stored, std::uint64_t found) const;
+    void checkTotalCount() const;
+    void checkMappedCount() const;
+    void checkSyncCount() const;
+    void checkPoolCount() const;
+    void checkPartialEntry() const;
+    void checkUnmappedBits(const MapRun& run);
+    void checkAddressBits(const MapRun& run);
+    void checkDataFiles(const MapRun& run);
+    void checkDataFile(const MapRun& part, const ExtentPlace& place);
+
+    void reportUnmappedBits(const MapRun& entries) const;
+    void reportAddressBits(const MapRun& entries) const;
+    void reportMissingDataFile(const MapRun& entries) const;
+    void reportBeyondDataFile(const MapRun& entries) const;
+
+    const StoreFile& file_;
+    const ISCSI::TOOL::ISCSIEPFileMAP& content_;
+    Report& report_;
+    MapSummary summary_;
+    DataFiles* dataFiles_ = nullptr;
+    std::uint32_t extentSize_ = 0;
+    bool ambiguousBits_ = false;  ///< some entries were not compared with data files: bits 48 to 51 are set
+    std::map<std::uint64_t, Failure> unreadable_;  ///< nor others, whose data files could not be read, by number
+    Stretch unmappedBits_ = {&MapRules::reportUnmappedBits};
+    Stretch addressBits_ = {&MapRules::reportAddressBits};
+    Stretch missingDataFile_ = {&MapRules::reportMissingDataFile};
+    Stretch beyondDataFile_ = {&MapRules::reportBeyondDataFile};
+};
+
+}  // namespace inspection

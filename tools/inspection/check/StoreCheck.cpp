@@ -1,0 +1,162 @@
+#include "check/StoreCheck.h"
+
+#include <ISCSIEPFileDAT.h>
+#include <ISCSIEPFileTBL.h>
+
+#include <cerrno>
+
+#include "check/DataRules.h"
+#include "check/LunRules.h"
+#include "map/MapWalk.h"
+#include "store/FileSize.h"
+
+namespace inspection {
+
+namespace tool = ISCSI::TOOL;
+
+void StoreCheck::run() {
+    if (!files_.areNamed() && files_.luns().empty()) {
+        report_.notCompared("lun-size, extent-size, missing-map: no LUN is configured with an id from " +
+                            std::to_string(options_.lids.first) + " to " + std::to_string(options_.lids.last));
+    }
+    files_.forEach([this](const StoreFile& file) { checkFile(file); });
+    commonValues_.check(report_);
+    checkExtentSizes();
+    checkSharedExtents();
+}
+
+void StoreCheck::checkFile(const StoreFile& file) {
+    checked_.insert(context_.root.targetPath(file.path));
+    if (file.missing) return checkMissing(file);
+    const FileKind* kind = file.kind != nullptr ? file.kind : &headKind;
+    auto content = kind->make(file.hostPath);
+    if (!context_.succeeded(kind->parse(*content), {file.path, ""})) return;
+    const FileKind* byType = kindByType(content->head0Type);
+    if (file.kind == nullptr && byType != nullptr) {
+        kind = byType;
+        content = kind->make(file.hostPath);
+        if (!context_.succeeded(kind->parse(*content), {file.path, ""})) return;
+    }
+    report_.countFile();
+    commonValues_.add(file, *content);
+    checkDataStart(file, *content, report_);
+    checkContent(file, *kind, *content, checkKind(file, *content, report_));
+}
+
+void StoreCheck::checkMissing(const StoreFile& file) {
+    if (file.lun != nullptr) {
+        tellMissingMap(file, *file.lun, report_);
+    } else {
+        report_.notCompared("what the file holds: it is missing", file.path);
+    }
+}
+
+void StoreCheck::checkContent(const StoreFile& file, const FileKind& kind, tool::ISCSIEPFile& content, bool isKind) {
+    auto* const map = dynamic_cast<tool::ISCSIEPFileMAP*>(&content);
+    const auto* const data = dynamic_cast<const tool::ISCSIEPFileDAT*>(&content);
+    const auto* const table = dynamic_cast<const tool::ISCSIEPFileTBL*>(&content);
+    if (map == nullptr && data == nullptr && table == nullptr) return;  // nothing but HEAD[0] is compared
+    if (!isKind) {
+        report_.notCompared(std::string("what else concerns a ") + kind.title + ": the type is another", file.path);
+    } else if (map != nullptr) {
+        checkMap(file, *map);
+    } else if (data != nullptr) {
+        checkSerialNumber(file, *data, report_);
+    } else {
+        tables_[context_.root.targetPath(file.path)] = table->extentSize;
+    }
+}
+
+void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) {
+    if (file.lun != nullptr) {
+        checkLunSize(file, content, *file.lun, report_);
+    } else if (files_.areNamed() || !files_.luns().empty()) {
+        report_.notCompared("lun-size, extent-size: no LUN is configured for this map", file.path);
+    }
+    unsigned long long entries = 0;
+    if (!context_.succeeded(content.getEntryCount(entries), {file.path, ""})) return;
+    const std::string targetPath = context_.root.targetPath(file.path);
+    const std::string folder = targetPath.substr(0, targetPath.rfind('/'));
+    if (file.volume == 0) foldersWithoutVolume_.insert(folder);
+    sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file.path);
+    MapRules rules(file, content, report_);
+    useDataFiles(file, rules);
+    const auto each = [&](const MapRun& run) {
+        rules.add(run);
+        sharedExtents_.add(run);
+    };
+    std::optional<Failure> failure;
+    if (entries > 0) {
+        const auto progress = [&](std::uint64_t done) { context_.progress("entries", done, entries); };
+        failure = walkRuns(file.path, content, {0, entries - 1}, progress, each);
+    }
+    if (failure) context_.failed(*failure);
+    rules.finish(!failure);
+    reportUnreadable(rules);
+}
+
+/// Where all of the store is checked, each data file is read for itself, and reported then.
+void StoreCheck::reportUnreadable(const MapRules& rules) {
+    if (!files_.areNamed()) return;
+    for (const auto& [number, failure] : rules.unreadable()) {
+        if (unreadable_.insert(failure.subject.file).second) context_.failed(failure);
+    }
+}
+
+/// Lets the entries be compared with data files, if that can be done.
+void StoreCheck::useDataFiles(const StoreFile& file, MapRules& rules) {
+    const auto giveUp = [&](const char* why) {
+        report_.notCompared(std::string("missing-data-file, beyond-data-file: ") + why, file.path);
+    };
+    const auto extentSize = file.lun != nullptr ? std::optional(file.lun->record.extentSize) : options_.extentSize;
+    if (!extentSize) return giveUp("the extent size is not known, --extent-size tells it");
+    if (*extentSize == 0) return giveUp("the extent size is 0");
+    if (file.volume == 0) return giveUp("the path names no volume");
+    const std::string path = context_.root.targetPath(file.path);
+    const auto [volume, added] = dataFiles_.try_emplace(file.volume, context_, path, false);
+    DataFiles& dataFiles = volume->second;
+    if (!dataFiles.list()) {
+        if (added && files_.areNamed() && dataFiles.error()) context_.failed(*dataFiles.error());
+        return giveUp("the data files of the volume cannot be listed");
+    }
+    rules.useDataFiles(dataFiles, *extentSize);
+}
+
+void StoreCheck::checkExtentSizes() {
+    const Trial trial(context_);
+    for (const Lun& lun : files_.luns()) {
+        std::string table;
+        const bool onVolume = tool::ISCSIEPFile(lun.mapPath).getTBLFilePath(table) == 0;
+        if (files_.areNamed() && checked_.count(plainPath(lun.mapPath)) == 0 && checked_.count(table) == 0) continue;
+        const auto extentSize = onVolume ? tableExtentSize(table) : std::nullopt;
+        if (extentSize) {
+            checkExtentSize(table, *extentSize, lun, report_);
+        } else if (onVolume) {
+            report_.notCompared("extent-size: no table file that could be read", table);
+        } else {
+            report_.notCompared("extent-size: the path of the LUN's map file names no volume", lun.mapPath);
+        }
+    }
+}
+
+/// The extent size in the table file at `path` of the target, which is read unless it has been, with all of the store.
+std::optional<std::uint32_t> StoreCheck::tableExtentSize(const std::string& path) {
+    const auto [row, added] = tables_.try_emplace(path);
+    if (!added || !files_.areNamed() || checked_.count(path) > 0) return row->second;
+    const std::optional<std::string> hostPath = context_.openablePath(path);
+    if (!hostPath || (!sizeOf(*hostPath) && errno == ENOENT)) return std::nullopt;
+    tool::ISCSIEPFileTBL table(*hostPath);
+    if (context_.succeeded(table.parseFile(), {path, ""})) row->second = table.extentSize;
+    return row->second;
+}
+
+void StoreCheck::checkSharedExtents() {
+    if (foldersWithoutVolume_.size() > 1) {
+        report_.notCompared("shared-extents: maps in different folders whose paths name no volume");
+    }
+    if (sharedExtents_.haveAll()) return sharedExtents_.check(report_);
+    report_.notCompared("shared-extents: the runs of all maps do not fit into memory");
+    context_.fail({"", "shared-extents"}, "out of memory for the runs of all maps", tool::EP_ERR_READ_FAILED);
+}
+
+}  // namespace inspection

@@ -1,0 +1,49 @@
+#include "store/Context.h"
+
+#include <etc/ISCSIEPDiagnostics.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <utility>
+
+namespace inspection {
+
+namespace tool = ISCSI::TOOL;
+
+bool Context::succeeded(int error, const Subject& subject) {
+    if (error != 0) failed({subject, error, errno, {}});
+    return error == 0;
+}
+
+void Context::fail(const Subject& subject, std::string_view what, int error) {
+    failed({subject, error, 0, std::string(what)});
+}
+
+std::optional<std::string> Context::openablePath(const std::string& name) {
+    std::string path = root.isFolder() ? root.hostPath(root.targetPath(name)) : name;
+    const char* refusal = root.refusalOfFile(path);
+    if (refusal == nullptr) return path;
+    fail({name, ""}, std::string("cannot be opened: ") + refusal, tool::EP_ERR_OPEN_FAILED);
+    return std::nullopt;
+}
+
+std::optional<std::string> Context::openableFolder(const std::string& path) {
+    std::string folder = root.hostPath(path);
+    const char* refusal = root.refusalOfFolder(folder);
+    if (refusal == nullptr) return folder;
+    fail({path, ""}, std::string("cannot be opened: ") + refusal, tool::EP_ERR_OPEN_FAILED);
+    return std::nullopt;
+}
+
+void Context::prepareLuns() {
+    if (!root.isFolder() || std::exchange(lunsPrepared_, true)) return;
+    std::string list = root.hostPath("/var/db/iscsi/luns.json");
+    if (const char* refusal = root.refusalOfFolder(list)) {
+        remark(list, std::string("not used: ") + refusal);
+        list = "/dev/null";
+    }
+    // The stand-in for the platform's library reads that list; another choice in the environment wins.
+    setenv("KELPISCSIEP_LUNS", list.c_str(), 0);
+}
+
+}  // namespace inspection

@@ -1,0 +1,70 @@
+// What every look at a store needs: where the store lies, and somebody who hears what went wrong and how far it has
+// come.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "Failure.h"
+#include "store/TargetRoot.h"
+
+namespace inspection {
+
+/// Each program derives one from this. Used by one thread at a time.
+class Context {
+public:
+    Context() = default;
+    Context(const Context&) = delete;
+    Context& operator=(const Context&) = delete;
+    virtual ~Context() = default;
+
+    TargetRoot root;
+
+    /// Something failed; what was asked for beside it goes on.
+    virtual void failed(const Failure& failure) = 0;
+
+    /// There is something to know about `subject` that is no failure.
+    virtual void remark(const std::string& subject, const std::string& text) = 0;
+
+    /// Of a long work, `done` of `total` of `things` ("entries") are done. Called now and then.
+    virtual void progress(const char* things, std::uint64_t done, std::uint64_t total) = 0;
+
+    /// Until the call with false, the log lines of the library are about what is only tried out. May be nested.
+    virtual void trying(bool begins) = 0;
+
+    /// Reports the failure of a call of the library, right after it (the system's reason is still in errno), when
+    /// `error` is not 0. Returns whether it is 0.
+    bool succeeded(int error, const Subject& subject);
+
+    /// Reports a failure that the library does not know, under its code that fits.
+    void fail(const Subject& subject, std::string_view what, int error);
+
+    /// Where to open the file that the user called `name`; nothing, and a failure, when what lies there must not be
+    /// opened. What is missing is left to the library to find.
+    std::optional<std::string> openablePath(const std::string& name);
+
+    /// The same of a folder at `path` of the target. Whether it can be listed is left to find.
+    std::optional<std::string> openableFolder(const std::string& path);
+
+    /// To be called before the first look at a LUN: its list is then looked for below the root folder too.
+    void prepareLuns();
+
+private:
+    bool lunsPrepared_ = false;
+};
+
+/// While one lives, things are only tried out.
+class Trial {
+public:
+    explicit Trial(Context& context) : context_(context) { context_.trying(true); }
+    Trial(const Trial&) = delete;
+    Trial& operator=(const Trial&) = delete;
+    ~Trial() { context_.trying(false); }
+
+private:
+    Context& context_;
+};
+
+}  // namespace inspection

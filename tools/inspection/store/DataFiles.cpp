@@ -1,0 +1,81 @@
+#include "store/DataFiles.h"
+
+#include <etc/ISCSIEPFormat.h>
+
+#include <cerrno>
+#include <utility>
+
+#include "store/Doubts.h"
+#include "store/FileNames.h"
+#include "store/FileSize.h"
+#include "store/Folder.h"
+
+namespace inspection {
+
+namespace tool = ISCSI::TOOL;
+
+DataFiles::DataFiles(Context& context, const std::string& path, bool remarks)
+    : context_(context), path_(path), remarks_(remarks) {}
+
+const DataFile& DataFiles::at(std::uint64_t number) {
+    constexpr std::size_t mostFiles = 64;  // 256 TiB; what a file takes is mainly its header block
+    const auto known = files_.find(number);
+    if (known != files_.end()) return known->second;
+    if (files_.size() >= mostFiles) files_.clear();
+    return files_.emplace(number, open(number)).first->second;
+}
+
+bool DataFiles::list() {
+    if (std::exchange(listTried_, true)) return listed_.has_value();
+    std::string first;
+    const Trial trial(context_);
+    if (tool::ISCSIEPFile(path_).getDATFilePath(1, 0, first) != 0) return false;
+    const std::string folder = first.substr(0, first.rfind('/') + 1);
+    std::set<std::uint64_t> numbers;
+    const auto error = listFolder(context_, folder, [&numbers](const std::filesystem::directory_entry& entry) {
+        const std::string name = entry.path().filename().string();
+        const auto number = dataFileNumberIn(name);
+        if (number && name == dataFileName(*number)) numbers.insert(*number);
+    });
+    if (error) {
+        listError_ = Failure{{folder, ""}, tool::EP_ERR_OPEN_FAILED, error.value(), {}};
+    } else {
+        listed_ = std::move(numbers);
+    }
+    return !error;
+}
+
+bool DataFiles::isListedMissing(std::uint64_t number) const { return listed_ && listed_->count(number) == 0; }
+
+DataFile DataFiles::open(std::uint64_t number) {
+    DataFile data;
+    const auto failed = [&data](int error, int reason, std::string what = {}) {
+        data.failure = Failure{{data.path, ""}, error, reason, std::move(what)};
+        data.file.reset();
+        return std::move(data);
+    };
+    const int pathError = tool::ISCSIEPFile(path_).getDATFilePath(1, number * tool::EP_DAT_FILE_SPAN, data.path);
+    if (pathError != 0) return failed(pathError, 0);
+    const std::string hostPath = context_.root.hostPath(data.path);
+    const char* refusal = context_.root.refusalOfFile(hostPath);
+    if (refusal != nullptr) {
+        return failed(tool::EP_ERR_OPEN_FAILED, 0, std::string("cannot be opened: ") + refusal);
+    }
+    if (isListedMissing(number)) {
+        data.missing = true;
+        return failed(tool::EP_ERR_OPEN_FAILED, ENOENT);
+    }
+    data.file = std::make_unique<tool::ISCSIEPFileDAT>(hostPath);
+    // Nothing is read yet: this finds out whether there can be extents at all.
+    const int error = data.file->getExtentBytes(0, 1, 0, 0, nullptr);
+    const int reason = errno;
+    data.missing = error == tool::EP_ERR_OPEN_FAILED && (reason == ENOENT || reason == ENOTDIR);
+    if (error != 0) return failed(error, reason);
+    const auto size = sizeOf(hostPath);
+    if (!size) return failed(tool::EP_ERR_OPEN_FAILED, errno);
+    if (remarks_) remarkOnDataStart(context_, *data.file, data.path);
+    data.dataSize = payloadOf(*data.file, *size);
+    return data;
+}
+
+}  // namespace inspection

@@ -1,0 +1,20 @@
+// How large a file or block device is, and how much of it lies after its data start.
+#pragma once
+
+#include <ISCSIEPFile.h>
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace inspection {
+
+/// Its bytes, or nothing when that cannot be told; errno then says why.
+std::optional<std::uint64_t> sizeOf(const std::string& path);
+
+/// The bytes from the data start offset of `file`, whose HEAD[0] is decoded, to its end, if it has `size` bytes.
+inline std::uint64_t payloadOf(const ISCSI::TOOL::ISCSIEPFile& file, std::uint64_t size) {
+    return size > file.head0DataStartOffset ? size - file.head0DataStartOffset : 0;
+}
+
+}  // namespace inspection

@@ -1,0 +1,45 @@
+// A LUN whose bytes are looked for: its map file, and how much there is.
+#pragma once
+
+#include <ISCSIEPFileMAP.h>
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "store/Context.h"
+
+namespace inspection {
+
+struct LunMap {
+    std::optional<std::uint32_t> lid;  ///< when the user named the LUN by its id
+    std::string file;                  ///< the map file as the user typed it, or as the configuration tells it
+    std::string targetPath;            ///< the same on the target
+    std::unique_ptr<ISCSI::TOOL::ISCSIEPFileMAP> map;  ///< its HEAD[0] is decoded
+    std::uint32_t extentSize = 0;                      ///< never 0
+    std::uint64_t entries = 0;
+    std::uint64_t size = 0;  ///< bytes of the LUN, at most 2^63: as configured, else what the entries hold
+
+    /// How many bytes the entries stand for, at most 2^63.
+    std::uint64_t mappableSize() const;
+
+    /// How messages name a part of the LUN, "byte 5".
+    Subject subject(const std::string& part) const;
+
+    /// The failure of `part`, which lies past the end of the LUN, and past the last entry of the map.
+    Failure pastEnd(const std::string& part) const;
+    Failure pastMap(const std::string& part) const;
+};
+
+/// The name of a LUN as it is typed: its id, or the path of its map file.
+struct LunName {
+    std::optional<std::uint32_t> lid;
+    std::string file;
+};
+
+/// Opens the map of a LUN. The extent size is that of the configuration unless one is given, which it must be for a LUN
+/// named by its map file. Reports what fails.
+std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::optional<std::uint32_t> extentSize);
+
+}  // namespace inspection

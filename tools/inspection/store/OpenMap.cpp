@@ -1,0 +1,21 @@
+#include "store/OpenMap.h"
+
+#include "store/Doubts.h"
+
+namespace inspection {
+
+namespace tool = ISCSI::TOOL;
+
+OpenedMap openMap(Context& context, const std::string& name) {
+    const std::optional<std::string> path = context.openablePath(name);
+    if (!path) return {};
+    auto file = std::make_unique<tool::ISCSIEPFileMAP>(*path);
+    unsigned long long entries = 0;
+    if (!context.succeeded(file->parseHead0(), {name, ""})) return {};
+    if (!context.succeeded(file->getEntryCount(entries), {name, ""})) return {};
+    remarkOnDataStart(context, *file, name);
+    remarkOnPartialEntry(context, *file, name);
+    return {std::move(file), entries};
+}
+
+}  // namespace inspection

@@ -1,0 +1,22 @@
+// A map file that is about to be walked.
+#pragma once
+
+#include <ISCSIEPFileMAP.h>
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "store/Context.h"
+
+namespace inspection {
+
+struct OpenedMap {
+    std::unique_ptr<ISCSI::TOOL::ISCSIEPFileMAP> file;  ///< HEAD[0] is decoded; null after a failure
+    std::uint64_t entries = 0;                          ///< how many the file holds
+};
+
+/// Opens the map file that the user called `name` and says what is doubtful about it. Reports failures.
+OpenedMap openMap(Context& context, const std::string& name);
+
+}  // namespace inspection
