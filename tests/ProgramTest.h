@@ -53,7 +53,7 @@ inline std::string says(std::initializer_list<std::string> messages) {
 const std::string missing = ": cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)";
 const std::string wrongType = ": wrong type of EP file (EP_ERR_WRONG_FILE_TYPE, 18990400)";
 inline std::string holds(const std::string& what) {
-    return ": beyond the end, the file holds " + what + " (EP_ERR_READ_FAILED, 18990039)";
+    return ": past the end, the file holds " + what + " (EP_ERR_READ_FAILED, 18990039)";
 }
 
 inline int exitStatus(int status) { return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status); }

@@ -115,7 +115,7 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
 "rule":"unmapped-bits","stored":"0x6c","found":"0x0","first":12,"count":1,"message":"unmapped-bits_00000: unmapped-bits: entry 12: unmapped, but holds 0x6c"}
 "rule":"address-bits","stored":"0x9011000000000073","found":"0x1","first":3,"count":1,"message":"address-bits_00000: address-bits: entry 3: 0x9011000000000073, of which bits 48 to 51 are 0x1: they count in extent address and pool number"}
 "rule":"missing-data-file","stored":67108995,"found":"no EP_DAT_00001","first":3,"count":1,"message":"missing-data-file_00000: missing-data-file: entry 3: extent 67108995, for which there is no EP_DAT_00001"}
-"rule":"beyond-data-file","stored":1024,"found":1024,"first":3,"count":1,"message":"beyond-data-file_00000: beyond-data-file: entry 3: extent 1024, behind the end of EP_DAT_00000, which holds 1024 extents"}
+"rule":"beyond-data-file","stored":1024,"found":1024,"first":3,"count":1,"message":"beyond-data-file_00000: beyond-data-file: entry 3: extent 1024, past the end of EP_DAT_00000, which holds 1024 extents"}
 "rule":"lun-size","stored":1048576,"found":1114112,"lid":11,"message":"lun-size_00000: lun-size: 16 entries of 65536 bytes are 1048576 bytes, LUN 11 has 1114112"}
 "rule":"missing-map","stored":"LUN 12","found":"no file","lid":12,"message":"missing-map_00000: missing-map: LUN 12 is configured, but has no map file"}
 "rule":"magic","stored":"0x0","found":"0x1122334455667788","message":"EP_TBL: magic: 0x0, most files have 0x1122334455667788"}
@@ -129,15 +129,15 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "broken/…lun-size_00000: lun-size: 16 entries of 65536 bytes are 1048576 bytes, LUN 11 has 1114112\n"
      "/volume3/@iSCSI/EP/EP_TBL: extent-size: 131072 stored, LUN 13 has 65536\n2 files, 32 entries, 2 findings\n", ""},
     {"check finds extents that are shared", "epinspect check late y x ./x other/x large", 3,
-     "late: data-start: 0x6001, behind the end of the file, which has 24576 bytes\n"
+     "late: data-start: 0x6001, past the end of the file, which has 24576 bytes\n"
      "x: unmapped-bits: entry 6: unmapped, but holds 0xc\n"
      "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
      "y: shared-extents: entries 0-1: pool 0, extents 12-13, used by entries 2-3 of x too\n"
-     "5 files, 20012 entries, 4 findings\nNot compared: …the extent size is not known, --extent-size tells it: …shared-extents: maps in different folders whose paths name no volume\n", ""},
+     "5 files, 20012 entries, 4 findings\nNot compared: …the extent size is not known, give --extent-size: …shared-extents: maps in different folders whose paths name no volume\n", ""},
     {"check looks into data files", "epinspect check --root . --extent-size 1M", 3,
-     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, behind the end of EP_DAT_00000, which holds 4194303 extents\n"
+     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, past the end of EP_DAT_00000, which holds 4194303 extents\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entries 5-7: extent 8388608 in the first, for which there is no EP_DAT_00002\n"
-     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, behind the end of EP_DAT_00001, which holds 2 extents\n"
+     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, past the end of EP_DAT_00001, which holds 2 extents\n"
      "3 files, 8 entries, 3 findings\nNot compared: lun-size, extent-size, missing-map: no LUN is configured with an id from 0 to 255\n", ""},
     {"check writes findings as JSON", "epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
 )", ""},
@@ -154,7 +154,7 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"check says what named files lack", "cd p; >volume1/@iSCSI/EP; epinspect check --root . EP_DAT_7x x volume1/@iSCSI/LUN/* --extent-size 1M", 1,
      "volume1/@iSCSI/LUN/t: kind: type 1, but named like a map file\nEP_DAT_7x: magic: 0x9, most files have 0x1122334455667788\n"
-     "4 files, 2 entries, 2 findings\nNot compared: kind: the file's name tells none: x\n"
+     "4 files, 2 entries, 2 findings\nNot compared: kind: the file's name does not say which: x\n"
      "Not compared: lun-size, extent-size: no LUN is configured for this map: x and 1 more\n"
      "Not compared: missing-data-file, beyond-data-file: the data files of the volume cannot be listed: volume1/@iSCSI/LUN/m\n"
      "Not compared: missing-data-file, beyond-data-file: the path names no volume: x\n"
@@ -168,7 +168,7 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "epinspect diff gone other; epinspect diff a; epinspect find a; epinspect check --extent-size 0", 2, "",
      "epinspect: gone: cannot be opened: No such…epinspect: other: cannot be opened: neither a regular file…"
      "epinspect: MAPFILE is missing. Try 'epinspect diff --help'.\n"
-     "epinspect: --extent or --pool is missing. Try…epinspect: --extent-size: '0': no extent has 0 bytes. Try 'epinspect check --help'.\n"},
+     "epinspect: --extent or --pool is missing. Try…epinspect: --extent-size: '0': must not be 0. Try 'epinspect check --help'.\n"},
 };
 
 // clang-format on

@@ -71,11 +71,11 @@ const Case cases[] = {
     {"takes the kind from the type where the name tells none", "cp EP_DAT_7 d; cp @iSCSI/LUN/m m; truncate -s 24576 zero; "
      "epinspect dump --json d m zero", 0,
      "{\"kind\":\"dat\",\"file\":\"d\",…}\n{\"kind\":\"map\",\"file\":\"m\",…}\n{\"kind\":\"head\",\"file\":\"zero\",…}\n",
-     says({"zero: neither name nor type tells its kind, only HEAD[0] is shown",
+     says({"zero: kind not known from its name or type, only HEAD[0] is shown",
            "zero: data start offset 0x0 lies inside the header block"})},
     {"takes no kind from a name that only resembles one", "for f in EP_TBL2 xEP_TBL EP_FRI2 EP_JNL2 EP_DAT xEP_DAT_1 "
      "@iSCSI/LUN2; do cp EP_TBL $f; epinspect dump --json $f; done | grep -c '\"kind\":\"head\"'", 0, "7\n",
-     says({"EP_TBL2: neither name nor type tells its kind, only HEAD[0] is shown"}) + "…"},
+     says({"EP_TBL2: kind not known from its name or type, only HEAD[0] is shown"}) + "…"},
     {"takes for a map what lies where maps lie", "cp EP_TBL @iSCSI/LUN/t; cd @iSCSI/LUN; epinspect dump --json t", 0,
      "{\"kind\":\"map\",…", says({"t: named like a map file, but its type in HEAD[0] is 1"})},
     {"takes for a kind what it is told to", "for k in tbl map dat fri jnl head; do epinspect dump --as $k EP_TBL "
@@ -84,7 +84,7 @@ const Case cases[] = {
      "epinspect dump EP_FRI early late part", 0, "EP_FRI:\n…early:\n…late:\n…part:\n…",
      says({"EP_FRI: named like a free-index file, but its type in HEAD[0] is 4, a map file",
            "early: data start offset 0x5fff lies inside the header block",
-           "late: data start offset 0x6001 lies behind the end of the file",
+           "late: data start offset 0x6001 lies past the end of the file",
            "part: ends inside an entry, 5 of its 8 bytes are there"})},
     {"goes on after a failure and keeps the order", "epinspect dump EP_TBL gone EP_DAT_7 2>&1", 1,
      "EP_TBL:\n" + text(1, tableDump) + says({"gone" + missing}) + "EP_DAT_7:\n" + text(3, dataDump), ""},

@@ -44,7 +44,7 @@ const Case cases[] = {
     {"says what is doubtful or wrong about extents", "epinspect extent data 0 --extent-size 0; "
      "for f in gone EP_TBL late early; do epinspect extent $f 0 --extent-size 8; done", 0, "0000000000000000\n",
      says({"data: extent 0: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)", "gone: extent 0" + missing,
-           "EP_TBL: extent 0" + wrongType, "late: data start offset 0x6001 lies behind the end of the file",
+           "EP_TBL: extent 0" + wrongType, "late: data start offset 0x6001 lies past the end of the file",
            "late: extent 0" + holds("none"), "early: data start offset 0x5ff8 lies inside the header block"})},
 
     {"shows the configuration of a LUN", "epinspect lun 1 --root store", 0,
@@ -96,7 +96,7 @@ const Case cases[] = {
     usage("dump -vz x", "unknown option '-vz'", " dump"),
     usage("entry x", "INDEX is missing", " entry"),
     usage("extent data 0", "--extent-size is missing", " extent"),
-    usage("map x --first", "--first lacks its value, N", " map"),
+    usage("map x --first", "--first needs a value: N", " map"),
     usage("map x --json=false", "--json takes no value: '--json=false'", " map"),
     usage("map x --count 1 --count 1", "--count: given twice", " map"),
     usage("map -- x --y", "unexpected argument: '--y'", " map"),

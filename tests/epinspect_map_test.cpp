@@ -23,7 +23,7 @@ std::string meanwhile(const std::string& command, const std::string& happens) {
            happens + "; tail -n 1; }; exit $(cat status)";
 }
 
-const std::string startsFar = ": data start offset 0x7ffffffffffffff8 lies behind the end of the file";
+const std::string startsFar = ": data start offset 0x7ffffffffffffff8 lies past the end of the file";
 const std::string noFlags = "; 0 vpushed, 0 vpulled, 0 synced\n";
 
 // clang-format off

@@ -77,7 +77,7 @@ const std::string openFailed = " (EP_ERR_OPEN_FAILED, 18990038)\n";
 const std::string no = "THIN00000000-0000-4000-8000x000000000005_00000",
                   same = R"(","fileKind":"map","size":24616,"missing":false,"entries":5})";
 const std::string notFound = "cannot be opened: No such file or directory" + openFailed;
-const std::string beyond0 = "beyond the end, the file holds 3670016 bytes of extents (EP_ERR_READ_FAILED, 18990039)\n";
+const std::string beyond0 = "past the end, the file holds 3670016 bytes of extents (EP_ERR_READ_FAILED, 18990039)\n";
 const std::string open2 =
     "bits 48 to 51 are set: extent 2 of pool 1 with --address-bits 48, extent 281474976710658 of "
     "pool 0 with --address-bits 52 (EP_ERR_NO_PATH, 18990401)\n";
@@ -115,20 +115,20 @@ const Case cases[] = {
     {"locate finds bytes", "epinspect --root store locate 1 540000000 430000000 18446744073709551615", 1,
      "LUN 1 byte 540000000: entry 514, byte 1031936 of its extent\n514: mapped, pool 16, extent 4194818\n"
      "/volume1/@iSCSI/EP/EP_DAT_00001 position 540024576 (extent 514 of the file)\n" + assumed + "; extents counted "
-     "within the data file (counted from the volume's start they would lie behind its end)\n"
+     "within the data file (counted from the volume's start they would lie past its end)\n"
      "LUN 1 byte 430000000: entry 410, byte 83840 of its extent\n410: hole\n" + assumed +
-     "; what is not mapped reads as zeros\n", "…: LUN 1 byte 18446744073709551615: beyond the end, the LUN has 4294967296 bytes…"},
+     "; what is not mapped reads as zeros\n", "…: LUN 1 byte 18446744073709551615: past the end, the LUN has 4294967296 bytes…"},
     {"locate writes JSON", "epinspect --root store locate 1 540000000 --json", 0,
      R"({"kind":"place","file":"/volume1/@iSCSI/LUN/BLUN…lun1_00000","lid":1,"lunOffset":540000000,"index":514,)"
      R"("remainder":1031936,"entryOffset":28688,"extentAddress":4194818,"poolNumber":16,"mapped":true,"vpushed":false,)"
      R"("vpulled":false,"synced":false,"candidates":[{"countFrom":"file","dataFile":"/volume1/@iSCSI/EP/EP_DAT_00001",)"
      R"("extent":514,"position":540024576,"inside":true},{"countFrom":"volume","dataFile":"/volume1/@iSCSI/EP/)"
      R"(EP_DAT_00001","extent":4194818,"position":4398586535680,"inside":false}]})" "\n", ""},
-    {"locate names both where the format is open", "T='epinspect --root far locate 5'; $T 1048577; "
+    {"locate names both where the format is ambiguous", "T='epinspect --root far locate 5'; $T 1048577; "
      "$T 2M --address-bits 48; $T 2M; $T 2M --address-bits 52", 1, "LUN 5 byte 1048577: entry 1, byte 1 of its extent\n…\n" +
      ep + "1 position 24577 (extent 0 of the file, counted within it)\n" +
      ep + "1 position 4398046535681 (extent 4194304 of the file, counted from the volume's start)\n" + assumed +
-     "; from where extents are counted is open, both places lie inside the data file (--count-from chooses)\n"
+     "; ambiguous: both places lie inside the data file, --count-from decides\n"
      "LUN 5 byte 2097152: entry 2, byte 0 of its extent\n2: mapped, pool 1, extent 281474976710658\n" +
      ep + "0 position 2121728 (extent 2 of the file)\n" + assumed + "; extent 2, as --address-bits says\n…",
      "epinspect: LUN 5 byte 2097152: " + open2 +
@@ -136,17 +136,17 @@ const Case cases[] = {
     {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M; epinspect --root far locate 5 1M --count-from file | tail -n 1; "
      "epinspect --root far locate 5 3M --count-from volume --json 2>/dev/null | grep -o '\"extent\":.*'", 0,
      "…\n" + ep + "2 position unknown (extent 8388608 of the file)\n" + assumed + "; extents counted from the volume's "
-     "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), behind its end\n…\n" + assumed +
+     "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), past its end\n…\n" + assumed +
      "; extents counted within the data file, as --count-from says\n" R"("extent":8388608,"position":null,"inside":false}]})" "\n",
      "epinspect: " + ep + "2: LUN 5 byte 3145728: " + notFound +
      "epinspect: " + ep + "0: LUN 5 byte 4718592: " + beyond0 + "…" + lun5 +
-     ": LUN 5 byte 5242880: beyond the end, the map's entries stand for 5242880 bytes (…)\n"},
+     ": LUN 5 byte 5242880: past the end, the map's entries stand for 5242880 bytes (…)\n"},
     {"read gets all that can be had", "epinspect --root far read 5 >image; echo $?; wc -c <image; "
      "grep -abo '[a-z][a-z]*' image; epinspect --root far read 5 --count-from file --address-bits 48 2>/dev/null | grep -abo '[a-z][a-z]*'", 0,
      "1\n6291456\n4194304:three\n1048576:here\n2097152:two\n4194304:three\n",
-     "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: beyond the end, …\nepinspect: " + ep + "0: LUN 5 bytes "
-     "0-1048575: " + beyond0 + "epinspect: " + ep + "1: LUN 5 bytes 1048576-1572863: from where extents are counted is "
-     "open, both places lie inside the file; --count-from chooses …\nepinspect: LUN 5 bytes 2097152-3145727: " + open2 +
+     "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: past the end, …\nepinspect: " + ep + "0: LUN 5 bytes "
+     "0-1048575: " + beyond0 + "epinspect: " + ep + "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and "
+     "both places lie inside the file; --count-from decides …\nepinspect: LUN 5 bytes 2097152-3145727: " + open2 +
      "epinspect: " + ep + "2: LUN 5 bytes 3145728-4194303: " + notFound + "epinspect: " + ep + "0: LUN 5 bytes "
      "4718592-5242879: " + beyond0 +
      "epinspect: LUN 5: 5242880 of 6291456 bytes could not be read, zeros stand in their place\n"},
@@ -158,9 +158,9 @@ const Case cases[] = {
     {"neither goes beyond the LUN", "for a in 'read 5 --offset 6M' 'read 5 --length 7M' 'read 6' 'read 7'; "
      "do epinspect --root far $a; echo $?; done; "
      "cp far" + lun5 + " m; epinspect read m --extent-size 1M --length 1 | od -An -tx1", 0, "1\n1\n1\n1\n 00\n",
-     "…byte 6291456: beyond the end, the LUN has 6291456 bytes (…: LUN 6: extent size cannot be used (…No such LUN…epinspect: m: byte 0: path names no volume (…1 of 1 bytes…"},
+     "…byte 6291456: past the end, the LUN has 6291456 bytes (…: LUN 6: extent size cannot be used (…No such LUN…epinspect: m: byte 0: path names no volume (…1 of 1 bytes…"},
     {"wrong usage is named", "for a in 'read none' 'read 0X1FFFFFFFF' 'locate 5 1x' 'locate 5 1 --address-bits 50'; "
-     "do epinspect $a; done; epinspect read 5 --count-from LUN", 2, "", "epinspect: --extent-size is missing: a map file does not tell it…LUN: '0X1FFFFFFFF'…"
+     "do epinspect $a; done; epinspect read 5 --count-from LUN", 2, "", "epinspect: --extent-size is missing: a map file does not hold it…LUN: '0X1FFFFFFFF'…"
      "OFFSET: '1x'…--address-bits: '50': not 48 or 52…--count-from: 'LUN': not file or volume…"},
 };
 // clang-format on

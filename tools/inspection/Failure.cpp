@@ -58,7 +58,7 @@ std::string messageOf(const Failure& failure) {
 }
 
 Failure pastEnd(const std::string& file, const std::string& place, unsigned long long count) {
-    std::string what = "beyond the end, the file holds ";
+    std::string what = "past the end, the file holds ";
     if (count == 0) {
         what += "none";
     } else {

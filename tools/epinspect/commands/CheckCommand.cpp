@@ -3,8 +3,8 @@
 
 #include "check/StoreCheck.h"
 #include "commands/Commands.h"
-#include "frame/Numbers.h"
 #include "commands/FindingOutput.h"
+#include "frame/Numbers.h"
 
 namespace epinspect {
 
@@ -12,7 +12,7 @@ namespace {
 
 std::uint32_t parseExtentSize(const std::string& text) {
     const std::uint32_t size = parseSize32(text);
-    if (size == 0) throw UsageError{"no extent has 0 bytes"};
+    if (size == 0) throw UsageError{"must not be 0"};
     return size;
 }
 
@@ -20,13 +20,13 @@ std::uint32_t parseExtentSize(const std::string& text) {
 
 void addCheck(Command& parent, Session& session) {
     const auto options = std::make_shared<CheckOptions>();
-    parent.add("check", "Compare what files say of themselves and of each other")
+    parent.add("check", "Compare files with themselves and with each other")
         .arguments("FILE", "EP files (default: all of the store)", options->files, Command::Need::severalOrNone)
         .option("--luns", "FIRST-LAST", "LUN ids to look for (default: 0-255)", options->lids, parseRange32)
         .option("--extent-size", "SIZE",
                 "Bytes of an extent, for maps whose LUN is not known; K, M, G or KiB, MiB, GiB may follow",
                 options->extentSize, parseExtentSize)
-        .flag("--json", "One JSON object a finding, then one that sums up", session.json)
+        .flag("--json", "One JSON object per finding, then a summary", session.json)
         .action([options, &session] {
             FindingOutput output(session);
             Report report([&output](const Finding& finding) { output.print(finding); });

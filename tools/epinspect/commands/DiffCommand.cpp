@@ -158,7 +158,7 @@ void addDiff(Command& parent, Session& session) {
     parent.add("diff", "Show what differs between two map files")
         .argument("MAPFILE", "Map file of a LUN", options->files[0])
         .argument("MAPFILE", "Map file to compare it with", options->files[1])
-        .flag("--json", "One JSON object a run of differences, then one that sums up", session.json)
+        .flag("--json", "One JSON object per run of differences, then a summary", session.json)
         .action([options, &session] { run(*options, session); });
 }
 

@@ -26,7 +26,7 @@ const FileKind* kindFromType(Session& session, const std::string& name, const st
     if (!session.succeeded(head.parseHead0(), {name, ""})) return nullptr;
     const FileKind* kind = kindByType(head.head0Type);
     if (kind != nullptr) return kind;
-    session.remark(name, "neither name nor type tells its kind, only HEAD[0] is shown");
+    session.remark(name, "kind not known from its name or type, only HEAD[0] is shown");
     return &headKind;
 }
 
@@ -84,10 +84,10 @@ void addDump(Command& parent, Session& session) {
     parent.add("dump", "Show the header block of EP files")
         .arguments("FILE", "EP files", options->files)
         .option("--as", "KIND",
-                "Take the files for this kind, whatever their name and type tell: tbl, map, dat, fri, jnl, or head for "
+                "Kind of the files, whatever their name and type: tbl, map, dat, fri, jnl, or head for "
                 "HEAD[0] alone",
                 options->kind, parseKind)
-        .flag("--json", "One JSON object a file", session.json)
+        .flag("--json", "One JSON object per file", session.json)
         .action([options, &session] {
             for (const std::string& name : options->files) dumpFile(*options, session, name);
         });

@@ -66,7 +66,7 @@ void addEntry(Command& parent, Session& session) {
         .argument("MAPFILE", "Map file of a LUN", options->file)
         .arguments("INDEX", "Index of an entry, from 0; FIRST-LAST for all from FIRST to LAST", options->ranges,
                    parseRange)
-        .flag("--json", "One JSON object an entry", session.json)
+        .flag("--json", "One JSON object per entry", session.json)
         .action([options, &session] { run(*options, session); });
 }
 

@@ -122,7 +122,7 @@ void addFind(Command& parent, Session& session) {
         .option("--extent", "N", "Extent address; FIRST-LAST for all from FIRST to LAST", options->search.extents,
                 parseRange)
         .option("--pool", "N", "Pool number; with --extent, both must fit", options->search.pool, parseNumber32)
-        .flag("--json", "One JSON object a match, then one that sums up", session.json)
+        .flag("--json", "One JSON object per match, then a summary", session.json)
         .action([options, &session] { run(*options, session); });
 }
 

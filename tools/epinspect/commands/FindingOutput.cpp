@@ -62,7 +62,7 @@ std::string kindText(const KindDoubt& doubt) {
 
 std::string dataStartText(const DataStartDoubt& doubt) {
     return doubt.insideHeader ? ", inside the header block of " + std::to_string(doubt.limit) + " bytes"
-                              : ", behind the end of the file, which has " + std::to_string(doubt.limit) + " bytes";
+                              : ", past the end of the file, which has " + std::to_string(doubt.limit) + " bytes";
 }
 
 std::string partialEntryText(const Finding& finding) {
@@ -93,8 +93,8 @@ std::string entriesMessage(const Finding& finding) {
         case Rule::missingDataFile:
             return firstExtentText(entries) + ", for which there is " + shown(finding.found);
         case Rule::beyondDataFile:
-            return firstExtentText(entries) + ", behind the end of " + dataFileName(finding.dataFile) +
-                   ", which holds " + counted(finding.found.bits, "extent", "extents");
+            return firstExtentText(entries) + ", past the end of " + dataFileName(finding.dataFile) + ", which holds " +
+                   counted(finding.found.bits, "extent", "extents");
         default:
             return sharedText(finding);
     }

@@ -94,10 +94,10 @@ void run(Session& session, const std::optional<Range>& lids) {
 
 void addList(Command& parent, Session& session) {
     const auto lids = std::make_shared<std::optional<Range>>();
-    parent.add("list", "Show what lies in the store, and what LUNs lack there")
+    parent.add("list", "Show the files of the store, and which files of LUNs are missing")
         .option("--luns", "FIRST-LAST", "LUN ids to look for in the configuration (default: 0-255)", *lids,
                 parseRange32)
-        .flag("--json", "One JSON object a file", session.json)
+        .flag("--json", "One JSON object per file", session.json)
         .action([lids, &session] { run(session, *lids); });
 }
 

@@ -73,10 +73,9 @@ void settleCounting(Byte& byte, const PlaceChoice& choice, const std::optional<C
     const Candidate& inVolume = byte.candidates[1];
     if (inFile.extent == inVolume.extent || !inFile.inside) return;
     byte.assumed.emplace_back(
-        !counting ? "from where extents are counted is open, both places lie inside the data file (--count-from "
-                    "chooses)"
-                  : "extents counted within the data file (counted from the volume's start they would lie behind "
-                    "its end)");
+        !counting
+            ? "ambiguous: both places lie inside the data file, --count-from decides"
+            : "extents counted within the data file (counted from the volume's start they would lie past its end)");
 }
 
 /// Finds the candidates for a byte whose entry is mapped; reports why there is none, or none that can be read.
@@ -100,7 +99,7 @@ void findCandidates(const PlaceChoice& choice, Session& session, const LunMap& l
     byte.candidates = candidatesIn(data, *place, lun, byte.remainder, choice.countFrom);
     settleCounting(byte, choice, countingOf(*place, lun.extentSize, byte.remainder, data.dataSize, choice));
     if (!data.failure && !byte.candidates[0].inside) {
-        session.fail(inData, "beyond the end, the file holds " + std::to_string(data.dataSize) + " bytes of extents",
+        session.fail(inData, "past the end, the file holds " + std::to_string(data.dataSize) + " bytes of extents",
                      tool::EP_ERR_READ_FAILED);
     }
 }
@@ -159,7 +158,7 @@ void printPlaces(const Byte& byte) {
             text.add(candidate.countFrom == CountFrom::file ? ", counted within it"
                                                             : ", counted from the volume's start");
         }
-        text.add(!candidate.position || candidate.inside ? ")\n" : "), behind its end\n");
+        text.add(!candidate.position || candidate.inside ? ")\n" : "), past its end\n");
     }
     const char* separator = "assumed: ";
     for (const std::string& assumption : byte.assumed) {
@@ -204,7 +203,7 @@ void addLocate(Command& parent, Session& session) {
     command.arguments("OFFSET", "Offset of a byte in the LUN; K, M, G, T or KiB, MiB, GiB, TiB may follow",
                       options->offsets, parseSize);
     addPlaceOptions(command, options->place);
-    command.flag("--json", "One JSON object an offset", session.json).action([options, &session] {
+    command.flag("--json", "One JSON object per offset", session.json).action([options, &session] {
         run(*options, session);
     });
 }

@@ -47,7 +47,7 @@ void addLun(Command& parent, Session& session) {
     const auto ranges = std::make_shared<std::vector<Range>>();
     parent.add("lun", "Show the configuration of LUNs and the paths of their map files")
         .arguments("LID", "LUN id; FIRST-LAST for those that exist from FIRST to LAST", *ranges, parseRange32)
-        .flag("--json", "One JSON object a LUN", session.json)
+        .flag("--json", "One JSON object per LUN", session.json)
         .action([ranges, &session] {
             for (const Range range : *ranges) printLuns(session, range);
         });

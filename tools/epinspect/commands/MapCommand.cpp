@@ -96,7 +96,7 @@ void addMap(Command& parent, Session& session) {
         .option("--count", "N", "Entries to show at most (default: all to the end of the file)", options->count,
                 parseNumber)
         .flag("--chart", "A picture instead of the runs", options->chart)
-        .flag("--json", "One JSON object a run, then one that sums up", session.json)
+        .flag("--json", "One JSON object per run, then a summary", session.json)
         .exclusive("--chart", "--json")
         .action([options, &session] { run(*options, session); });
 }

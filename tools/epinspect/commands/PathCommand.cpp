@@ -42,7 +42,7 @@ Command& addKind(Command& path, Session& session, const Options& options, const 
 
 void addPath(Command& parent, Session& session) {
     const auto options = std::make_shared<PathOptions>();
-    Command& path = parent.add("path", "Tell where an EP file lies on the target");
+    Command& path = parent.add("path", "Show where an EP file lies on the target");
     path.group("Kinds of files");
     addKind(path, session, options, "tbl", "The table file of a volume",
             [](const ISCSIEPFile& file, std::string& result) { return file.getTBLFilePath(result); });

@@ -31,7 +31,7 @@ LunName parseLunName(const std::string& text) {
 
 std::optional<LunMap> openLun(Session& session, const PlaceOptions& options) {
     if (!options.lun.lid && !options.extentSize) {
-        throw UsageError{"--extent-size is missing: a map file does not tell it"};
+        throw UsageError{"--extent-size is missing: a map file does not hold it"};
     }
     return openLunMap(session, options.lun, options.extentSize);
 }

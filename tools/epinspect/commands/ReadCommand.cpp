@@ -43,7 +43,7 @@ void run(const ReadOptions& options, Session& session) {
 
 void addRead(Command& parent, Session& session) {
     const auto options = std::make_shared<ReadOptions>();
-    Command& command = parent.add("read", "Write the bytes of a LUN; where they cannot be read, zeros");
+    Command& command = parent.add("read", "Write a LUN's bytes; bytes that cannot be read become zeros");
     addLunArgument(command, options->place);
     command
         .option("--offset", "SIZE", "Byte to start at (default: 0); K, M, G, T or KiB, MiB, GiB, TiB may follow",

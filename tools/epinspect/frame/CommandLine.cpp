@@ -221,7 +221,7 @@ void CommandLine::takeLongOption(const std::string& text) {
         return Command::take(option, "");
     }
     if (equals != std::string::npos) return Command::take(option, text.substr(equals + 1));
-    if (*next_ == nullptr) throw UsageError{text + " lacks its value, " + option.value};
+    if (*next_ == nullptr) throw UsageError{text + " needs a value: " + option.value};
     Command::take(option, *next_++);
 }
 

@@ -28,7 +28,7 @@ void checkAgainstMost(const std::vector<Row>& rows, Rule rule, ValueOf&& valueOf
 }  // namespace
 
 bool checkKind(const StoreFile& file, const tool::ISCSIEPFile& content, Report& report) {
-    if (file.kind == nullptr) report.notCompared("kind: the file's name tells none", file.path);
+    if (file.kind == nullptr) report.notCompared("kind: the file's name does not say which", file.path);
     const auto doubt = kindDoubtOf(content, file.kind);
     if (!doubt) return true;
     Finding finding = {file.path, Rule::kind, Value::number(doubt->type), Value::text(doubt->byName->name)};

@@ -109,7 +109,7 @@ void StoreCheck::useDataFiles(const StoreFile& file, MapRules& rules) {
         report_.notCompared(std::string("missing-data-file, beyond-data-file: ") + why, file.path);
     };
     const auto extentSize = file.lun != nullptr ? std::optional(file.lun->record.extentSize) : options_.extentSize;
-    if (!extentSize) return giveUp("the extent size is not known, --extent-size tells it");
+    if (!extentSize) return giveUp("the extent size is not known, give --extent-size");
     if (*extentSize == 0) return giveUp("the extent size is 0");
     if (file.volume == 0) return giveUp("the path names no volume");
     const std::string path = context_.root.targetPath(file.path);

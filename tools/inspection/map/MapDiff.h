@@ -16,7 +16,7 @@ inline bool isSame(const MapEntry& a, const MapEntry& b) {
     return a.extentAddress == b.extentAddress && a.poolNumber == b.poolNumber && flagsOf(a) == flagsOf(b);
 }
 
-/// How two entries of one index differ; null stands for none, behind the end of the file, which is as good as a hole.
+/// How two entries of one index differ; null stands for none, past the end of the file, which is as good as a hole.
 inline Difference differenceOf(const MapEntry* a, const MapEntry* b) {
     const bool inFirst = a != nullptr && !isHole(*a);
     const bool inSecond = b != nullptr && !isHole(*b);
@@ -32,7 +32,7 @@ inline Difference differenceOf(const MapEntry* a, const MapEntry* b) {
 struct DiffRun {
     /// What one of the maps has there.
     struct Side {
-        std::optional<MapEntry> entry;  ///< the first one; nothing behind the end of the file
+        std::optional<MapEntry> entry;  ///< the first one; nothing past the end of the file
         bool isRun = true;              ///< the other entries continue it as one run
     };
 

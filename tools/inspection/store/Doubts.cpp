@@ -41,7 +41,7 @@ void remarkOnDataStart(Context& context, const tool::ISCSIEPFile& file, const st
     char digits[16];
     const auto end = std::to_chars(digits, digits + sizeof digits, file.head0DataStartOffset, 16).ptr;
     context.remark(name, "data start offset 0x" + std::string(digits, end) + " lies " +
-                             (doubt->insideHeader ? "inside the header block" : "behind the end of the file"));
+                             (doubt->insideHeader ? "inside the header block" : "past the end of the file"));
 }
 
 void remarkOnPartialEntry(Context& context, const tool::ISCSIEPFile& file, const std::string& name) {

@@ -42,15 +42,14 @@ Subject LunMap::subject(const std::string& part) const {
 }
 
 Failure LunMap::pastEnd(const std::string& part) const {
-    return {subject(part), tool::EP_ERR_READ_FAILED, 0,
-            "beyond the end, the LUN has " + std::to_string(size) + " bytes"};
+    return {subject(part), tool::EP_ERR_READ_FAILED, 0, "past the end, the LUN has " + std::to_string(size) + " bytes"};
 }
 
 Failure LunMap::pastMap(const std::string& part) const {
     return {{file, subject(part).part},
             tool::EP_ERR_READ_FAILED,
             0,
-            "beyond the end, the map's entries stand for " + std::to_string(mappableSize()) + " bytes"};
+            "past the end, the map's entries stand for " + std::to_string(mappableSize()) + " bytes"};
 }
 
 std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::optional<std::uint32_t> extentSize) {

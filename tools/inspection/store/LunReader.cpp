@@ -95,11 +95,11 @@ void LunReader::handExtents(const ExtentPlace& place, std::uint64_t offset, std:
     auto counting = countingOf(place, lun_.extentSize, offset, data.dataSize, choice_);
     if (!counting) {  // up to where only one of the two places lies inside the file
         skipped = std::min(length, data.dataSize - (place.inVolume * lun_.extentSize + offset));
-        miss(skipped,
-             {{data.path, ""},
-              tool::EP_ERR_NO_PATH,
-              0,
-              "from where extents are counted is open, both places lie inside the file; --count-from chooses"});
+        miss(skipped, {{data.path, ""},
+                       tool::EP_ERR_NO_PATH,
+                       0,
+                       "ambiguous: extents may be counted within the data file or from the volume's start, and both "
+                       "places lie inside the file; --count-from decides"});
         counting = CountFrom::file;
     }
     const std::uint64_t position = place.counted(*counting) * lun_.extentSize + offset + skipped;
@@ -107,7 +107,7 @@ void LunReader::handExtents(const ExtentPlace& place, std::uint64_t offset, std:
     const std::uint64_t there = position < data.dataSize ? std::min(length, data.dataSize - position) : 0;
     copy(data, position, there);
     miss(length - there,
-         failure("beyond the end, the file holds " + std::to_string(data.dataSize) + " bytes of extents"));
+         failure("past the end, the file holds " + std::to_string(data.dataSize) + " bytes of extents"));
 }
 
 /// `position` counts from the data start offset.
