@@ -57,6 +57,6 @@ if(ISCSIEPTOOL_BUILD_TOOLS)
   install(DIRECTORY man/ DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT tools FILES_MATCHING PATTERN *.1)
   install(FILES tools/epinspect/completion.bash RENAME epinspect
     DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions COMPONENT tools)
-  install(FILES docs/ep-files.md docs/epinspect-json.md
+  install(FILES docs/broken-store.md docs/ep-files.md docs/epinspect-json.md docs/findings.md
     DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/epinspect COMPONENT tools)
 endif()

@@ -19,6 +19,13 @@ symbols=$(nm -DC --defined-only "$build/lib/libiscsieptool.so.1" | cut -d' ' -f3
 # An installation works wherever it is moved, for both kinds of consumer.
 cmake --install "$build" --prefix "$scratch/first" >/dev/null
 mv "$scratch/first" "$scratch/moved"
+# With the programs come their manual pages, and every document that these name.
+for document in $(grep -ohE '[a-z-]+\.md$' "$scratch"/moved/share/man/man1/*.1 | sort -u); do
+  [ -s "$scratch/moved/share/doc/epinspect/$document" ] || fail "the manual names $document, which is not installed"
+done
+[ -s "$scratch/moved/share/man/man1/epsample.1" ] || fail "no manual page"
+[ -s "$scratch/moved/share/bash-completion/completions/epinspect" ] || fail "no completion"
+
 export PKG_CONFIG_PATH=$scratch/moved/lib/pkgconfig LD_LIBRARY_PATH=$scratch/moved/lib
 cp -r "$source/examples/consumer" "$scratch/pkgconfig"
 make -s -C "$scratch/pkgconfig"
