@@ -1,164 +1,165 @@
-// epinspect diff: what differs between two map files, entry by entry.
-#include <cerrno>
+// epinspect diff: what differs between two files of a kind, or between two stores.
+#include <filesystem>
 #include <memory>
 
 #include "commands/Commands.h"
-#include "commands/MapOutput.h"
-#include "frame/Json.h"
-#include "frame/Output.h"
-#include "map/MapDiff.h"
-#include "map/MapWalk.h"
-#include "store/OpenMap.h"
+#include "commands/DiffOutput.h"
+#include "store/FileDiff.h"
+#include "store/Store.h"
 
 namespace epinspect {
 
 namespace {
 
 struct DiffOptions {
-    std::vector<std::string> files;
+    std::string a, b;
+    bool headersOnly = false;
+    bool entriesOnly = false;
 };
 
-/// What a difference is called in the listing and in JSON.
-struct DifferenceName {
-    const char* text;
-    const char* json;
+/// One of two stores, below a folder of its own. What failed there is said with that folder.
+class SideOfDiff : public Context {
+public:
+    SideOfDiff(Session& session, const std::string& folder) : session_(session), folder_(folder) {
+        const std::error_code error = root.set(folder);
+        if (error) throw UsageError{"'" + folder + "': " + error.message()};
+        while (folder_.size() > 1 && folder_.back() == '/') folder_.pop_back();
+    }
+
+    void failed(const Failure& failure) override {
+        Failure here = failure;
+        if (!here.subject.file.empty()) here.subject.file = folder_ + here.subject.file;
+        session_.failed(here);
+    }
+
+    void remark(const std::string& subject, const std::string& text) override {
+        session_.remark(folder_ + subject, text);
+    }
+
+    void progress(const char* things, std::uint64_t done, std::uint64_t total) override {
+        session_.progress(things, done, total);
+    }
+
+    void trying(bool begins) override { session_.trying(begins); }
+
+private:
+    Session& session_;
+    std::string folder_;
 };
 
-DifferenceName nameOf(Difference difference) {
-    switch (difference) {
-        case Difference::onlyFirst:
-            return {"only in the first", "only-first"};
-        case Difference::onlySecond:
-            return {"only in the second", "only-second"};
-        case Difference::moved:
-            return {"moved", "moved"};
-        default:
-            return {"flags changed", "flags"};
+/// A file on one side, as it is called there.
+struct DiffSide {
+    Context& context;
+    const std::string& name;
+};
+
+/// Compares two files and counts what differs. What cannot be read is reported.
+class FilesDiff {
+public:
+    FilesDiff(const DiffScope& scope, DiffTotals& totals) : scope_(scope), totals_(totals) {}
+
+    /// Returns whether both files could be compared to their end.
+    bool compare(const DiffSide& a, const DiffSide& b, DiffOutput& output) {
+        bool isMap = scope_.entries && !scope_.headers;
+        if (scope_.headers) {
+            const OpenedHeader headers[] = {openHeader(a.context, a.name), openHeader(b.context, b.name)};
+            if (!headers[0].file || !headers[1].file) return false;
+            if (!areAlike(headers[0], headers[1], a, b)) return false;
+            for (const FieldDifference& difference : fieldDifferencesOf(*headers[0].file, *headers[1].file)) {
+                ++totals_.fields;
+                output.print(difference);
+            }
+            isMap = headers[0].kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP && scope_.entries;
+        }
+        return !isMap || compareMaps(a, b, output);
     }
-}
 
-/// A side of a difference; of entries that are no run the first one, which the mark behind it says.
-void writeSide(LineBuffer& line, const DiffRun::Side& side, std::uint64_t count) {
-    writeEntries(line, *side.entry, side.isRun ? count : 1);
-    if (!side.isRun) line.add(" ...");
-}
-
-void printRun(LineBuffer& line, const DiffRun& run) {
-    line.clear();
-    writeRange(line, run.first, run.count);
-    line.add(": ", nameOf(run.difference).text, ": ");
-    if (run.difference != Difference::onlySecond) writeSide(line, run.a, run.count);
-    if (run.difference == Difference::moved || run.difference == Difference::flags) line.add(" -> ");
-    if (run.difference != Difference::onlyFirst) writeSide(line, run.b, run.count);
-    line.add("\n");
-    print(line.view());
-}
-
-template <std::size_t keySize>
-void writeSide(Json& json, const char (&name)[keySize], const DiffRun::Side& side) {
-    if (!side.entry) {
-        json.null(name);
-        return;
+private:
+    bool areAlike(const OpenedHeader& one, const OpenedHeader& other, const DiffSide& a, const DiffSide& b) {
+        if (one.kind == other.kind) return true;
+        a.context.fail({a.name, ""},
+                       std::string("is a ") + one.kind->title + ", but " + b.name + " is a " + other.kind->title +
+                           ": only files of one kind can be compared",
+                       ISCSI::TOOL::EP_ERR_WRONG_FILE_TYPE);
+        return false;
     }
-    writeMembers(json.beginObject(name), *side.entry);
-    json.endObject();
-}
 
-void printRun(Json& json, const std::string& otherFile, const DiffRun& run) {
-    json.begin("difference").path("otherFile", otherFile).number("first", run.first).number("count", run.count);
-    json.text("difference", nameOf(run.difference).json);
-    writeSide(json, "a", run.a);
-    writeSide(json, "b", run.b);
-    json.end();
-}
-
-void printSummary(const DiffSummary& summary) {
-    const std::string entries = counted(summary.entries, "entry", "entries") + ": ";
-    if (summary.same() == summary.entries) {
-        print(entries + "no difference\n");
-        return;
+    bool compareMaps(const DiffSide& a, const DiffSide& b, DiffOutput& output) {
+        ComparedMap maps[] = {{a.context, a.name, openMap(a.context, a.name)},
+                              {b.context, b.name, openMap(b.context, b.name)}};
+        if (!maps[0].map.file || !maps[1].map.file) return false;
+        totals_.entries.entries += std::max(maps[0].map.entries, maps[1].map.entries);
+        return compareEntries(maps[0], maps[1], [&](const DiffRun& run) {
+            totals_.entries.add(run);
+            output.print(run);
+        });
     }
-    print(entries + std::to_string(summary.same()) + " same, " + std::to_string(summary.onlyFirst) +
-          " only in the first, " + std::to_string(summary.onlySecond) + " only in the second, " +
-          std::to_string(summary.moved) + " moved, " + std::to_string(summary.flags) + " with other flags\n");
+
+    const DiffScope& scope_;
+    DiffTotals& totals_;
+};
+
+void compareFiles(const DiffOptions& options, const DiffScope& scope, Session& session) {
+    DiffTotals totals;
+    DiffOutput output(session, options.a, options.b, "");
+    if (!FilesDiff(scope, totals).compare({session, options.a}, {session, options.b}, output)) return;
+    printSummary(session, options.a, options.b, totals, scope);
 }
 
-void printSummary(Json& json, const std::string& otherFile, const DiffSummary& summary) {
-    json.begin("summary")
-        .path("otherFile", otherFile)
-        .boolean("summary", true)
-        .number("same", summary.same())
-        .number("onlyFirst", summary.onlyFirst)
-        .number("onlySecond", summary.onlySecond)
-        .number("moved", summary.moved)
-        .number("flags", summary.flags)
-        .end();
+/// Data files are compared by header and size; so are all others but maps, whose entries are compared.
+void compareSizes(const FilePair& pair, DiffOutput& output, DiffTotals& totals) {
+    if (pair.a->size == pair.b->size || pair.a->kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP) return;
+    ++totals.fields;
+    output.print(FieldDifference({"size", HeaderField::Form::number, pair.a->size},
+                                 {"size", HeaderField::Form::number, pair.b->size}));
 }
 
-/// Reads the entries of a map from `first` on, up to `wanted`, into `block`. Reports failures.
-bool readBlock(Session& session, const std::string& name, const OpenedMap& map, std::uint64_t first,
-               std::uint64_t wanted, std::vector<MapEntry>& block) {
-    const auto count = std::min(wanted, map.entries - std::min(first, map.entries));
-    const int error = map.file->getMapEntries(first, count, block);
-    const int reason = errno;
-    const auto failure = endOfRead(name, first + (error == 0 ? block.size() : 0), error, reason, block.size() == count);
-    if (failure) session.failed(*failure);
-    return !failure;
-}
-
-/// Compares both maps and gives runs of differences to each(run). Returns whether all entries could be read.
-template <typename Each>
-bool compareMaps(const DiffOptions& options, Session& session, const OpenedMap (&maps)[2], std::uint64_t entries,
-                 Each&& each) {
-    constexpr std::uint64_t blockSize = 4096;
-    std::vector<MapEntry> a;
-    std::vector<MapEntry> b;
-    MapDiff diff;
-    bool complete = true;
-    for (std::uint64_t first = 0; first < entries && complete; first += blockSize) {
-        session.progress("entries", first, entries);
-        const auto wanted = std::min(entries - first, blockSize);
-        complete = readBlock(session, options.files[0], maps[0], first, wanted, a) &&
-                   readBlock(session, options.files[1], maps[1], first, wanted, b);
-        if (complete) diff.add(first, a, b, each);
+void compareStores(const DiffOptions& options, DiffScope scope, Session& session) {
+    scope.stores = true;
+    SideOfDiff sides[] = {{session, options.a}, {session, options.b}};
+    DiffTotals totals;
+    FilesDiff files(scope, totals);
+    Store stores[] = {Store(sides[0], usualLids), Store(sides[1], usualLids)};
+    for (const FilePair& pair : pairFiles(stores[0], stores[1])) {
+        ++totals.files;
+        if (!pair.a || !pair.b) {
+            ++(pair.a ? totals.onlyFirst : totals.onlySecond);
+            printOnlyInOne(session, pair);
+            continue;
+        }
+        const std::string& path = pair.a->path;
+        DiffOutput output(session, path, path, path);
+        if (scope.headers) compareSizes(pair, output, totals);
+        const bool isMap = pair.a->kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
+        if (scope.headers || isMap) files.compare({sides[0], path}, {sides[1], path}, output);
     }
-    diff.finish(each);
-    return complete;
+    printSummary(session, options.a, options.b, totals, scope);
 }
 
 void run(const DiffOptions& options, Session& session) {
-    const OpenedMap maps[] = {openMap(session, options.files[0]), openMap(session, options.files[1])};
-    if (!maps[0].file || !maps[1].file) return;
-    DiffSummary summary;
-    summary.entries = std::max(maps[0].entries, maps[1].entries);
-    Json json(options.files[0]);
-    LineBuffer line;
-    const auto each = [&](const DiffRun& run) {
-        session.differences = true;
-        summary.add(run);
-        if (session.json) {
-            printRun(json, options.files[1], run);
-        } else {
-            printRun(line, run);
-        }
-    };
-    if (!compareMaps(options, session, maps, summary.entries, each)) return;
-    if (session.json) {
-        printSummary(json, options.files[1], summary);
-    } else {
-        printSummary(summary);
-    }
+    DiffScope scope;
+    scope.headers = !options.entriesOnly;
+    scope.entries = !options.headersOnly;
+    std::error_code error;
+    const bool folders[] = {std::filesystem::is_directory(options.a, error),
+                            std::filesystem::is_directory(options.b, error)};
+    if (folders[0] != folders[1]) throw UsageError{"A and B must both be files, or both be folders"};
+    if (!folders[0]) return compareFiles(options, scope, session);
+    if (session.root.isFolder()) throw UsageError{"--root: not with two folders, each of which is a root itself"};
+    compareStores(options, scope, session);
 }
 
 }  // namespace
 
 void addDiff(Command& parent, Session& session) {
     const auto options = std::make_shared<DiffOptions>();
-    options->files.resize(2);
-    parent.add("diff", "Show what differs between two map files")
-        .argument("MAPFILE", "Map file of a LUN", options->files[0])
-        .argument("MAPFILE", "Map file to compare it with", options->files[1])
-        .flag("--json", "One JSON object per run of differences, then a summary", session.json)
+    parent.add("diff", "Show what differs between two files, or between two stores")
+        .argument("A", "An EP file, or the folder of a store", options->a)
+        .argument("B", "What to compare it with: a file of the same kind, or another folder", options->b)
+        .flag("--headers", "Compare the fields of header blocks alone", options->headersOnly)
+        .flag("--entries", "Compare the entries of maps alone", options->entriesOnly)
+        .flag("--json", "One JSON object per difference, then a summary", session.json)
+        .exclusive("--headers", "--entries")
         .action([options, &session] { run(*options, session); });
 }
 

@@ -2,11 +2,11 @@
 #include <memory>
 
 #include "commands/Commands.h"
+#include "commands/HeaderOutput.h"
 #include "frame/Json.h"
 #include "frame/Output.h"
 #include "store/Doubts.h"
 #include "store/FileKind.h"
-#include "store/HeaderFields.h"
 
 namespace epinspect {
 
@@ -36,24 +36,6 @@ const FileKind* parseKind(const std::string& name) {
     return kind;
 }
 
-void writeField(Json& object, const HeaderField& field) {
-    switch (field.form) {
-        case HeaderField::Form::number:
-        case HeaderField::Form::time:
-            object.number(std::string_view(field.name), field.number);
-            break;
-        case HeaderField::Form::hexadecimal:
-            object.hexadecimal(std::string_view(field.name), field.number);
-            break;
-        case HeaderField::Form::text:
-            object.text(field.name, field.texts[0]);
-            break;
-        case HeaderField::Form::texts:
-            object.texts(field.name, field.texts);
-            break;
-    }
-}
-
 void dumpFile(const DumpOptions& options, Session& session, const std::string& name) {
     const std::optional<std::string> path = session.openablePath(name);
     if (!path) return;
@@ -69,7 +51,7 @@ void dumpFile(const DumpOptions& options, Session& session, const std::string& n
     if (session.json) {
         Json object(name);
         object.begin(kind->name);
-        for (const HeaderField& field : headerFieldsOf(*file)) writeField(object, field);
+        for (const HeaderField& field : headerFieldsOf(*file)) writeValue(object, field.name, field);
         object.end();
         return;
     }
