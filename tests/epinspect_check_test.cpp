@@ -62,27 +62,27 @@ const std::string shorter = "epinspect: s: entry …: the file has become shorte
 
 // clang-format off
 const Case cases[] = {
-    {"diff tells runs of differences", "epinspect diff a b", 3,
+    {"diff tells runs of differences", "epinspect diff --entries a b", 3,
      "1-2: moved: mapped, pool 0, extents 1-2 -> mapped, pool 0, extent 9 ...\n"
      "3-4: flags changed: mapped, pool 0, extents 3-4 -> mapped synced, pool 0, extents 3-4\n"
      "5: only in the first: mapped, pool 0, extent 5\n7: only in the second: unmapped, pool 0, extent 6\n"
      "8: only in the first: unmapped, pool 0, extent 7\n"
      "10 entries: 3 same, 2 only in the first, 1 only in the second, 2 moved, 2 with other flags\n", ""},
-    {"diff writes both entries as JSON", "epinspect diff none y --json; epinspect diff a b --json | cut -d, -f 4-6 | head -n 5", 0, R"({"kind":"difference","file":"none","otherFile":"y","first":0,"count":4,"difference":"only-second","a":null,"b":{"extentAddress":12,"poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":true}}
-{"kind":"summary","file":"none","otherFile":"y","summary":true,"same":0,"onlyFirst":0,"onlySecond":4,"moved":0,"flags":0}
+    {"diff writes both entries as JSON", "epinspect diff --entries none y --json; epinspect diff --entries a b --json | cut -d, -f 4-6 | head -n 5", 0, R"({"kind":"difference","file":"none","otherFile":"y","first":0,"count":4,"difference":"only-second","a":null,"b":{"extentAddress":12,"poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":true}}
+{"kind":"summary","file":"none","otherFile":"y","summary":true,"fields":0,"same":0,"onlyFirst":0,"onlySecond":4,"moved":0,"flags":0}
 "first":1,"count":2,"difference":"moved"
 "first":3,"count":2,"difference":"flags"
 "first":5,"count":1,"difference":"only-first"
 "first":7,"count":1,"difference":"only-second"
 "first":8,"count":1,"difference":"only-first"
 )", ""},
-    {"diff joins what stands against a hole and what stands against nothing", "epinspect diff x one; epinspect diff one x", 3,
+    {"diff joins what stands against a hole and what stands against nothing", "epinspect diff --entries x one; epinspect diff --entries one x", 3,
      "0-3: only in the first: mapped, pool 0, extents 10-13\n5-6: only in the first: mapped, pool 0, extent 11 ...\n"
      "7 entries: 1 same, 6 only in the first, 0 only in the second, 0 moved, 0 with other flags\n"
      "0-3: only in the second: mapped, pool 0, extents 10-13\n…", ""},
-    {"diff takes a hole for nothing", "cp a b; truncate -s +24 b; epinspect diff a b && epinspect diff b a", 0,
+    {"diff takes a hole for nothing", "cp a b; truncate -s +24 b; epinspect diff --entries a b && epinspect diff --entries b a", 0,
      "12 entries: no difference\n12 entries: no difference\n", ""},
-    {"diff joins what two blocks share", "epinspect diff large moved", 3,
+    {"diff joins what two blocks share", "epinspect diff --entries large moved", 3,
      "4000-4199: moved: mapped, pool 0, extents 8096-8295 -> mapped, pool 0, extents 4000-4199\n"
      "20000 entries: 19800 same, 0 only in the first, 0 only in the second, 200 moved, 0 with other flags\n", ""},
     {"find tells owners across LUNs", "epinspect --root store find --extent 63-64; epinspect --root store find --pool 32 --json | sed -n '1s/.*vpulled/vpulled/p'", 0,
@@ -162,12 +162,13 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "Not compared: what else concerns a map file: the type is another: volume1/@iSCSI/LUN/t\n",
      "epinspect: /volume1/@iSCSI/EP/: cannot be opened: Not a directory (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"diff and find and check say that a map became shorter",
-     "for what in 'diff s none' 'find s --pool 0' 'check s'; do cp scattered s; { epinspect $what; echo $?; } |"
+     "for what in 'diff --entries s none' 'find s --pool 0' 'check s'; do cp scattered s; { epinspect $what; echo $?; } |"
      " { read first; truncate -s 90000 s; tail -n 1; }; done", 0, "1\n1\n1\n", shorter + shorter + shorter},
     {"diff and find and check name what is wrong",
-     "epinspect diff gone other; epinspect diff a; epinspect find a; epinspect check --extent-size 0", 2, "",
-     "epinspect: gone: cannot be opened: No such…epinspect: other: cannot be opened: neither a regular file…"
-     "epinspect: MAPFILE is missing. Try 'epinspect diff --help'.\n"
+     "epinspect diff gone other; epinspect diff gone one; epinspect diff a; epinspect find a; epinspect check --extent-size 0", 2, "",
+     "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"
+     "epinspect: gone: cannot be opened: No such…"
+     "epinspect: B is missing. Try 'epinspect diff --help'.\n"
      "epinspect: --extent or --pool is missing. Try…epinspect: --extent-size: '0': must not be 0. Try 'epinspect check --help'.\n"},
 };
 

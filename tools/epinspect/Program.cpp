@@ -22,6 +22,7 @@ int run(int argc, char** argv) {
     addList(program, session);
     addDump(program, session);
     addCheck(program, session);
+    addCollect(program, session);
     program.group("Entries of a map");
     addMap(program, session);
     addEntry(program, session);
@@ -44,6 +45,10 @@ int run(int argc, char** argv) {
                 })
         .flag("-v, --verbose", "Show the library's log lines on standard error", showLogLines);
 
+    line.beforeAction([&session] {
+        if (session.damagedCollection) session.failed(*session.damagedCollection);
+        return !session.damagedCollection;
+    });
     if (!line.run(argc, argv)) return 2;
     finishOutput();
     return session.status();

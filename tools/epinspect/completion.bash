@@ -11,7 +11,7 @@ _epinspect_files() {
 
 _epinspect() {
     local word before command='' kind='' root='' files='' piece replaced pieces=() typed=() index
-    local commands='list dump check map entry diff find locate read extent lun path help' kinds='tbl fri jnl map dat'
+    local commands='list dump check collect map entry diff find locate read extent lun path help' kinds='tbl fri jnl map dat'
     local common='--root --verbose --help'
     COMPREPLY=()
     # The words as the shell will see them: bash breaks them at "=" and "@".
@@ -49,7 +49,9 @@ _epinspect() {
         list) options+=' --luns --json' ;;
         dump) options+=' --as --json' ;;
         check) options+=' --luns --extent-size --json' ;;
-        entry | diff | lun) options+=' --json' ;;
+        collect) options+=' --luns' ;;
+        entry | lun) options+=' --json' ;;
+        diff) options+=' --headers --entries --json' ;;
         find) options+=' --extent --pool --json' ;;
         locate) options+=' --extent-size --address-bits --count-from --json' ;;
         read) options+=' --offset --length --extent-size --address-bits --count-from' ;;

@@ -35,12 +35,13 @@ const char* meaningOf(int error) {
 }
 
 std::string whatFailed(const Failure& failure) {
-    if (!failure.what.empty()) return failure.what;
+    const std::string why = failure.reason != 0 ? ": " + systemText(failure.reason) : "";
+    if (!failure.what.empty()) return failure.what + why;
     if (tool::GetErrorName(failure.error) == nullptr) {
-        const std::string why = tool::ISCSILUNConfInfo::getErrorText(failure.error);
-        return "configuration cannot be loaded" + (why.empty() ? why : ": " + why);
+        const std::string text = tool::ISCSILUNConfInfo::getErrorText(failure.error);
+        return "configuration cannot be loaded" + (text.empty() ? text : ": " + text);
     }
-    if (failure.reason != 0) return meaningOf(failure.error) + (": " + systemText(failure.reason));
+    if (failure.reason != 0) return meaningOf(failure.error) + why;
     return failure.error == tool::EP_ERR_READ_FAILED ? "ends too early" : meaningOf(failure.error);
 }
 
@@ -52,9 +53,10 @@ std::string textOf(const Subject& subject) {
 }
 
 std::string messageOf(const Failure& failure) {
+    const std::string text = textOf(failure.subject) + ": " + whatFailed(failure);
+    if (failure.error == 0) return text;
     const char* name = tool::GetErrorName(failure.error);
-    return textOf(failure.subject) + ": " + whatFailed(failure) + " (" +
-           (name != nullptr ? name + std::string(", ") : "code ") + std::to_string(failure.error) + ")";
+    return text + " (" + (name != nullptr ? name + std::string(", ") : "code ") + std::to_string(failure.error) + ")";
 }
 
 Failure pastEnd(const std::string& file, const std::string& place, unsigned long long count) {

@@ -28,6 +28,7 @@ void addCheck(Command& parent, Session& session) {
                 options->extentSize, parseExtentSize)
         .flag("--json", "One JSON object per finding, then a summary", session.json)
         .action([options, &session] {
+            session.remarkOnCollection();
             FindingOutput output(session);
             Report report([&output](const Finding& finding) { output.print(finding); });
             StoreCheck(session, *options, report).run();

@@ -9,6 +9,7 @@ namespace epinspect {
 void addList(Command& parent, Session& session);
 void addDump(Command& parent, Session& session);
 void addCheck(Command& parent, Session& session);
+void addCollect(Command& parent, Session& session);
 void addMap(Command& parent, Session& session);
 void addEntry(Command& parent, Session& session);
 void addDiff(Command& parent, Session& session);

@@ -21,7 +21,7 @@ struct DiffOptions {
 class SideOfDiff : public Context {
 public:
     SideOfDiff(Session& session, const std::string& folder) : session_(session), folder_(folder) {
-        const std::error_code error = root.set(folder);
+        const std::error_code error = setRoot(folder);
         if (error) throw UsageError{"'" + folder + "': " + error.message()};
         while (folder_.size() > 1 && folder_.back() == '/') folder_.pop_back();
     }
@@ -58,9 +58,9 @@ class FilesDiff {
 public:
     FilesDiff(const DiffScope& scope, DiffTotals& totals) : scope_(scope), totals_(totals) {}
 
-    /// Returns whether both files could be compared to their end.
-    bool compare(const DiffSide& a, const DiffSide& b, DiffOutput& output) {
-        bool isMap = scope_.entries && !scope_.headers;
+    /// Returns whether both files could be compared to their end. Without `isMap` only headers were.
+    bool compare(const DiffSide& a, const DiffSide& b, DiffOutput& output, bool& isMap) {
+        isMap = scope_.entries && !scope_.headers;
         if (scope_.headers) {
             const OpenedHeader headers[] = {openHeader(a.context, a.name), openHeader(b.context, b.name)};
             if (!headers[0].file || !headers[1].file) return false;
@@ -99,10 +99,12 @@ private:
     DiffTotals& totals_;
 };
 
-void compareFiles(const DiffOptions& options, const DiffScope& scope, Session& session) {
+void compareFiles(const DiffOptions& options, DiffScope scope, Session& session) {
     DiffTotals totals;
     DiffOutput output(session, options.a, options.b, "");
-    if (!FilesDiff(scope, totals).compare({session, options.a}, {session, options.b}, output)) return;
+    bool areMaps = false;
+    if (!FilesDiff(scope, totals).compare({session, options.a}, {session, options.b}, output, areMaps)) return;
+    scope.entries = areMaps;
     printSummary(session, options.a, options.b, totals, scope);
 }
 
@@ -130,8 +132,8 @@ void compareStores(const DiffOptions& options, DiffScope scope, Session& session
         const std::string& path = pair.a->path;
         DiffOutput output(session, path, path, path);
         if (scope.headers) compareSizes(pair, output, totals);
-        const bool isMap = pair.a->kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
-        if (scope.headers || isMap) files.compare({sides[0], path}, {sides[1], path}, output);
+        bool isMap = pair.a->kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
+        if (scope.headers || isMap) files.compare({sides[0], path}, {sides[1], path}, output, isMap);
     }
     printSummary(session, options.a, options.b, totals, scope);
 }

@@ -26,10 +26,17 @@ struct ExtentOptions {
 };
 
 /// How many whole extents the file holds, or nothing when its size cannot be told.
-std::optional<std::uint64_t> extentCount(const tool::ISCSIEPFileDAT& file, std::uint32_t extentSize) {
-    const auto size = sizeOf(file.path);
+std::optional<std::uint64_t> extentCount(const Session& session, const tool::ISCSIEPFileDAT& file,
+                                         std::uint32_t extentSize) {
+    const auto size = session.sizeOf(file.path);
     if (!size) return std::nullopt;
     return payloadOf(file, *size) / extentSize;
+}
+
+/// Whether the bytes of the extent are here; in a collection they are not.
+bool isHeld(const Session& session, const tool::ISCSIEPFileDAT& file, const ExtentOptions& options) {
+    if (!session.collection) return true;
+    return payloadOf(file, sizeOf(file.path).value_or(0)) / options.extentSize > options.index;
 }
 
 /// Prints the extent block by block, so that its size does not matter. Returns 0 or the code of the read that failed.
@@ -64,11 +71,13 @@ void run(const ExtentOptions& options, Session& session) {
     // Nothing is read yet: this tells whether there can be extents at all.
     if (!session.succeeded(file.getExtentBytes(0, options.extentSize, 0, 0, nullptr), {options.file, place})) return;
     remarkOnDataStart(session, file, options.file);
-    const auto count = extentCount(file, options.extentSize);
+    const auto count = extentCount(session, file, options.extentSize);
     if (!count) {
         session.succeeded(tool::EP_ERR_OPEN_FAILED, {options.file, place});
     } else if (options.index >= *count) {
         session.failed(pastEnd(options.file, place, *count));
+    } else if (!isHeld(session, file, options)) {
+        session.fail({options.file, place}, notCollectedText, tool::EP_ERR_READ_FAILED);
     } else {
         session.succeeded(printExtent(options, session, file), {options.file, place});
     }

@@ -75,6 +75,7 @@ void sayNoLuns(Session& session, Range lids, bool askedFor) {
 }
 
 void run(Session& session, const std::optional<Range>& lids) {
+    session.remarkOnCollection();
     Store store(session, lids.value_or(usualLids));
     if (store.luns().empty()) sayNoLuns(session, lids.value_or(usualLids), lids.has_value());
     bool any = false;

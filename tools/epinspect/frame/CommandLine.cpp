@@ -179,7 +179,7 @@ bool CommandLine::run(int argc, char** argv) {
             print(program_.name_ + " " + versionText_ + "\n");
         } else {
             current_->checkWhole();
-            current_->run_();
+            if (prepare_()) current_->run_();
         }
         return true;
     } catch (const UsageError& error) {

@@ -125,6 +125,9 @@ public:
     /// Options that may stand anywhere.
     Command& everywhere() { return everywhere_; }
 
+    /// What is done before a subcommand; with false the subcommand is not.
+    void beforeAction(std::function<bool()> prepare) { prepare_ = std::move(prepare); }
+
     /// Parses the command line and does what it says. Returns false after wrong usage, which it complains about.
     bool run(int argc, char** argv);
 
@@ -143,6 +146,7 @@ private:
     bool help_ = false;
     bool version_ = false;
     std::vector<std::string> helpOn_;
+    std::function<bool()> prepare_ = [] { return true; };
     char** next_ = nullptr;  ///< the argument that is parsed next; null ends them
 };
 

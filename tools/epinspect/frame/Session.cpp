@@ -1,7 +1,9 @@
 #include "frame/Session.h"
 
 #include <etc/ISCSIEPDiagnostics.h>
+#include <etc/ISCSIQuorinStringTool.h>
 
+#include "frame/Interruption.h"
 #include "frame/Json.h"
 #include "frame/Output.h"
 #include "frame/UsageError.h"
@@ -9,10 +11,19 @@
 namespace epinspect {
 
 void Session::setRoot(const std::string& folder) {
-    const std::error_code error = root.set(folder);
+    const std::error_code error = Context::setRoot(folder);
     if (error == std::errc::not_a_directory) throw UsageError{"not a folder"};
     if (error) throw UsageError{error.message()};
     quiet_.emplace();
+}
+
+void Session::remarkOnCollection() {
+    if (!collection) return;
+    const auto time = static_cast<unsigned int>(collection->time);
+    std::string text = "a collection of " + ISCSI::TOOL::GetTimeInString(time) + ", without data, made by ";
+    text += collection->program;
+    if (!collection->complete) text += "; it is incomplete";
+    remark(root.hostPath(""), text);
 }
 
 void Session::failed(const Failure& failure) {
@@ -50,6 +61,8 @@ void Session::trying(bool begins) {
         quietTrials_.emplace();
     }
 }
+
+bool Session::interrupted() { return isInterrupted(); }
 
 int Session::status() const {
     if (failed_) return 1;

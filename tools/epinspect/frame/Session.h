@@ -21,12 +21,16 @@ public:
     /// cannot.
     void setRoot(const std::string& folder);
 
+    /// Says on standard error when what is looked at is a collection, and of when.
+    void remarkOnCollection();
+
     /// Prints the message, as an object too with --json. The exit status is 1 from then on. Throws OutputFailure.
     void failed(const Failure& failure) override;
 
     void remark(const std::string& subject, const std::string& text) override;
     void progress(const char* things, std::uint64_t done, std::uint64_t total) override;
     void trying(bool begins) override;
+    bool interrupted() override;
 
     /// Takes the line that shows the progress away, for good.
     void endProgress() { progress_.reset(); }

@@ -144,7 +144,7 @@ std::optional<std::uint32_t> StoreCheck::tableExtentSize(const std::string& path
     const auto [row, added] = tables_.try_emplace(path);
     if (!added || !files_.areNamed() || checked_.count(path) > 0) return row->second;
     const std::optional<std::string> hostPath = context_.openablePath(path);
-    if (!hostPath || (!sizeOf(*hostPath) && errno == ENOENT)) return std::nullopt;
+    if (!hostPath || (!context_.sizeOf(*hostPath) && errno == ENOENT)) return std::nullopt;
     tool::ISCSIEPFileTBL table(*hostPath);
     if (context_.succeeded(table.parseFile(), {path, ""})) row->second = table.extentSize;
     return row->second;

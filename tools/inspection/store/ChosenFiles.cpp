@@ -30,7 +30,7 @@ void ChosenFiles::forEach(const std::function<void(const StoreFile&)>& each) {
         file.kind = kindByName(targetPath);
         file.path = name;
         file.hostPath = *path;
-        file.size = sizeOf(*path).value_or(0);
+        file.size = context_.sizeOf(*path).value_or(0);
         file.volume = volumeOf(context_, targetPath);
         file.lun = lunOf(targetPath);
         each(file);

@@ -6,9 +6,25 @@
 #include <cstdlib>
 #include <utility>
 
+#include "store/FileSize.h"
+
 namespace inspection {
 
 namespace tool = ISCSI::TOOL;
+
+std::error_code Context::setRoot(const std::string& folder) {
+    const std::error_code error = root.set(folder);
+    if (error) return error;
+    auto found = Collection::read(folder);
+    if (auto* made = std::get_if<Collection>(&found)) collection = std::move(*made);
+    if (auto* failure = std::get_if<Failure>(&found)) damagedCollection = std::move(*failure);
+    return {};
+}
+
+std::optional<std::uint64_t> Context::sizeOf(const std::string& hostPath) const {
+    const auto size = collection ? collection->sizeOf(hostPath) : std::nullopt;
+    return size ? size : inspection::sizeOf(hostPath);
+}
 
 bool Context::succeeded(int error, const Subject& subject) {
     if (error != 0) failed({subject, error, errno, {}});

@@ -8,6 +8,7 @@
 #include <string_view>
 
 #include "Failure.h"
+#include "store/Collection.h"
 #include "store/TargetRoot.h"
 
 namespace inspection {
@@ -22,6 +23,20 @@ public:
 
     TargetRoot root;
 
+    /// Set where the root folder is a collection.
+    std::optional<Collection> collection;
+
+    /// Makes `folder` stand for / of the target, and reads what it says as a collection, if it is one. Returns why it
+    /// cannot; the root then stays as it was.
+    std::error_code setRoot(const std::string& folder);
+
+    /// The failure to read the folder as a collection, which is damaged.
+    std::optional<Failure> damagedCollection;
+
+    /// Bytes of the file or device at `hostPath`, of a collection those that it has on the target. Nothing when that
+    /// cannot be told; errno then says why.
+    std::optional<std::uint64_t> sizeOf(const std::string& hostPath) const;
+
     /// Something failed; what was asked for beside it goes on.
     virtual void failed(const Failure& failure) = 0;
 
@@ -30,6 +45,9 @@ public:
 
     /// Of a long work, `done` of `total` of `things` ("entries") are done. Called now and then.
     virtual void progress(const char* things, std::uint64_t done, std::uint64_t total) = 0;
+
+    /// Whether a long work is to end early, because the user wants so.
+    virtual bool interrupted() { return false; }
 
     /// Until the call with false, the log lines of the library are about what is only tried out. May be nested.
     virtual void trying(bool begins) = 0;

@@ -2,6 +2,7 @@
 
 #include <etc/ISCSIEPFormat.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <utility>
 
@@ -71,10 +72,11 @@ DataFile DataFiles::open(std::uint64_t number) {
     const int reason = errno;
     data.missing = error == tool::EP_ERR_OPEN_FAILED && (reason == ENOENT || reason == ENOTDIR);
     if (error != 0) return failed(error, reason);
-    const auto size = sizeOf(hostPath);
+    const auto size = context_.sizeOf(hostPath);
     if (!size) return failed(tool::EP_ERR_OPEN_FAILED, errno);
     if (remarks_) remarkOnDataStart(context_, *data.file, data.path);
     data.dataSize = payloadOf(*data.file, *size);
+    data.held = std::min(data.dataSize, payloadOf(*data.file, sizeOf(hostPath).value_or(0)));
     return data;
 }
 

@@ -36,7 +36,7 @@ void remarkOnKind(Context& context, const tool::ISCSIEPFile& file, const std::st
 }
 
 void remarkOnDataStart(Context& context, const tool::ISCSIEPFile& file, const std::string& name) {
-    const auto doubt = dataStartDoubtOf(file, sizeOf(file.path));
+    const auto doubt = dataStartDoubtOf(file, context.sizeOf(file.path));
     if (!doubt) return;
     char digits[16];
     const auto end = std::to_chars(digits, digits + sizeof digits, file.head0DataStartOffset, 16).ptr;
@@ -45,7 +45,7 @@ void remarkOnDataStart(Context& context, const tool::ISCSIEPFile& file, const st
 }
 
 void remarkOnPartialEntry(Context& context, const tool::ISCSIEPFile& file, const std::string& name) {
-    const auto partial = partialEntryOf(file, sizeOf(file.path));
+    const auto partial = partialEntryOf(file, context.sizeOf(file.path));
     if (!partial) return;
     context.remark(name, "ends inside an entry, " + std::to_string(partial->bytes) + " of its " +
                              std::to_string(entrySize) + " bytes are there");

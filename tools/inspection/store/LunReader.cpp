@@ -105,7 +105,9 @@ void LunReader::handExtents(const ExtentPlace& place, std::uint64_t offset, std:
     const std::uint64_t position = place.counted(*counting) * lun_.extentSize + offset + skipped;
     length -= skipped;
     const std::uint64_t there = position < data.dataSize ? std::min(length, data.dataSize - position) : 0;
-    copy(data, position, there);
+    const std::uint64_t held = position < data.held ? std::min(there, data.held - position) : 0;
+    copy(data, position, held);
+    miss(there - held, failure(notCollectedText));
     miss(length - there,
          failure("past the end, the file holds " + std::to_string(data.dataSize) + " bytes of extents"));
 }

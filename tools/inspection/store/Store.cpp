@@ -97,7 +97,7 @@ std::optional<StoreFile> Store::fileAt(const std::string& path) {
     file.kind = lun != lunsByMap_.end() ? kindByType(tool::EP_FILE_TYPE_MAP) : kindByName(path);
     file.path = path;
     file.hostPath = *hostPath;
-    const auto size = sizeOf(file.hostPath);
+    const auto size = context_.sizeOf(file.hostPath);
     file.missing = !size && (errno == ENOENT || errno == ENOTDIR);
     if (!size && !file.missing) {
         context_.succeeded(tool::EP_ERR_OPEN_FAILED, {path, ""});

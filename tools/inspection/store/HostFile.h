@@ -1,0 +1,43 @@
+// Files that are written here: of a collection, never of a store.
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <string>
+
+namespace inspection {
+
+/// A file descriptor that is closed at its end; -1: none.
+class Descriptor {
+public:
+    explicit Descriptor(int number) : number_(number) {}
+    Descriptor(const Descriptor&) = delete;
+    Descriptor& operator=(const Descriptor&) = delete;
+    ~Descriptor();
+
+    int number() const { return number_; }
+    bool isOpen() const { return number_ >= 0; }
+
+    /// Closes it now. Returns 0 or the errno value.
+    int close();
+
+private:
+    int number_;
+};
+
+/// Replaces the file at `path` by one that holds `text`, in one step. Returns 0 or the errno value of what failed.
+int writeWhole(const std::string& path, const std::string& text);
+
+/// How a copy ended.
+struct CopyEnd {
+    enum class How { done, stopped, readFailed, writeFailed };
+
+    How how;
+    int reason = 0;  ///< the errno value; 0 of a read: the file ended too early
+};
+
+/// Copies the first `size` bytes of `from` to `to`, a new file; holes stay holes. Calls step(position) after
+/// each piece of at most 256 KiB; with false it stops the copy.
+CopyEnd copySparse(int from, int to, std::uint64_t size, const std::function<bool(std::uint64_t)>& step);
+
+}  // namespace inspection
