@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Shortens what abidw says of the library (standard input) to its interface (standard output): the exported symbols,
+"""Reduces what abidw prints about the library (standard input) to its interface (standard output): the exported symbols,
 the classes of ISCSI::TOOL with bases, data members, exported and virtual functions, and of each other type that these
 mention its name and size. Types are known by their names and stand in order, so that a difference can be read."""
 import re

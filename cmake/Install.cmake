@@ -18,7 +18,7 @@ install(TARGETS iscsieptool EXPORT iscsieptool
 install(DIRECTORY include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/iscsieptool COMPONENT development)
 
 # The platform's library is wanted when a consumer runs, and is seldom on the machine where it is linked: its symbols
-# may stay open there. The package config and the .pc take the option from here.
+# may stay unresolved there. The package config and the .pc take the option from here.
 set(consumer_link_option --allow-shlib-undefined)
 target_link_options(iscsieptool INTERFACE $<INSTALL_INTERFACE:LINKER:${consumer_link_option}>)
 

@@ -19,7 +19,7 @@ public:
     int parseFile();
 
     /// Reads extent number `index` (counted from 0, `extentSize` bytes each) and replaces `data` by its bytes as
-    /// lower-case hexadecimal text, two characters a byte. Needs no earlier parseFile(). The position is
+    /// lower-case hexadecimal text, two characters per byte. Needs no earlier parseFile(). The position is
     /// head0DataStartOffset + `index` * `extentSize`, modulo 2^64.
     /// Returns 0, or in the order of the checks: EP_ERR_BAD_EXTENT_SIZE when `extentSize` is 0, a parseHead0() code,
     /// EP_ERR_WRONG_FILE_TYPE, EP_ERR_OPEN_FAILED, EP_ERR_SEEK_FAILED, EP_ERR_BAD_EXTENT_SIZE when memory cannot hold

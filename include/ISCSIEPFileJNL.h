@@ -7,7 +7,7 @@
 
 namespace ISCSI::TOOL {
 
-/// The machine's journal; getJNLFilePath() tells where it lies.
+/// The machine's journal; getJNLFilePath() gives its path.
 class ISCSI_EP_EXPORT ISCSIEPFileJNL : public ISCSIEPFile {
 public:
     ISCSIEPFileJNL();

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # Runs what the console blocks of documents show and compares: scripts/transcript.sh [--renew] DOCUMENT...
 # With --renew the documents show from then on what is really printed.
-# A block is run when its fence reads ```console. Behind "$ " stands a command, behind "> " each further line of it, and
+# A block is run when its fence reads ```console. After "$ " stands a command, after "> " each further line of it, and
 # then follows what it prints. All commands of a document run in one shell, in a new folder, with the time zone UTC.
 set -euo pipefail
 export TZ=UTC LC_ALL=C.UTF-8

@@ -12,16 +12,13 @@ namespace ISCSI::TOOL {
 
 static_assert(sizeof(off_t) == 8, "positions of files have 64 bits on every target");
 
-EPFileStream::EPFileStream(const std::string& path) noexcept
-    : descriptor_(::open(path.c_str(), O_RDONLY | O_CLOEXEC)), openError_(descriptor_ < 0 ? errno : 0) {}
-
 EPFileStream::~EPFileStream() {
     const ErrnoKeeper keeper;
     if (descriptor_ >= 0) ::close(descriptor_);
 }
 
-bool EPFileStream::isOpen() const noexcept {
-    if (descriptor_ < 0) errno = openError_;
+bool EPFileStream::open(const std::string& path) noexcept {
+    descriptor_ = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
     return descriptor_ >= 0;
 }
 
@@ -36,8 +33,7 @@ std::optional<std::uint64_t> EPFileStream::seekToEnd() noexcept {
 }
 
 std::optional<std::size_t> EPFileStream::readUpTo(unsigned char* bytes, std::size_t size) noexcept {
-    constexpr std::size_t largestRequest = std::size_t{1}
-                                           << 30U;  // of which the system tells the result on every target
+    constexpr auto largestRequest = std::size_t{1} << 30U;  // whose result fits the system's return value everywhere
     std::size_t got = 0;
     while (got < size) {
         const ssize_t arrived = ::read(descriptor_, bytes + got, std::min(size - got, largestRequest));

@@ -4,7 +4,7 @@
 
 namespace ISCSI::TOOL {
 
-int openForLookup(ISCSIEPFile& file, const EPFileStream& stream, const EPLookupIdentity& lookup) {
+int openForLookup(ISCSIEPFile& file, EPFileStream& stream, const EPLookupIdentity& lookup) {
     const char* path = file.path.c_str();
     if (file.head0Type == 0) {
         const int error = file.parseHead0();
@@ -20,7 +20,7 @@ int openForLookup(ISCSIEPFile& file, const EPFileStream& stream, const EPLookupI
                        static_cast<int>(file.head0Type), path);
         return EP_ERR_WRONG_FILE_TYPE;
     }
-    if (!stream.isOpen()) {
+    if (!stream.open(file.path)) {
         EP_LOG_ERR_FOR(lookup.sourceFile, lookup.operation, lookup.openLine, "Failed to open file. path: %s", path);
         return EP_ERR_OPEN_FAILED;
     }

@@ -8,8 +8,8 @@
 
 namespace ISCSI::TOOL {
 
-/// The identity of a lookup in the log: the source file and the name it goes by, and the line of each of its failures;
-/// and the type of file it insists on.
+/// What tells one lookup from another: how the log names it (source file, operation, and a line for each failure), and
+/// the type of file it needs.
 struct EPLookupIdentity {
     const char* sourceFile;
     const char* operation;
@@ -33,11 +33,11 @@ private:
     }
 };
 
-/// Decodes HEAD[0] of `file` unless that is done, tests its type, then whether `stream` (opened by the caller on the
-/// same path) is open. Returns 0 or the code of the failure it logged.
-int openForLookup(ISCSIEPFile& file, const EPFileStream& stream, const EPLookupIdentity& lookup);
+/// Decodes HEAD[0] of `file` unless that is done, tests its type, then opens `stream` on its path. Returns 0 or the
+/// code of the failure it logged.
+int openForLookup(ISCSIEPFile& file, EPFileStream& stream, const EPLookupIdentity& lookup);
 
-/// openForLookup(), then goes to `offset` (modulo 2^64) behind the data start offset.
+/// openForLookup(), then goes to `offset` (modulo 2^64) after the data start offset.
 int seekToItem(ISCSIEPFile& file, EPFileStream& stream, const EPLookupIdentity& lookup, std::uint64_t offset);
 
 /// Each logs the failed step of a lookup and returns its code.

@@ -20,8 +20,8 @@ ISCSIEPFile::ISCSIEPFile(const std::string& filePath) : path(filePath) {}
 ISCSIEPFile::~ISCSIEPFile() = default;
 
 int ISCSIEPFile::readHeader() {
-    EPFileStream stream(path);
-    if (!stream.isOpen()) {
+    EPFileStream stream;
+    if (!stream.open(path)) {
         EP_LOG_ERR(37, "Failed to open file. path: %s", path.c_str());
         return EP_ERR_OPEN_FAILED;
     }

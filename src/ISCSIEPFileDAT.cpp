@@ -39,7 +39,8 @@ int unusableExtentSize(const ISCSIEPFile& file, const EPLookupIdentity& lookup, 
 /// when the read fails. Throws when memory cannot hold the digits.
 bool readDigits(EPFileStream& stream, std::size_t size, std::string& text) {
 #ifdef __cpp_lib_string_resize_and_overwrite
-    // The bytes arrive in the second half of the room for the digits, which nothing has filled before.
+    // Why this source is compiled as C++23 where the compiler is g++: the string's room is not filled before the digits
+    // are written, and one read brings all bytes, into its second half. The other way takes half as long again.
     text.resize_and_overwrite(2 * size, [&stream, size](char* digits, std::size_t /*room*/) -> std::size_t {
         auto* bytes = reinterpret_cast<unsigned char*>(digits + size);
         if (!stream.read(bytes, size)) return 0;
@@ -83,11 +84,11 @@ int ISCSIEPFileDAT::parseFile() {
 
 int ISCSIEPFileDAT::getExtentData(unsigned long long index, unsigned int extentSize, std::string& data) {
     constexpr int extentSizeLine = 65;
-    EPFileStream stream(path);
     if (extentSize == 0) {
         errno = 0;
         return unusableExtentSize(*this, extentLookup, extentSizeLine, extentSize);
     }
+    EPFileStream stream;
     const int error = seekToItem(*this, stream, extentLookup, index * extentSize);
     if (error != 0) return error;
     std::string text;
@@ -104,13 +105,13 @@ int ISCSIEPFileDAT::getExtentData(unsigned long long index, unsigned int extentS
 
 int ISCSIEPFileDAT::getExtentBytes(unsigned long long index, unsigned int extentSize, unsigned int offset,
                                    unsigned int length, unsigned char* bytes) {
-    EPFileStream stream(path);
     errno = 0;
     if (extentSize == 0) return unusableExtentSize(*this, bytesLookup, 101, extentSize);
     if (offset > extentSize || length > extentSize - offset || (bytes == nullptr && length > 0)) {
         EP_LOG_ERR(107, "Invalid part of an extent: %u bytes from %u. path: %s", length, offset, path.c_str());
         return EP_ERR_BAD_ARGUMENT;
     }
+    EPFileStream stream;
     const int error = seekToItem(*this, stream, bytesLookup, index * extentSize + offset);
     if (error != 0) return error;
     return stream.read(bytes, length) ? 0 : readFailed(*this, bytesLookup);

@@ -124,7 +124,10 @@ int ISCSIEPFileMAP::parseFile() {
     logicBlockSize = le32(head1 + 8);
     totalCount = le64(head1 + 12);
     error = GetUUIDInString(head1 + 20, parentUUID);
-    if (error != 0) return EP_LOG_ERR(84, "Failed to get HEAD[1] parent UUID. path: %s", path.c_str()), error;
+    if (error != 0) {
+        EP_LOG_ERR(84, "Failed to get HEAD[1] parent UUID. path: %s", path.c_str());
+        return error;
+    }
     parentTotalCount = le64(head1 + 36);
 
     const unsigned char* var0 = headerBlock + EP_VAR0;
@@ -136,7 +139,10 @@ int ISCSIEPFileMAP::parseFile() {
     seg0Checksum = le32(var1 + 4);
     seg0PoolCount = le32(var1 + 8);
     error = GetUUIDInString(var1 + 12, sessionUUID);
-    if (error != 0) return EP_LOG_ERR(114, "Failed to get VAR[1] session UUID. path: %s", path.c_str()), error;
+    if (error != 0) {
+        EP_LOG_ERR(114, "Failed to get VAR[1] session UUID. path: %s", path.c_str());
+        return error;
+    }
     promoteTime = le32(var1 + 28);
 
     const unsigned char* var2 = headerBlock + EP_VAR2;
@@ -144,11 +150,20 @@ int ISCSIEPFileMAP::parseFile() {
     syncCount = le64(var2 + 4);
     childAttribute = le32(var2 + 12);
     error = GetUUIDInString(var2 + 16, trackUUID);
-    if (error != 0) return EP_LOG_ERR(136, "Failed to get VAR[2] track UUID. path: %s", path.c_str()), error;
+    if (error != 0) {
+        EP_LOG_ERR(136, "Failed to get VAR[2] track UUID. path: %s", path.c_str());
+        return error;
+    }
     error = GetUUIDInString(var2 + 32, previousTrackUUID);
-    if (error != 0) return EP_LOG_ERR(140, "Failed to get VAR[2] previous track UUID. path: %s", path.c_str()), error;
+    if (error != 0) {
+        EP_LOG_ERR(140, "Failed to get VAR[2] previous track UUID. path: %s", path.c_str());
+        return error;
+    }
     error = GetUUIDInString(var2 + 48, currentTrackUUID);
-    if (error != 0) return EP_LOG_ERR(144, "Failed to get VAR[2] current track UUID. path: %s", path.c_str()), error;
+    if (error != 0) {
+        EP_LOG_ERR(144, "Failed to get VAR[2] current track UUID. path: %s", path.c_str());
+        return error;
+    }
 
     const std::size_t poolCount = std::min(seg0PoolCount, EP_POOL_COUNT_MAX);
     for (std::size_t i = 0; i < poolCount; ++i) {
@@ -162,7 +177,7 @@ int ISCSIEPFileMAP::parseFile() {
 }
 
 int ISCSIEPFileMAP::getMapEntry(unsigned long long index, ISCSIEPMapEntryInfo& entry) {
-    EPFileStream stream(path);
+    EPFileStream stream;
     const int error = seekToItem(*this, stream, entryLookup, index * EP_MAP_ENTRY_SIZE);
     if (error != 0) return error;
     unsigned char bytes[EP_MAP_ENTRY_SIZE];
@@ -175,7 +190,7 @@ int ISCSIEPFileMAP::getMapEntries(unsigned long long first, unsigned long long c
                                   std::vector<ISCSIEPMapEntryInfo>& entries) {
     std::vector<ISCSIEPMapEntryInfo> run;
     if (count > 0) {
-        EPFileStream stream(path);
+        EPFileStream stream;
         const int error = seekToItem(*this, stream, entriesLookup, first * EP_MAP_ENTRY_SIZE);
         if (error != 0) return error;
         try {
@@ -190,7 +205,7 @@ int ISCSIEPFileMAP::getMapEntries(unsigned long long first, unsigned long long c
 }
 
 int ISCSIEPFileMAP::getEntryCount(unsigned long long& count) {
-    EPFileStream stream(path);
+    EPFileStream stream;
     const int error = openForLookup(*this, stream, countLookup);
     if (error != 0) return error;
     const std::optional<std::uint64_t> end = stream.seekToEnd();

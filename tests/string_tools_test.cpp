@@ -22,7 +22,7 @@ TEST(StringTools, BytesBecomeHexadecimalAndUUIDTextAndNoBytesAreRefused) {
     EXPECT_EQ("", text);
     EXPECT_EQ(0, GetUUIDInString(bytes, text));
     EXPECT_EQ("0adeadbe-ef00-0102-0304-05060780ff9f", text);
-    // Every byte, in every place of a block, and no digit behind the last.
+    // Every byte, in every place of a block, and no digit after the last.
     static constexpr char digits[] = "0123456789abcdef";
     std::vector<unsigned char> all;
     std::string expected;

@@ -7,12 +7,12 @@
 namespace ISCSI::TOOL {
 
 /// Error codes. 0 is success; any code not listed here comes unchanged from the platform's iSCSI library.
-/// After a failed operation errno tells the system's reason, as the failing call left it; it is 0 where the system is
+/// After a failed operation errno holds the system's reason, as the failing call left it; it is 0 where the system is
 /// not to blame: the file ended, the type was wrong, an argument was bad.
-inline constexpr int EP_ERR_BAD_ARGUMENT = 18990003;     ///< no input, too much to render, or a part beyond the whole
+inline constexpr int EP_ERR_BAD_ARGUMENT = 18990003;     ///< no input, too much to render, or a part outside the whole
 inline constexpr int EP_ERR_OPEN_FAILED = 18990038;      ///< an EP file could not be opened
 inline constexpr int EP_ERR_READ_FAILED = 18990039;      ///< reading an EP file failed or came short
-inline constexpr int EP_ERR_SEEK_FAILED = 18990041;      ///< a computed position is not one the file can be read at
+inline constexpr int EP_ERR_SEEK_FAILED = 18990041;      ///< the file cannot be read at a computed position
 inline constexpr int EP_ERR_BAD_UUID = 18990209;         ///< 16 bytes could not be rendered as UUID text
 inline constexpr int EP_ERR_WRONG_FILE_TYPE = 18990400;  ///< HEAD[0] names another type than the operation needs
 inline constexpr int EP_ERR_NO_PATH = 18990401;          ///< the path of an EP file could not be worked out

@@ -11,7 +11,7 @@ namespace ISCSI::TOOL {
 
 inline constexpr int SYSTEM_LOG_ERR = 3;
 
-/// Puts errno back when it goes: the log call must not disturb the reason of the failure.
+/// Puts errno back when it goes out of scope: the log call must not disturb the reason of the failure.
 struct ErrnoKeeper {
     ErrnoKeeper() = default;
     ErrnoKeeper(const ErrnoKeeper&) = delete;
@@ -24,9 +24,12 @@ struct ErrnoKeeper {
 
 /// Writes the line of `operation` in `sourceFile`. `line` is a fixed number that identifies the failure and never
 /// follows the source text; the format's literal and its arguments come after it.
-#define EP_LOG_ERR_FOR(sourceFile, operation, line, format, ...)                                                     \
-    (::ISCSI::TOOL::ErrnoKeeper(), ::ISCSI::TOOL::SystemLog(::ISCSI::TOOL::SYSTEM_LOG_ERR, "iSCSI:%s:%d:%s " format, \
-                                                            sourceFile, line, operation, __VA_ARGS__))
+#define EP_LOG_ERR_FOR(sourceFile, operation, line, format, ...)                                                       \
+    do {                                                                                                               \
+        const ::ISCSI::TOOL::ErrnoKeeper errnoBeforeLog;                                                               \
+        ::ISCSI::TOOL::SystemLog(::ISCSI::TOOL::SYSTEM_LOG_ERR, "iSCSI:%s:%d:%s " format, sourceFile, line, operation, \
+                                 __VA_ARGS__);                                                                         \
+    } while (false)
 
 /// The same on behalf of the operation it stands in.
 #define EP_LOG_ERR(line, format, ...) EP_LOG_ERR_FOR(__FILE_NAME__, __func__, line, format, __VA_ARGS__)

@@ -52,7 +52,7 @@ inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* di
     for (; i < count; ++i) std::memcpy(digits + 2 * i, &HexDigitPairs[2 * std::size_t{bytes[i]}], 2);
 }
 
-/// Replaces `text` by `length` bytes as lower-case hexadecimal digits, two a byte, high four bits first.
+/// Replaces `text` by `length` bytes as lower-case hexadecimal digits, two per byte, high four bits first.
 /// Returns 0, or EP_ERR_BAD_ARGUMENT when `data` is null (logged) or the text cannot be held in memory (not logged:
 /// the caller knows what it was for); `text` then keeps its content.
 inline int GetHexInString(const unsigned char* data, unsigned int length, std::string& text) {
