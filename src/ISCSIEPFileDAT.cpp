@@ -15,13 +15,13 @@ namespace ISCSI::TOOL {
 
 namespace {
 
-constexpr EPLookupIdentity extentLookup = EPLookupIdentity(__FILE_NAME__, "getExtentData", EP_FILE_TYPE_DAT)
+constexpr EPLookupIdentity extentLookup = EPLookupIdentity(EP_LOG_FILE, "getExtentData", EP_FILE_TYPE_DAT)
                                               .parseFailsAt(69)
                                               .typeFailsAt(73)
                                               .openFailsAt(77)
                                               .seekFailsAt(82)
                                               .readFailsAt(87);
-constexpr EPLookupIdentity bytesLookup = EPLookupIdentity(__FILE_NAME__, "getExtentBytes", EP_FILE_TYPE_DAT)
+constexpr EPLookupIdentity bytesLookup = EPLookupIdentity(EP_LOG_FILE, "getExtentBytes", EP_FILE_TYPE_DAT)
                                              .parseFailsAt(102)
                                              .typeFailsAt(103)
                                              .openFailsAt(104)

@@ -23,19 +23,19 @@ namespace {
 
 constexpr std::size_t entriesPerRead = 8192;
 
-constexpr EPLookupIdentity entryLookup = EPLookupIdentity(__FILE_NAME__, "getMapEntry", EP_FILE_TYPE_MAP)
+constexpr EPLookupIdentity entryLookup = EPLookupIdentity(EP_LOG_FILE, "getMapEntry", EP_FILE_TYPE_MAP)
                                              .parseFailsAt(172)
                                              .typeFailsAt(176)
                                              .openFailsAt(180)
                                              .seekFailsAt(185)
                                              .readFailsAt(189);
-constexpr EPLookupIdentity entriesLookup = EPLookupIdentity(__FILE_NAME__, "getMapEntries", EP_FILE_TYPE_MAP)
+constexpr EPLookupIdentity entriesLookup = EPLookupIdentity(EP_LOG_FILE, "getMapEntries", EP_FILE_TYPE_MAP)
                                                .parseFailsAt(201)
                                                .typeFailsAt(202)
                                                .openFailsAt(203)
                                                .seekFailsAt(204)
                                                .readFailsAt(205);
-constexpr EPLookupIdentity countLookup = EPLookupIdentity(__FILE_NAME__, "getEntryCount", EP_FILE_TYPE_MAP)
+constexpr EPLookupIdentity countLookup = EPLookupIdentity(EP_LOG_FILE, "getEntryCount", EP_FILE_TYPE_MAP)
                                              .parseFailsAt(211)
                                              .typeFailsAt(212)
                                              .openFailsAt(213)

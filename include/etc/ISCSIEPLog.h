@@ -20,7 +20,23 @@ struct ErrnoKeeper {
     const int kept = errno;
 };
 
+/// The last part of `path`.
+constexpr const char* FileNameOf(const char* path) {
+    const char* name = path;
+    for (; *path != '\0'; ++path) {
+        if (*path == '/') name = path + 1;
+    }
+    return name;
+}
+
 }  // namespace ISCSI::TOOL
+
+/// The name of the source file it stands in, without folder; old compilers have no macro of their own for that.
+#ifdef __FILE_NAME__
+#define EP_LOG_FILE __FILE_NAME__
+#else
+#define EP_LOG_FILE ::ISCSI::TOOL::FileNameOf(__FILE__)
+#endif
 
 /// Writes the line of `operation` in `sourceFile`. `line` is a fixed number that identifies the failure and never
 /// follows the source text; the format's literal and its arguments come after it.
@@ -32,4 +48,4 @@ struct ErrnoKeeper {
     } while (false)
 
 /// The same on behalf of the operation it stands in.
-#define EP_LOG_ERR(line, format, ...) EP_LOG_ERR_FOR(__FILE_NAME__, __func__, line, format, __VA_ARGS__)
+#define EP_LOG_ERR(line, format, ...) EP_LOG_ERR_FOR(EP_LOG_FILE, __func__, line, format, __VA_ARGS__)

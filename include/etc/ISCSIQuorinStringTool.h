@@ -33,7 +33,8 @@ inline constexpr auto HexDigitPairs = [] {
 /// the digits, in which case they are written over.
 inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* digits) {
     std::size_t i = 0;
-#ifdef __SSE2__
+#if defined(__SSE2__) && defined(__has_builtin)
+#if __has_builtin(__builtin_shufflevector)
     // Sixteen bytes at a time, whatever the compiler makes of the loop below.
     using Bytes = signed char __attribute__((vector_size(16)));
     using Words = unsigned short __attribute__((vector_size(16)));
@@ -49,6 +50,7 @@ inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* di
         std::memcpy(digits + 2 * i, pairs, sizeof pairs);
     }
 #endif
+#endif
     for (; i < count; ++i) std::memcpy(digits + 2 * i, &HexDigitPairs[2 * std::size_t{bytes[i]}], 2);
 }
 
@@ -59,7 +61,7 @@ inline int GetHexInString(const unsigned char* data, unsigned int length, std::s
     if (data == nullptr) {
         errno = 0;
         const ErrnoKeeper keeper;
-        SystemLog(SYSTEM_LOG_ERR, "iSCSI:%s:%d:%s Input pointer is NULL.", __FILE_NAME__, 190, __func__);
+        SystemLog(SYSTEM_LOG_ERR, "iSCSI:%s:%d:%s Input pointer is NULL.", EP_LOG_FILE, 190, __func__);
         return EP_ERR_BAD_ARGUMENT;
     }
     std::string digits;
