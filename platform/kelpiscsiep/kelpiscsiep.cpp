@@ -1,6 +1,6 @@
 // Stand-in for the platform's iSCSI management library: answers from a list of LUNs in a JSON file, so that the EP
-// tools can be built and tried where that library is not at hand. The list is read anew at each call, as a stream: of
-// a list of any length no more than one LUN is held.
+// tools can be built and tried where that library is not at hand. The list is gone through as a stream, once after each
+// change of the file. What is kept of it is where each LUN starts, 16 bytes per LUN and at most 16 MiB.
 #include "kelpiscsiep.h"
 
 #include <fcntl.h>
@@ -13,13 +13,17 @@
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <istream>
+#include <mutex>
 #include <nlohmann/json.hpp>
 #include <optional>
 #include <streambuf>
 #include <string>
 #include <system_error>
 #include <type_traits>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -95,17 +99,112 @@ Key keyOf(const std::string& text) {
     return Key::other;
 }
 
-/// Finds one LUN in the list, which the JSON parser tells it piece by piece; its operations have the names that the
-/// parser calls. Where they return false the list is malformed.
+/// What is another one when a file has been changed, or another file has taken its place.
+struct FileState {
+    dev_t device;
+    ino_t inode;
+    off_t size;
+    timespec modified, changed;
+
+    bool operator==(const FileState& other) const {
+        const auto same = [](const timespec& a, const timespec& b) {
+            return a.tv_sec == b.tv_sec && a.tv_nsec == b.tv_nsec;
+        };
+        return device == other.device && inode == other.inode && size == other.size && same(modified, other.modified) &&
+               same(changed, other.changed);
+    }
+
+    /// Whether any change from now on will show. One that follows the last at once may have the same time.
+    bool willShowChanges() const {
+        constexpr time_t coarsestClock = 2;  // seconds, of all file systems
+        return std::time(nullptr) - changed.tv_sec > coarsestClock;
+    }
+};
+
+/// Calls a function of the system again for as long as it is interrupted.
+template <typename Call>
+auto uninterrupted(Call call) {
+    auto result = call();
+    while (result < 0 && errno == EINTR) result = call();
+    return result;
+}
+
+/// The bytes of a file, a block at a time. A read that fails throws.
+class FileBytes : public std::streambuf {
+public:
+    explicit FileBytes(const char* path)
+        : descriptor_(uninterrupted([path] { return open(path, O_RDONLY | O_CLOEXEC | O_NONBLOCK); })) {}
+    FileBytes(const FileBytes&) = delete;
+    FileBytes& operator=(const FileBytes&) = delete;
+    ~FileBytes() override {
+        if (descriptor_ >= 0) close(descriptor_);
+    }
+
+    /// Nothing unless it is a regular file.
+    std::optional<FileState> state() const {
+        struct stat status = {};
+        if (descriptor_ < 0 || fstat(descriptor_, &status) != 0 || !S_ISREG(status.st_mode)) return std::nullopt;
+        return FileState{status.st_dev, status.st_ino, status.st_size, status.st_mtim, status.st_ctim};
+    }
+
+    /// Where in the file the next byte lies.
+    std::uint64_t position() const { return blockStart_ + static_cast<std::uint64_t>(gptr() - eback()); }
+
+    void goTo(std::uint64_t position) {
+        if (lseek(descriptor_, static_cast<off_t>(position), SEEK_SET) < 0) fail();
+        blockStart_ = position;
+        setg(nullptr, nullptr, nullptr);
+    }
+
+protected:
+    int_type underflow() override {
+        blockStart_ = position();
+        const ssize_t count = uninterrupted([this] { return read(descriptor_, block_.data(), block_.size()); });
+        if (count < 0) fail();
+        setg(block_.data(), block_.data(), block_.data() + count);
+        return count > 0 ? traits_type::to_int_type(block_[0]) : traits_type::eof();
+    }
+
+private:
+    [[noreturn]] static void fail() { throw std::system_error(errno, std::generic_category()); }
+
+    const int descriptor_;
+    std::uint64_t blockStart_ = 0;
+    std::array<char, 16384> block_;
+};
+
+/// Where a LUN of the list starts, in bytes from the start of the file.
+struct LunStart {
+    std::uint32_t lid;
+    std::uint64_t position;
+};
+
+constexpr std::size_t mostLuns = 1U << 20U;  ///< whose starts are kept
+
+/// Picks a LUN from the list, or from one part of it, and notes where the LUNs start. Its operations have the names
+/// that the JSON parser calls for each piece it meets. Where they return false the list is malformed.
 class LunFinder {
 public:
-    explicit LunFinder(std::uint32_t lid) : lid_(lid) {}
+    enum class Part { list, lun };
 
-    /// What the whole list, which must have been read, says of the LUN.
-    Result result() const { return result_.value_or(NO_SUCH_LUN); }
+    LunFinder(const FileBytes& bytes, std::uint32_t lid, Part part)
+        : bytes_(bytes), lid_(lid), depth_(part == Part::list ? 0 : inList) {}
 
-    /// The LUN, if the result is OK.
-    const Lun& lun() const { return lun_; }
+    /// Whether the LUN was there; the first of several counts.
+    bool found() const { return found_.has_value(); }
+
+    /// Puts the LUN, if it was there, into the record.
+    Result fillRecord(void* record) const {
+        if (!found_->isComplete()) return BAD_VALUE;
+        fill(record, *found_);
+        return OK;
+    }
+
+    /// The result for an id that was not there, after the whole list.
+    Result otherwise() const { return ended_ ? BAD_VALUE : NO_SUCH_LUN; }
+
+    /// Where the LUNs start, of no more than mostLuns.
+    std::vector<LunStart>& starts() { return starts_; }
 
     bool null() { return take(OtherValue()); }
     bool boolean(bool /*value*/) { return take(OtherValue()); }
@@ -128,7 +227,10 @@ public:
 
     bool start_object(std::size_t /*size*/) {
         const bool startsLun = depth_ == inList;
-        if (startsLun && !result_) lun_ = Lun();
+        if (startsLun) {
+            lun_ = Lun();
+            start_ = bytes_.position() - 1;  // the brace has been read
+        }
         const bool proper = startsLun || take(OtherValue());
         ++depth_;
         return proper;
@@ -140,7 +242,7 @@ public:
     }
 
     bool end_object() {
-        if (--depth_ == inList && !result_) finishLun();
+        if (--depth_ == inList && !ended_) finishLun();
         return true;
     }
 
@@ -154,8 +256,8 @@ private:
     /// A value, or the start of one of several parts. Of a key that is repeated the last value counts.
     template <typename Value>
     bool take(const Value& value) {
-        if (depth_ == inList && !result_) result_ = BAD_VALUE;
-        if (depth_ == inLun && !result_) takeField(value);
+        if (depth_ == inList) ended_ = true;
+        if (depth_ == inLun) takeField(value);
         return depth_ > 0;
     }
 
@@ -185,56 +287,85 @@ private:
 
     void finishLun() {
         if (!lun_.lid) {
-            result_ = BAD_VALUE;
-        } else if (*lun_.lid == lid_) {
-            result_ = lun_.isComplete() ? OK : BAD_VALUE;
+            ended_ = true;
+            return;
         }
+        if (starts_.size() < mostLuns) starts_.push_back({*lun_.lid, start_});
+        if (*lun_.lid == lid_ && !found_) found_ = lun_;
     }
 
+    const FileBytes& bytes_;
     const std::uint32_t lid_;
-    std::uint64_t depth_ = 0;
+    std::uint64_t depth_;
+    std::uint64_t start_ = 0;
     Key key_ = Key::other;
     Lun lun_;
-    std::optional<Result> result_;
+    std::optional<Lun> found_;
+    bool ended_ = false;  ///< by a part that is no LUN, or a LUN without an id: what follows does not count
+    std::vector<LunStart> starts_;
 };
 
-/// The bytes of a file, a block at a time. A read that fails throws.
-class FileBytes : public std::streambuf {
-public:
-    explicit FileBytes(const char* path) : descriptor_(open(path, O_RDONLY | O_CLOEXEC | O_NONBLOCK)) {}
-    FileBytes(const FileBytes&) = delete;
-    FileBytes& operator=(const FileBytes&) = delete;
-    ~FileBytes() override {
-        if (descriptor_ >= 0) close(descriptor_);
-    }
-
-    bool isRegularFile() const {
-        struct stat status = {};
-        return descriptor_ >= 0 && fstat(descriptor_, &status) == 0 && S_ISREG(status.st_mode);
-    }
-
-protected:
-    int_type underflow() override {
-        const ssize_t count = read(descriptor_, block_.data(), block_.size());
-        if (count < 0) throw std::system_error(errno, std::generic_category());
-        setg(block_.data(), block_.data(), block_.data() + count);
-        return count > 0 ? traits_type::to_int_type(block_[0]) : traits_type::eof();
-    }
-
-private:
-    const int descriptor_;
-    std::array<char, 16384> block_;
+/// What is known of the list that was read last.
+struct KnownList {
+    std::optional<FileState> file;  ///< nothing: no list is known
+    std::vector<LunStart> luns;     ///< by id, each id once
+    Result otherwise = OK;          ///< for any other id
 };
+
+/// Answers from what is known of the list. Nothing where another LUN stands at the known place after all.
+std::optional<Result> lookUp(const KnownList& known, FileBytes& bytes, std::uint32_t lid, void* record) {
+    const auto lun = std::lower_bound(known.luns.begin(), known.luns.end(), lid,
+                                      [](const LunStart& start, std::uint32_t id) { return start.lid < id; });
+    if (lun == known.luns.end() || lun->lid != lid) return known.otherwise;
+    bytes.goTo(lun->position);
+    std::istream text(&bytes);
+    LunFinder finder(bytes, lid, LunFinder::Part::lun);
+    const bool whole = nlohmann::json::sax_parse(text, &finder, nlohmann::json::input_format_t::json, false);
+    if (!whole || !finder.found()) return std::nullopt;
+    return finder.fillRecord(record);
+}
+
+/// What lookUp() needs. Of several LUNs with one id the first in the list counts.
+std::vector<LunStart> orderedById(std::vector<LunStart> luns) {
+    std::sort(luns.begin(), luns.end(), [](const LunStart& a, const LunStart& b) {
+        return a.lid != b.lid ? a.lid < b.lid : a.position < b.position;
+    });
+    const auto sameId = [](const LunStart& a, const LunStart& b) { return a.lid == b.lid; };
+    luns.erase(std::unique(luns.begin(), luns.end(), sameId), luns.end());
+    luns.shrink_to_fit();
+    return luns;
+}
+
+/// Answers from the whole list, which is known from then on if a later change of the file will show.
+Result goThrough(KnownList& known, FileBytes& bytes, const FileState& file, std::uint32_t lid, void* record) {
+    known = KnownList();
+    const bool willShowChanges = file.willShowChanges();
+    bytes.goTo(0);
+    std::istream list(&bytes);
+    LunFinder finder(bytes, lid, LunFinder::Part::list);
+    const bool isList = nlohmann::json::sax_parse(list, &finder);
+    const Result otherwise = isList ? finder.otherwise() : LIST_MALFORMED;
+    if (willShowChanges && finder.starts().size() < mostLuns) {
+        if (isList) known.luns = orderedById(std::move(finder.starts()));
+        known.otherwise = otherwise;
+        known.file = file;
+    }
+    return isList && finder.found() ? finder.fillRecord(record) : otherwise;
+}
 
 Result findLun(std::uint32_t lid, void* record) {
+    static std::mutex mutex;
+    static KnownList& known = *new KnownList;  // never destroyed: threads may call for as long as the program runs
+    const std::lock_guard<std::mutex> lock(mutex);
     const char* path = std::getenv("KELPISCSIEP_LUNS");  // NOLINT(concurrency-mt-unsafe): nothing here sets it
     FileBytes bytes(path != nullptr ? path : "/var/db/iscsi/luns.json");
-    if (!bytes.isRegularFile()) return LIST_UNREADABLE;
-    std::istream list(&bytes);
-    LunFinder finder(lid);
-    if (!nlohmann::json::sax_parse(list, &finder)) return LIST_MALFORMED;
-    if (finder.result() == OK) fill(record, finder.lun());
-    return finder.result();
+    const std::optional<FileState> file = bytes.state();
+    if (!file) return LIST_UNREADABLE;
+    if (known.file == file) {
+        const std::optional<Result> result = lookUp(known, bytes, lid, record);
+        if (result) return *result;
+    }
+    return goThrough(known, bytes, *file, lid, record);
 }
 
 }  // namespace

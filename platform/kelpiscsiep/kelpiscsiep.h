@@ -21,7 +21,7 @@ extern "C" {
  * Returns 0, or an error code that KELPiSCSIStrError() has a text for. */
 int KELPiSCSILunGetByLid(unsigned int lid, int reserved, void* record);
 
-/* The text of an error code, whatever the code; never null. */
+/* The text of an error code. What an unknown code gets is not documented: it may be null. */
 const char* KELPiSCSIStrError(int code);
 
 #ifdef __cplusplus
