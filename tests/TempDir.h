@@ -1,4 +1,4 @@
-// A folder of the test's own.
+// A folder of the test's own, and the environment that all tests expect.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -8,6 +8,10 @@
 #include <string>
 
 #include "EPFileBuilder.h"
+
+/// Times in UTC, messages in English, no LUN list, whatever the caller has set.
+inline const bool environmentSet =
+    setenv("TZ", "UTC", 1) == 0 && setenv("LC_ALL", "C", 1) == 0 && unsetenv("KELPISCSIEP_LUNS") == 0;
 
 /// Gone at its end.
 class TempDir {
