@@ -1,8 +1,10 @@
 // What the tests of epinspect and epsample share: commands as they are typed, and what they print, say and end with.
 #pragma once
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <pty.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -10,8 +12,9 @@
 #include <fstream>
 #include <functional>
 #include <string>
-#include <string_view>
+#include <utility>
 
+#include "Fits.h"
 #include "TempDir.h"
 
 using epbuilder::EPFileBuilder;
@@ -32,17 +35,6 @@ inline std::string nameOf(const testing::TestParamInfo<Case>& info) {
     return name;
 }
 
-inline bool matches(std::string_view text, std::string_view pattern) {
-    const std::string_view gap = "…";
-    const auto end = pattern.find(gap);
-    if (end == std::string_view::npos) return text == pattern;
-    if (text.substr(0, end) != pattern.substr(0, end)) return false;
-    for (auto rest = end; rest <= text.size(); ++rest) {
-        if (matches(text.substr(rest), pattern.substr(end + gap.size()))) return true;
-    }
-    return false;
-}
-
 /// What epinspect writes to standard error for these messages.
 inline std::string says(std::initializer_list<std::string> messages) {
     std::string lines;
@@ -58,13 +50,20 @@ inline std::string holds(const std::string& what) {
 
 inline int exitStatus(int status) { return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status); }
 
+/// Keeps this process and what it starts from running wild: for longer than a minute, or filling the disk with a file.
+inline void limitProcess() {
+    const rlimit fileSize = {8U << 20U, RLIM_INFINITY};
+    setrlimit(RLIMIT_FSIZE, &fileSize);
+    alarm(60);
+}
+
 /// Tests in a folder of their own, which is the current one of their commands. In it `store` is a link to a sample
 /// store that all tests share.
 class ProgramTest : public testing::TestWithParam<Case> {
 protected:
     ProgramTest() {
         static const TempDir shared;
-        static const int made = std::system(script("epsample '" + shared.path("store") + "'").c_str());
+        static const int made = run("epsample '" + shared.path("store") + "'");
         EXPECT_EQ(0, made);
         std::filesystem::create_symlink(shared.path("store"), path("store"));
     }
@@ -72,10 +71,13 @@ protected:
     std::string path(const std::string& name) const { return folder_.path(name); }
     void write(const std::string& name, const EPFileBuilder& builder) const { folder_.write(name, builder); }
 
-    /// What makes the shell do `command` in the test's folder, whatever the environment of the tests is.
+    /// What makes the shell do `command` in the test's folder. There `large` lifts the limit of a file's size, as
+    /// epsample needs it for its sparse files.
     std::string script(const std::string& command) const {
-        return "unset KELPISCSIEP_LUNS; export TZ=UTC LC_ALL=C PATH='" PROGRAMS "':\"$PATH\"; cd '" + path("") +
-               "'; {\n" + command + "\n}";
+        return "PATH='" PROGRAMS
+               "':\"$PATH\"; large() { (ulimit -S -f unlimited; \"$@\"); }; "
+               "epsample() { large command epsample \"$@\"; }; cd '" +
+               path("") + "'; {\n" + command + "\n}";
     }
 
     std::string content(const std::string& name) const {
@@ -83,10 +85,31 @@ protected:
         return {std::istreambuf_iterator<char>(file), {}};
     }
 
+    /// Lets a process do `action`, its output in the files .out and .err; returns its exit status.
+    int run(const std::function<void()>& action) const {
+        const pid_t child = fork();
+        if (child == 0) {
+            limitProcess();
+            dup2(open(path(".out").c_str(), O_CREAT | O_TRUNC | O_WRONLY, 0600), STDOUT_FILENO);
+            dup2(open(path(".err").c_str(), O_CREAT | O_TRUNC | O_WRONLY, 0600), STDERR_FILENO);
+            action();
+            _exit(0);
+        }
+        int status = 0;
+        EXPECT_EQ(child, waitpid(child, &status, 0));
+        return exitStatus(status);
+    }
+
+    /// The same for a command; `timeout` ends it with all that it has started.
+    int run(const std::string& command) const {
+        return run(
+            [text = script(command)] { execlp("timeout", "timeout", "-k1", "60", "sh", "-c", text.c_str(), nullptr); });
+    }
+
     void expect(const Case& c) const {
-        EXPECT_EQ(c.status, exitStatus(std::system((script(c.command) + " >.out 2>.err").c_str())));
-        EXPECT_PRED2(matches, content(".out"), c.out);
-        EXPECT_PRED2(matches, content(".err"), c.err);
+        EXPECT_EQ(c.status, run(c.command));
+        EXPECT_TRUE(fits(content(".out"), c.out));
+        EXPECT_TRUE(fits(content(".err"), c.err));
     }
 
 private:
@@ -101,6 +124,7 @@ public:
         const winsize size = {24, columns, 0, 0};
         process_ = forkpty(&terminal_, nullptr, nullptr, &size);
         if (process_ != 0) return;
+        limitProcess();
         action();
         _exit(0);
     }
@@ -111,19 +135,22 @@ public:
     void interrupt() const { EXPECT_EQ(1, write(terminal_, "\003", 1)); }
     void signal(int number) const { EXPECT_EQ(0, kill(-process_, number)); }
 
-    /// All that is shown until `text` is, or to the end.
+    /// All that is shown until it ends in `text`, but not much more than a screen holds.
     std::string shownUntil(const std::string& text) {
         char byte = 0;
-        while (shown_.find(text) == std::string::npos && read(terminal_, &byte, 1) == 1) {
+        while (shown_.size() < 65536 && read(terminal_, &byte, 1) == 1) {
             if (byte == '\n' && !shown_.empty()) shown_.pop_back();
             shown_ += byte;
+            if (shown_.size() >= text.size() && shown_.compare(shown_.size() - text.size(), text.size(), text) == 0)
+                break;
         }
         return shown_;
     }
 
-    /// All that is shown to the end, and "=STATUS".
+    /// All that is shown to the end, and "=STATUS". The process ends at the latest when the terminal is closed.
     std::string shown() {
         shownUntil(std::string(1, '\0'));
+        close(std::exchange(terminal_, -1));
         int status = 0;
         EXPECT_EQ(process_, waitpid(process_, &status, 0));
         return shown_ + "=" + std::to_string(exitStatus(status));

@@ -1,5 +1,4 @@
 // epinspect list, locate and read: what lies in a store, and where the bytes of its LUNs are.
-#include <fcntl.h>
 #include <sys/syscall.h>
 
 #include <cerrno>
@@ -88,22 +87,25 @@ const Case cases[] = {
      "jnl         24576  /var/db/iscsi/EP_JNL\ntbl         24576  /volume1/@iSCSI/EP/EP_TBL\nfri  …00000\n"
      "dat    6442475520  /volume1/@iSCSI/EP/EP_DAT_00001\nmap         57344  LUN 1  4096 entries\n"
      "      BLUN 6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11 lun1\n"
-     "      /volume1/@iSCSI/LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11lun1_00000\ntbl   …2/@iSCSI/EP/EP_TBL\nfri   …2/@iSCSI/EP/EP_FRI\n"
-     "dat      16801792  /volume2/@iSCSI/EP/EP_DAT_00000\nmap         26624  LUN 2  256 entries\n…lun2_00000\n", ""},
+     "      /volume1/@iSCSI/LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11lun1_00000\n"
+     "tbl   …2/@iSCSI/EP/EP_TBL\nfri   …2/@iSCSI/EP/EP_FRI\ndat      16801792  /volume2/@iSCSI/EP/EP_DAT_00000\n"
+     "map         26624  LUN 2  256 entries\n…lun2_00000\n", ""},
     {"list tells what LUNs lack", "mkdir far/volume3; for v in 091 -91 91x; do ln -s volume91 far/volume$v; "
-     "done; epinspect --root far list --luns 5-6; epinspect --root far list --luns 6 --json | tail -n 1", 0, "jnl       missing  /var/db/iscsi/EP_JNL\n"
-     "tbl       missing  /volume91/@iSCSI/EP/EP_TBL\nfri       missing  /volume91/@iSCSI/EP/EP_FRI\n"
-     "dat       3694592  " + ep + "0\ndat 4398047059968  " + ep + "1\n"
+     "done; epinspect --root far list --luns 5-6; epinspect --root far list --luns 6 --json | tail -n 1", 0,
+     "jnl       missing  /var/db/iscsi/EP_JNL\ntbl       missing  /volume91/@iSCSI/EP/EP_TBL\n"
+     "fri       missing  /volume91/@iSCSI/EP/EP_FRI\ndat       3694592  " + ep + "0\ndat 4398047059968  " + ep + "1\n"
      "map         24616  LUN 5  5 entries\n      THIN " + uuid + " five\n      " + lun5 + "\n"
      "map       missing  LUN 6  THIN " + uuid + "\n      /other/@iSCSI/LUN/THIN" + uuid + "_00000\n" + file +
-     "/other/@iSCSI/LUN/THIN" + uuid + R"(_00000","fileKind":"map","size":null,"missing":true,"typeName":"THIN","uuid":")" +
-     uuid + R"(","name":"","lid":6})" "\n", ""},
+     "/other/@iSCSI/LUN/THIN" + uuid + R"(_00000","fileKind":"map","size":null,"missing":true,"typeName":"THIN",)"
+     R"("uuid":")" + uuid + R"(","name":"","lid":6})" "\n", ""},
     {"list needs no LUN list", "cd far/volume91/@iSCSI; mv EP/*0 EP/EP_DAT_99999; >EP/EP_DAT_100000; "
-     "rm -r ../../var EP/*1; for n in " + no + " a-b; do cp LUN/*five* LUN/$n; done; epinspect --root ../.. list --json", 0,
+     "rm -r ../../var EP/*1; for n in " + no + " a-b; do cp LUN/*five* LUN/$n; done; "
+     "epinspect --root ../.. list --json", 0,
      file + ep.substr(0, ep.size() - 4) + R"(99999","fileKind":"dat","size":3694592,"missing":false})" "\n" +
      file + ep.substr(0, ep.size() - 4) + R"(100000","fileKind":"dat","size":0,"missing":false})" "\n" +
      file + lun5 + R"(","fileKind":"map","size":24616,"missing":false,"entries":5,"typeName":"THIN","uuid":")" + uuid +
-     R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-b" + same + "\n", "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read (code 9002)\n"},
+     R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-b" + same + "\n",
+     "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read (code 9002)\n"},
     {"list says what may not be opened", "rm far/var/db/iscsi/*; cd far/volume91/@iSCSI; mv EP LUN/folder; "
      "ln -s /usr EP; rm LUN/THIN*; mkfifo LUN/pipe; ln -s none LUN/link; ln -s self LUN/self; "
      "epinspect --root ../.. list --luns 7; epinspect --root LUN/folder list", 1,
@@ -117,7 +119,8 @@ const Case cases[] = {
      "/volume1/@iSCSI/EP/EP_DAT_00001 position 540024576 (extent 514 of the file)\n" + assumed + "; extents counted "
      "within the data file (counted from the volume's start they would lie past its end)\n"
      "LUN 1 byte 430000000: entry 410, byte 83840 of its extent\n410: hole\n" + assumed +
-     "; what is not mapped reads as zeros\n", "…: LUN 1 byte 18446744073709551615: past the end, the LUN has 4294967296 bytes…"},
+     "; what is not mapped reads as zeros\n",
+     "…: LUN 1 byte 18446744073709551615: past the end, the LUN has 4294967296 bytes…"},
     {"locate writes JSON", "epinspect --root store locate 1 540000000 --json", 0,
      R"({"kind":"place","file":"/volume1/@iSCSI/LUN/BLUN…lun1_00000","lid":1,"lunOffset":540000000,"index":514,)"
      R"("remainder":1031936,"entryOffset":28688,"extentAddress":4194818,"poolNumber":16,"mapped":true,"vpushed":false,)"
@@ -125,7 +128,8 @@ const Case cases[] = {
      R"("extent":514,"position":540024576,"inside":true},{"countFrom":"volume","dataFile":"/volume1/@iSCSI/EP/)"
      R"(EP_DAT_00001","extent":4194818,"position":4398586535680,"inside":false}]})" "\n", ""},
     {"locate names both where the format is ambiguous", "T='epinspect --root far locate 5'; $T 1048577; "
-     "$T 2M --address-bits 48; $T 2M; $T 2M --address-bits 52", 1, "LUN 5 byte 1048577: entry 1, byte 1 of its extent\n…\n" +
+     "$T 2M --address-bits 48; $T 2M; $T 2M --address-bits 52", 1,
+     "LUN 5 byte 1048577: entry 1, byte 1 of its extent\n…\n" +
      ep + "1 position 24577 (extent 0 of the file, counted within it)\n" +
      ep + "1 position 4398046535681 (extent 4194304 of the file, counted from the volume's start)\n" + assumed +
      "; ambiguous: both places lie inside the data file, --count-from decides\n"
@@ -133,17 +137,19 @@ const Case cases[] = {
      ep + "0 position 2121728 (extent 2 of the file)\n" + assumed + "; extent 2, as --address-bits says\n…",
      "epinspect: LUN 5 byte 2097152: " + open2 +
      "epinspect: LUN 5 byte 2097152: position out of any file's range (EP_ERR_SEEK_FAILED, 18990041)\n"},
-    {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M; epinspect --root far locate 5 1M --count-from file | tail -n 1; "
+    {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M; "
+     "epinspect --root far locate 5 1M --count-from file | tail -n 1; "
      "epinspect --root far locate 5 3M --count-from volume --json 2>/dev/null | grep -o '\"extent\":.*'", 0,
      "…\n" + ep + "2 position unknown (extent 8388608 of the file)\n" + assumed + "; extents counted from the volume's "
-     "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), past its end\n…\n" + assumed +
-     "; extents counted within the data file, as --count-from says\n" R"("extent":8388608,"position":null,"inside":false}]})" "\n",
+     "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), past its end\n…\n" +
+     assumed + "; extents counted within the data file, as --count-from says\n"
+     R"("extent":8388608,"position":null,"inside":false}]})" "\n",
      "epinspect: " + ep + "2: LUN 5 byte 3145728: " + notFound +
      "epinspect: " + ep + "0: LUN 5 byte 4718592: " + beyond0 + "…" + lun5 +
      ": LUN 5 byte 5242880: past the end, the map's entries stand for 5242880 bytes (…)\n"},
     {"read gets all that can be had", "epinspect --root far read 5 >image; echo $?; wc -c <image; "
-     "grep -abo '[a-z][a-z]*' image; epinspect --root far read 5 --count-from file --address-bits 48 2>/dev/null | grep -abo '[a-z][a-z]*'", 0,
-     "1\n6291456\n4194304:three\n1048576:here\n2097152:two\n4194304:three\n",
+     "grep -abo '[a-z][a-z]*' image; epinspect --root far read 5 --count-from file --address-bits 48 2>/dev/null | "
+     "grep -abo '[a-z][a-z]*'", 0, "1\n6291456\n4194304:three\n1048576:here\n2097152:two\n4194304:three\n",
      "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: past the end, …\nepinspect: " + ep + "0: LUN 5 bytes "
      "0-1048575: " + beyond0 + "epinspect: " + ep + "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and "
      "both places lie inside the file; --count-from decides …\nepinspect: LUN 5 bytes 2097152-3145727: " + open2 +
@@ -152,15 +158,18 @@ const Case cases[] = {
      "epinspect: LUN 5: 5242880 of 6291456 bytes could not be read, zeros stand in their place\n"},
     {"read reaches beyond four TiB", "T='epinspect --root far read --count-from volume'; $T 5 --offset 1M --length 5; "
      "$T --extent-size 1M " + lun5 + " --offset 1048578 --length 0x1; "
-     "epinspect --root far read 5 --count-from file --offset 512K --length 524292 2>/dev/null | tail -c 4", 0, "thereehere", ""},
+     "epinspect --root far read 5 --count-from file --offset 512K --length 524292 2>/dev/null | tail -c 4", 0,
+     "thereehere", ""},
     {"read follows runs and holes", "epinspect --root store read 2 --offset 9371640 | grep -abo 'extent [0-9]*' | "
      "awk -F: '!seen[$2]++'", 0, "15:extent 80\n65551:extent 128\n3145743:extent 175\n", ""},
     {"neither goes beyond the LUN", "for a in 'read 5 --offset 6M' 'read 5 --length 7M' 'read 6' 'read 7'; "
      "do epinspect --root far $a; echo $?; done; "
      "cp far" + lun5 + " m; epinspect read m --extent-size 1M --length 1 | od -An -tx1", 0, "1\n1\n1\n1\n 00\n",
-     "…byte 6291456: past the end, the LUN has 6291456 bytes (…: LUN 6: extent size cannot be used (…No such LUN…epinspect: m: byte 0: path names no volume (…1 of 1 bytes…"},
+     "…byte 6291456: past the end, the LUN has 6291456 bytes (…: LUN 6: extent size cannot be used (…"
+     "No such LUN…epinspect: m: byte 0: path names no volume (…1 of 1 bytes…"},
     {"wrong usage is named", "for a in 'read none' 'read 0X1FFFFFFFF' 'locate 5 1x' 'locate 5 1 --address-bits 50'; "
-     "do epinspect $a; done; epinspect read 5 --count-from LUN", 2, "", "epinspect: --extent-size is missing: a map file does not hold it…LUN: '0X1FFFFFFFF'…"
+     "do epinspect $a; done; epinspect read 5 --count-from LUN", 2, "",
+     "epinspect: --extent-size is missing: a map file does not hold it…LUN: '0X1FFFFFFFF'…"
      "OFFSET: '1x'…--address-bits: '50': not 48 or 52…--count-from: 'LUN': not file or volume…"},
 };
 // clang-format on
@@ -171,21 +180,14 @@ TEST_F(Store, ReadLosesNoMoreThanWhatCannotBeRead) {
     EPFileBuilder data = EPFileBuilder::data().bytes(24576 + 3 * MiB, std::string(700000, 'x'));
     write("far" + ep + "0", data.resize(24576 + 4 * MiB));
     const auto expectRead = [this](int result, std::int64_t bad, const std::string& read, const std::string& lost) {
-        const pid_t child = fork();
-        if (child == 0) {
-            dup2(open(path(".out").c_str(), O_CREAT | O_TRUNC | O_WRONLY, 0600), STDOUT_FILENO);
-            dup2(open(path(".err").c_str(), O_CREAT | O_TRUNC | O_WRONLY, 0600), STDERR_FILENO);
-            unsetenv("KELPISCSIEP_LUNS");
-            std::tie(badResult, badPosition) = std::pair(result, bad);
-            const std::string root = path("far");
-            _exit(runHere({"", "--root", root.c_str(), "read", "5", "--offset=4194404", "--length=600000"}));
-        }
-        int status = 0;
-        EXPECT_EQ(child, waitpid(child, &status, 0));
-        EXPECT_EQ(1, exitStatus(status));
-        EXPECT_EQ(read, content(".out"));
-        EXPECT_PRED2(matches, content(".err"),
-                     "epinspect: " + lost + " of 600000 bytes could not be read, zeros stand in their place\n");
+        EXPECT_EQ(1, run([&] {
+                      std::tie(badResult, badPosition) = std::pair(result, bad);
+                      const std::string root = path("far");
+                      _exit(runHere({"", "--root", root.c_str(), "read", "5", "--offset=4194404", "--length=600000"}));
+                  }));
+        EXPECT_TRUE(fits(content(".out"), read));
+        EXPECT_TRUE(fits(content(".err"),
+                         "epinspect: " + lost + " of 600000 bytes could not be read, zeros stand in their place\n"));
     };
     // Of the bytes asked for, which start at byte 100 of the extent, number 72 of the pieces of 4096; then the map.
     const std::string zeros(600000, '\0'), xs(294912, 'x'), all = lun5 + ": LUN 5 bytes 4194404-4794403: ";
