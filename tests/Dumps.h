@@ -3,7 +3,14 @@
 
 #include <string>
 
+#include "Fits.h"
+
 // clang-format off
+inline const std::string uuids[] = {  // by type
+    "", "10111213-1415-1617-1819-1a1b1c1d1e1f", "20212223-2425-2627-2829-2a2b2c2d2e2f",
+    "30313233-3435-3637-3839-3a3b3c3d3e3f", "40414243-4445-4647-4849-4a4b4c4d4e4f",
+    "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf"};
+
 inline std::string head0Dump(const std::string& type, const std::string& uuid, const std::string& dataStartOffset) {
     return "================ HEAD[0] ================\nchecksum:\t\t0xa1b2c3d\nversion:\t\t33752069\n"
         "magic code:\t\t0x1122334455667788\ntype:\t\t\t" + type + "\nUUID:\t\t\t" + uuid +

@@ -4,27 +4,36 @@
 #include <ISCSIEPFileJNL.h>
 #include <ISCSIEPFileMAP.h>
 #include <ISCSIEPFileTBL.h>
-#include <ISCSILUNConfInfo.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <future>
 #include <locale>
+#include <map>
 #include <new>
+#include <regex>
 
 #include "Dumps.h"
 #include "Support.h"
 
 using namespace ISCSI::TOOL;
 using epbuilder::EPFileBuilder;
+namespace head0 = epbuilder::head0;
 
 namespace {
 
-constexpr const char* freshHead0 =
-    "================ HEAD[0] ================\nchecksum:\t\t0x0\nversion:\t\t0\nmagic code:\t\t0x0\n"
-    "type:\t\t\t0\nUUID:\t\t\t\ndata start offset:\t0x0\ncreate time:\t\tThu Jan 01 00:00:00 UTC 1970\n";
+/// The dump of a new object, made from the one of a file: values are 0, in 1970 or empty, and there are no pools.
+std::string emptied(std::string dump) {
+    const std::string epoch = "\tThu Jan 01 00:00:00 UTC 1970";
+    const std::map<std::string, std::string> values = {{"\t0x[0-9a-f]+", "\t0x0"},
+                                                       {"\t[0-9]+\n", "\t0\n"},
+                                                       {"\t[0-9a-f]{8}-.*", "\t"},
+                                                       {"\t[^\t]* UTC .*", epoch},
+                                                       {"pool #.*\n", ""}};
+    for (const auto& [value, none] : values) dump = std::regex_replace(dump, std::regex(value), none);
+    return dump;
+}
 
 /// What a new object shows, made where memory holds something else.
 template <typename File>
@@ -37,10 +46,10 @@ std::string freshDump() {
     return dump;
 }
 
-/// One kind of file as the builder makes it: type and UUID in HEAD[0], the further sections of a new object and of the
-/// parsed file, and the source and line of the class's own message.
+/// One kind of file as the builder makes it: type and UUID in HEAD[0], the further sections, and the source and line of
+/// the class's own message.
 struct Kind {
-    std::string type, uuid, freshSections, sections, source;
+    std::string type, uuid, sections, source;
 };
 
 /// The file is shown as promised; an unreadable one leaves the object as it was, and a chain of lines.
@@ -49,12 +58,12 @@ void expectKind(const EPFileBuilder& builder, const Kind& kind) {
     const TempDir folder;
     const std::string path = folder.write("file", builder);
     File file(path);
-    const std::string fresh = freshHead0 + kind.freshSections;
-    EXPECT_EQ(fresh, freshDump<File>());
-    EXPECT_EQ(0, file.parseFile());
     const std::string head0 = head0Dump(kind.type, kind.uuid, "0x6162636465666768");
-    EXPECT_EQ(head0 + kind.sections, static_cast<const ISCSIEPFile&>(file).toString());
-    EXPECT_EQ(head0, file.ISCSIEPFile::toString());
+    const std::string fresh = emptied(head0 + kind.sections);
+    EXPECT_TRUE(fits(freshDump<File>(), fresh));
+    EXPECT_EQ(0, file.parseFile());
+    EXPECT_TRUE(fits(static_cast<const ISCSIEPFile&>(file).toString(), head0 + kind.sections));
+    EXPECT_TRUE(fits(file.ISCSIEPFile::toString(), head0));
 
     const auto expectFailure = [&](const std::string& unreadable, int code, const std::string& first) {
         File other(unreadable);
@@ -62,7 +71,7 @@ void expectKind(const EPFileBuilder& builder, const Kind& kind) {
         EXPECT_EQ(chain(unreadable, {first, "ISCSIEPFile.cpp:59:parseHead0 Failed to read header.",
                                      kind.source + ":parseFile Failed to get parse HEAD[0]."}),
                   takeLog());
-        EXPECT_EQ(fresh, other.toString());
+        EXPECT_TRUE(fits(other.toString(), fresh));
     };
     expectFailure("", 18990038, "ISCSIEPFile.cpp:37:readHeader Failed to open file.");
     expectFailure(path + "no%s%n", 18990038, "ISCSIEPFile.cpp:37:readHeader Failed to open file.");
@@ -83,50 +92,30 @@ struct Grouping : std::numpunct<char> {
 
 }  // namespace
 
-// clang-format off
 TEST(EPFile, EveryKindIsDecodedAndShownWhateverTheGlobalLocale) {
     const std::locale before = std::locale::global(std::locale(std::locale::classic(), new Grouping));
-    const auto valid = [](EPFileBuilder builder) { return builder.set(epbuilder::head0::dataStartOffset, 0x6162636465666768); };
-    expectKind<ISCSIEPFileTBL>(valid(EPFileBuilder::table()), {"1", "10111213-1415-1617-1819-1a1b1c1d1e1f",
-        "================ HEAD[1] ================\nchecksum:\t\t0x0\nextent size:\t\t0\nentry size:\t\t0\ntotal count:\t\t0\n",
-        tableDump, "ISCSIEPFileTBL.cpp:41"});
-    expectKind<ISCSIEPFileFRI>(valid(EPFileBuilder::freeIndex().set(epbuilder::head0::type, 0xffffffff)),
-        {"4294967295", "20212223-2425-2627-2829-2a2b2c2d2e2f",
-        "================ HEAD[1] ================\nchecksum:\t\t0x0\nentry size:\t\t0\ntotal group count:\t0x0\n"
-        "================ VAR[0]  ================\nchecksum:\t\t0x0\ntotal free count:\t0x0\nindex head:\t\t0\n",
-        freeIndexDump, "ISCSIEPFileFRI.cpp:45"});
-    expectKind<ISCSIEPFileDAT>(valid(EPFileBuilder::data()), {"3", "30313233-3435-3637-3839-3a3b3c3d3e3f",
-        "================ HEAD[1] ================\nchecksum:\t\t0x0\nserial number:\t\t0\n", dataDump, "ISCSIEPFileDAT.cpp:38"});
-    expectKind<ISCSIEPFileMAP>(valid(EPFileBuilder::map()), {"4", "40414243-4445-4647-4849-4a4b4c4d4e4f",
-        "================ HEAD[1] ================\nchecksum:\t\t0x0\nattribute:\t\t0x0\nlogic block size:\t0\ntotal count:\t\t0\n"
-        "parent UUID:\t\t\nparent total count:\t0\n================ VAR[0]  ================\nchecksum:\t\t0x0\nmapped count:\t\t0\n"
-        "================ VAR[1]  ================\nchecksum:\t\t0x0\nseg0 checksum:\t\t0x0\nseg0 pool count:\t0\nsession UUID:\t\t\n"
-        "promote time:\t\tThu Jan 01 00:00:00 UTC 1970\n================ VAR[2]  ================\nchecksum:\t\t0x0\nsync count:\t\t0\n"
-        "child attribute:\t0x0\ntrack UUID:\t\t\nprevious track UUID:\t\ncurrent track UUID:\t\n================ SEG[0]  ================\n",
-        mapDump, "ISCSIEPFileMAP.cpp:63"});
-    expectKind<ISCSIEPFileJNL>(valid(EPFileBuilder::journal()), {"5", "c0c1c2c3-c4c5-c6c7-c8c9-cacbcccdcecf",
-        "================ HEAD[1] ================\nchecksum:\t\t0x0\ntotal count:\t\t0\n"
-        "================ VAR[0]  ================\nchecksum:\t\t0x0\nshutdown tag:\t\t0x0\nsync count:\t\t0\n"
-        "================ VAR[1]  ================\nchecksum:\t\t0x0\nlast trans ID:\t\t0\nlast record start:\t0\nlast flush errno:\t0\n"
-        "last recovery error:\t0\nempty record start:\t0\n", journalDump, "ISCSIEPFileJNL.cpp:55"});
+    const auto valid = [](EPFileBuilder file) { return file.set(head0::dataStartOffset, 0x6162636465666768); };
+    expectKind<ISCSIEPFileTBL>(valid(EPFileBuilder::table()), {"1", uuids[1], tableDump, "ISCSIEPFileTBL.cpp:41"});
+    expectKind<ISCSIEPFileFRI>(valid(EPFileBuilder::freeIndex().set(head0::type, 0xffffffff)),
+                               {"4294967295", uuids[2], freeIndexDump, "ISCSIEPFileFRI.cpp:45"});
+    expectKind<ISCSIEPFileDAT>(valid(EPFileBuilder::data()), {"3", uuids[3], dataDump, "ISCSIEPFileDAT.cpp:38"});
+    expectKind<ISCSIEPFileMAP>(valid(EPFileBuilder::map()), {"4", uuids[4], mapDump, "ISCSIEPFileMAP.cpp:63"});
+    expectKind<ISCSIEPFileJNL>(valid(EPFileBuilder::journal()), {"5", uuids[5], journalDump, "ISCSIEPFileJNL.cpp:55"});
     std::locale::global(before);
 }
-// clang-format on
 
 TEST(EPFile, TheSystemsReasonIsLeftInErrno) {
     const TempDir folder;
     const std::string path = folder.write("closed", EPFileBuilder::table());
     std::filesystem::permissions(path, std::filesystem::perms::none);
     std::filesystem::create_symlink("loop", folder.path("loop"));
-    const std::pair<std::string, int> reasons[] = {
-        {folder.path("missing"), ENOENT},
-        {path, EACCES},
-        {folder.path("loop"), ELOOP},
-        {folder.path(""), EISDIR},
-        {folder.path(std::string(300, 'x')), ENAMETOOLONG},
-        {path + "/below", ENOTDIR},
-        {folder.write("short", EPFileBuilder::table().resize(24575)), 0},
-    };
+    const std::pair<std::string, int> reasons[] = {{folder.path("missing"), ENOENT},
+                                                   {path, EACCES},
+                                                   {folder.path("loop"), ELOOP},
+                                                   {folder.path(""), EISDIR},
+                                                   {folder.path(std::string(300, 'x')), ENAMETOOLONG},
+                                                   {path + "/below", ENOTDIR},
+                                                   {folder.write("short", EPFileBuilder::table().resize(24575)), 0}};
     for (const auto& [name, reason] : reasons) {
         const uid_t self = geteuid();
         EXPECT_EQ(0, seteuid(reason == EACCES && self == 0 ? 65534 : self));
@@ -155,7 +144,7 @@ TEST(EPFile, TheSystemsReasonIsLeftInErrno) {
 TEST(EPFile, AnObjectKeepsItsSnapshotUntilReadAnew) {
     const TempDir folder;
     const auto write = [&folder](unsigned int entrySize, unsigned int type, std::uint64_t size) {
-        auto table = EPFileBuilder::table().set(epbuilder::tbl::entrySize, entrySize).set(epbuilder::head0::type, type);
+        auto table = EPFileBuilder::table().set(epbuilder::tbl::entrySize, entrySize).set(head0::type, type);
         return folder.write("file", table.resize(size));
     };
     ISCSIEPFileTBL file(write(16, 1, 24576));
@@ -171,7 +160,7 @@ TEST(EPFile, AnObjectKeepsItsSnapshotUntilReadAnew) {
     EXPECT_EQ(33U, file.entrySize);
     std::filesystem::remove(file.path);
     EXPECT_EQ(18990038, file.parseFile());  // type 0 is read at each parse
-    EXPECT_EQ(before, file.toString());
+    EXPECT_TRUE(fits(file.toString(), before));
     ISCSIEPFileJNL zeros("/dev/zero");
     EXPECT_EQ(0, zeros.parseFile());
     EXPECT_EQ("00000000-0000-0000-0000-000000000000", zeros.head0UUID);
@@ -206,27 +195,5 @@ TEST(EPFile, DumpsMayBeMadeOnSeveralThreads) {
     };
     std::vector<std::future<std::string>> dumps(4);
     for (auto& made : dumps) made = std::async(std::launch::async, dump);
-    for (auto& made : dumps) EXPECT_EQ(dump(), made.get());
-}
-
-TEST(EPFile, SlotsAndMembersStandInTheDocumentedOrder) {
-    std::string (ISCSIEPFileMAP::*const operation)() const = &ISCSIEPFileMAP::toString;
-    std::size_t word = 0;  // of a virtual operation: its slot, in bytes; on x86 plus 1
-    std::memcpy(&word, &operation, sizeof word);
-    EXPECT_EQ(2U, word / sizeof(void*));
-    const ISCSIEPFileMAP m;
-    const ISCSIEPFileJNL j;
-    const ISCSIEPMapEntryInfo e;
-    const ISCSILUNConfInfo l;
-    // clang-format off
-    const std::vector<const void*> members[] = {
-        {&m.path, &m.headerBlock, &m.head0Checksum, &m.head0Version, &m.head0MagicCode, &m.head0Type, &m.head0UUID,
-         &m.head0DataStartOffset, &m.head0CreateTime, &m.head1Checksum, &m.attribute, &m.totalCount, &m.parentUUID,
-         &m.var0Checksum, &m.seg0Checksum, &m.sessionUUID, &m.var2Checksum, &m.syncCount, &m.trackUUID, &m.poolUUIDs},
-        {&j.head1Checksum, &j.totalCount, &j.var0Checksum, &j.shutdownTag, &j.syncCount, &j.var1Checksum,
-         &j.lastTransID, &j.lastRecordStart, &j.lastFlushErrno, &j.lastRecoveryError, &j.emptyRecordStart},
-        {&e.extentAddress, &e.poolNumber, &e.mapped, &e.vpushed, &e.vpulled, &e.synced},
-        {&l.lid, &l.extentSize, &l.size, &l.restoreTime, &l.type, &l.uuid, &l.rootPath, &l.name}};
-    // clang-format on
-    for (const auto& ofClass : members) EXPECT_TRUE(std::is_sorted(ofClass.begin(), ofClass.end()));
+    for (auto& made : dumps) EXPECT_TRUE(fits(made.get(), dump()));
 }
