@@ -9,6 +9,11 @@ protected:
         EPFileBuilder seven = EPFileBuilder::map().entry(0, 0xc000000000000005).entry(1, 0xc000000000000006);
         seven.entry(2, 0xa010000000000007).entry(5, 0x1000000000000008).entry(6, 0x4000000000000009);
         write("seven", seven);
+        constexpr std::uint64_t top[] = {0x800, 0x800, 0x801, 0x001, 0x401, 0x601, 0x701, 0, 0x001, 0x001, 0x100, 0, 0};
+        EPFileBuilder unlike = EPFileBuilder::map();
+        for (std::uint64_t i = 0; i < 9000; ++i)
+            unlike.entry(i, i < 13 ? top[i] << 52U | (i < 7 ? i : 0) : top[0] << 52U | i);
+        write("unlike", unlike);
         write("none", EPFileBuilder::map());
         write("holes", EPFileBuilder::map().resize(24576 + 8 * 20000));
         write("data", EPFileBuilder::data());
@@ -38,16 +43,21 @@ const Case cases[] = {
      R"({"kind":"run","file":"seven","first":2,"count":1,"entryOffset":24592,"extentAddress":7,"poolNumber":16,)"
      R"("mapped":true,"vpushed":false,"vpulled":true,"synced":false})" "\n"
      R"({"kind":"run","file":"seven","first":3,"count":2,"entryOffset":24600,"hole":true})" "\n"
-     R"({"kind":"run","file":"seven","first":5,"count":1,"entryOffset":24616,"extentAddress":8,"poolNumber":0,)"
-     R"("mapped":false,"vpushed":false,"vpulled":false,"synced":true})" "\n"
-     R"({"kind":"run","file":"seven","first":6,"count":1,"entryOffset":24624,"extentAddress":9,"poolNumber":0,)"
-     R"("mapped":false,"vpushed":true,"vpulled":false,"synced":false})" "\n"
+     R"({"kind":"run",…"first":5,"count":1,"entryOffset":24616,…"mapped":false,"vpushed":false,…"synced":true})" "\n"
+     R"({"kind":"run",…"first":6,"count":1,"entryOffset":24624,…"mapped":false,"vpushed":true,…"synced":false})" "\n"
      R"({"kind":"summary","file":"seven","summary":true,"entries":7,"mapped":3,"unmapped":2,"vpushed":3,"vpulled":1,)"
      R"("synced":1,"holes":2,"runs":5})" "\n", ""},
+    {"joins neighbours that are alike in everything, across blocks too", "epinspect map unlike", 0,
+     "0-1: mapped, pool 0, extents 0-1\n2: mapped, pool 16, extent 2\n3: unmapped, pool 16, extent 3\n"
+     "4: unmapped vpushed, pool 16, extent 4\n5: unmapped vpushed vpulled, pool 16, extent 5\n"
+     "6: unmapped vpushed vpulled synced, pool 16, extent 6\n7: hole\n8: unmapped, pool 16, extent 0\n"
+     "9: unmapped, pool 16, extent 0\n10: unmapped synced, pool 0, extent 0\n11-12: hole\n"
+     "13-8999: mapped, pool 0, extents 13-8999\n9000 entries in 12 runs: …", ""},
     {"draws a chart", "epinspect map seven --chart", 0, "0 |###....|\nOne cell: 1 entry\n"
      "Mapped: . none  - <1/3  + <2/3  * most  # all\n"
      "7 entries in 5 runs: 3 mapped, 2 unmapped, 2 holes; 3 vpushed, 1 vpulled, 1\nsynced\n", ""},
-    {"sums up the maps of the sample store", "for m in store/volume*/@iSCSI/LUN/*; do epinspect map $m | tail -n 1; done", 0,
+    {"sums up the maps of the sample store", "for m in store/volume*/@iSCSI/LUN/*; do "
+     "epinspect map $m | tail -n 1; done", 0,
      "4096 entries in 402 runs: 2256 mapped, 0 unmapped, 1840 holes; 96 vpushed, 48 vpulled, 1200 synced\n"
      "256 entries in 20 runs: 128 mapped, 0 unmapped, 128 holes; 48 vpushed, 16 vpulled, 112 synced\n", ""},
     {"takes a part, however small or large", "epinspect map seven --first=3 --count=1; epinspect map none; "

@@ -1,45 +1,25 @@
-// The rooms of epinspect on their own: numbers, runs, the chart, the system log, progress.
+// Parts of epinspect on their own: numbers, the system log, progress, memory that runs out, characters that deceive.
 #include <clocale>
 #include <cstdarg>
 #include <cstdlib>
-#include <cwctype>
 #include <map>
 #include <new>
-#include <set>
-#include <sstream>
 #include <thread>
 
-#include "frame/CommandLine.h"
 #include "InProcess.h"
+#include "ProgramTest.h"
+#include "frame/CommandLine.h"
 #include "frame/Numbers.h"
 #include "frame/Output.h"
-#include "ProgramTest.h"
 #include "frame/Progress.h"
 #include "frame/Session.h"
-#include "commands/MapChart.h"
-#include "map/MapRuns.h"
 
 using namespace epinspect;
 
 namespace {
 
-using Numbers = std::map<std::string, std::uint64_t>;
-
 std::string forwarded;   ///< what went to the system log
 bool haveMemory = true;  ///< operator new fails otherwise
-
-/// "FIRST+COUNT@ADDRESS " of each run in the blocks of entries.
-std::string runsOf(const std::vector<std::vector<MapEntry>>& blocks) {
-    std::ostringstream text;
-    const auto emit = [&text](const MapRun& run) {
-        text << run.first << '+' << run.count << '@' << run.entry.extentAddress << ' ';
-    };
-    MapRuns runs;
-    std::uint64_t first = 0;
-    for (const auto& block : blocks) runs.add(std::exchange(first, first + block.size()), block, emit);
-    runs.finish(emit);
-    return text.str();
-}
 
 }  // namespace
 
@@ -65,79 +45,25 @@ extern "C" void syslog(int priority, const char* format, ...);
 [[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
 
 // clang-format off
-TEST(Numbers, AreDecimalOrHexadecimalAndNothingElse) {
-    for (const auto& [text, number] : Numbers{{"0", 0}, {"007", 7}, {"0x1F", 31}, {"0Xa", 10},
-                                              {"18446744073709551615", UINT64_MAX}})
-        EXPECT_EQ(number, parseNumber(text)) << text;
-    for (const char* text : {"", "0x", "x1", "1x", " 1", "1 ", "-1", "+1", "1K", "0x-1", "18446744073709551616"})
-        EXPECT_THROW(parseNumber(text), UsageError) << text;
-    EXPECT_EQ(UINT32_MAX, parseNumber32("4294967295"));
-    EXPECT_THROW(parseNumber32("4294967296"), UsageError);
-}
-
-TEST(Numbers, OfBytesMayHaveAUnit) {
-    for (const auto& [text, size] : Numbers{{"8", 8}, {"3K", 3072}, {"0x10M", 16777216}, {"1G", 1073741824},
-                                            {"2T", 2199023255552}, {"1KiB", 1024}, {"1MiB", 1048576},
-                                            {"1GiB", 1073741824}, {"1TiB", 1099511627776},
-                                            {"16777215T", 18446742974197923840U}})
-        EXPECT_EQ(size, parseSize(text)) << text;
-    for (const char* text : {"K", "1KB", "1kib", "1KiBx", "1KK", "1E", "16777216T"})
-        EXPECT_THROW(parseSize(text), UsageError) << text;
-    EXPECT_EQ(4294966272U, parseSize32("4194303K"));
-    EXPECT_THROW(parseSize32("4194304K"), UsageError);
-}
-
-TEST(Numbers, OfARangeDoNotRunBackwards) {
-    for (const auto& [text, last] : Numbers{{"5", 5}, {"5-5", 5}, {"5-0x9", 9}, {"5-18446744073709551615", UINT64_MAX}})
-        EXPECT_TRUE(parseRange(text).first == 5 && parseRange(text).last == last) << text;
-    for (const char* text : {"6-5", "5-", "-5", "1-2-3", "-", "0-18446744073709551616"})
-        EXPECT_THROW(parseRange(text), UsageError) << text;
-    EXPECT_EQ(UINT32_MAX, parseRange32("0-4294967295").last);
-    EXPECT_THROW(parseRange32("0-4294967296"), UsageError);
+TEST(Numbers, AreReadWholeOrRefused) {
+    const auto expect = [](const auto& parse, const std::map<std::string, std::uint64_t>& right, const auto&... wrong) {
+        for (const auto& [text, number] : right) EXPECT_EQ(number, parse(text)) << text;
+        for (const char* text : {wrong...}) EXPECT_THROW(parse(text), UsageError) << text;
+    };
+    const auto last = [](const std::string& text) { return parseRange(text).first == 5 ? parseRange(text).last : 0; };
+    const auto last32 = [](const std::string& text) { return parseRange32(text).last; };
+    expect(parseNumber, {{"0", 0}, {"007", 7}, {"0x1F", 31}, {"0Xa", 10}, {"18446744073709551615", UINT64_MAX}},
+           "", "0x", "x1", "1x", " 1", "1 ", "-1", "+1", "1K", "0x-1", "18446744073709551616");
+    expect(parseSize, {{"8", 8}, {"3K", 3072}, {"0x10M", 16777216}, {"1G", 1073741824}, {"2T", 2199023255552},
+                       {"1KiB", 1024}, {"1MiB", 1048576}, {"1GiB", 1073741824}, {"1TiB", 1099511627776},
+                       {"16777215T", 18446742974197923840U}}, "K", "1KB", "1kib", "1KiBx", "1KK", "1E", "16777216T");
+    expect(last, {{"5", 5}, {"5-5", 5}, {"5-0x9", 9}, {"5-18446744073709551615", UINT64_MAX}},
+           "6-5", "5-", "-5", "1-2-3", "-", "0-18446744073709551616");
+    expect(parseNumber32, {{"4294967295", UINT32_MAX}}, "4294967296");
+    expect(parseSize32, {{"4194303K", 4294966272U}}, "4194304K");
+    expect(last32, {{"0-4294967295", UINT32_MAX}}, "0-4294967296");
 }
 // clang-format on
-
-TEST(Runs, MergeNeighboursThatAreAlike) {
-    const MapEntry hole, entry(7, 1, true, false, false, false), next(8, 1, true, false, false, false);
-    EXPECT_EQ("0+2@7 2+1@8 ", runsOf({{entry, next, next}}));
-    EXPECT_EQ("0+3@7 ", runsOf({{entry, next}, {{9, 1, true, false, false, false}}}));
-    EXPECT_EQ("0+3@0 ", runsOf({{hole, hole}, {}, {hole}}));
-    for (const MapEntry& other : {entry, hole, MapEntry(6, 1, true, false, false, false),
-                                  MapEntry(9, 1, true, false, false, false), MapEntry(8, 2, true, false, false, false),
-                                  MapEntry(8, 1, false, false, false, false), MapEntry(8, 1, true, true, false, false),
-                                  MapEntry(8, 1, true, false, true, false), MapEntry(8, 1, true, false, false, true)}) {
-        const std::string runs = "0+1@7 1+1@" + std::to_string(other.extentAddress) + " ";
-        EXPECT_EQ(runs, runsOf({{entry, other}})) << other.toString();
-        EXPECT_EQ(runs, runsOf({{entry}, {other}})) << other.toString() << "in another block";
-    }
-    const MapEntry hasPool(0, 5, false, false, false, false), synced(0, 0, false, false, false, true);
-    EXPECT_EQ("0+1@0 1+1@0 2+1@0 3+1@0 4+2@0 ", runsOf({{hole, hasPool, hasPool, synced, hole, hole}}));
-}
-
-TEST(Chart, ShadesACellByItsShareOfMappedEntries) {
-    MapChart chart(0, 6160, 40);  // 16 rows of 33 cells, of 12 entries each; the last cell has but 4
-    for (const unsigned int mapped : {0U, 1U, 3U, 4U, 7U, 8U, 11U, 12U}) {
-        chart.add(true, mapped);
-        chart.add(false, 12 - mapped);
-    }
-    chart.add(false, 6160 - 8 * 12 - 4);
-    chart.add(true, 4);
-    const std::string drawn = chart.draw(false);
-    EXPECT_EQ("   0 |.--++**#.........................|\n 396 |", drawn.substr(0, 47));
-    EXPECT_EQ("   0 |·░░▒▒▓▓█·", chart.draw(true).substr(0, 31));
-    EXPECT_EQ(
-        "\n5940 |..................#|\nOne cell: 12 entries\n"
-        "Mapped: . none  - <1/3  + <2/3  * most\n        # all\n",
-        drawn.substr(drawn.rfind("\n5940")));
-}
-
-TEST(Chart, StartsRowsWithAnIndexHoweverNarrow) {
-    MapChart wide(95, 10, 80), narrow(68, 32, 2);
-    wide.add(true, 10);
-    narrow.add(true, 32);
-    EXPECT_EQ(" 95 |##########|\nOne cell: 1 entry\n", wide.draw(false).substr(0, 35));
-    EXPECT_EQ(" 68 |#|\n 70 |#|\n 72 |#|\n", narrow.draw(false).substr(0, 24));
-}
 
 TEST(SystemLog, GetsEveryLineButThoseAboutACopyAndThoseOfIdsTriedOut) {
     forwarded.clear();
@@ -167,18 +93,25 @@ TEST(Program, SaysThatMemoryRanOut) {
     EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, work).shown());
 }
 
-TEST(Output, EscapesEveryPrintableCharacterThatIsInvisibleOrTurnsTheDirection) {
-    std::set<std::uint32_t> invisible = {0x2800};  // the braille pattern without dots; the others as Unicode has them
-    FILE* properties =
-        popen(R"(perl -e 'for (160..0x10FFFF) { print "$_ " if chr =~ /\p{DI}|\p{Cf}|\p{Zl}|\p{Zp}/ }')", "r");
-    for (std::uint32_t number = 0; std::fscanf(properties, "%u", &number) == 1;) invisible.insert(number);
-    EXPECT_EQ(0, pclose(properties));
+TEST(Output, EscapesPrintableCharactersThatAreInvisibleOrTurnTheDirection) {
+    const std::wstring escaped =                                         // the first and the last of each kind
+        L"\u00ad\u034f\u0600\u0605\u061c\u06dd\u070f\u0890\u0891\u08e2"  // soft hyphen, joiner, Arabic and Syriac marks
+        L"\u115f\u1160\u3164\uffa0\u17b4\u17b5"                          // Hangul fillers, Khmer vowels
+        L"\u180b\u180f\ufe00\ufe0f\U000e0001\U000e0100\U000e0fff"        // variation selectors, tags
+        L"\u200b\u200f\u202a\u202e\u2060\u206f\ufeff"                    // of no width, directions, joiners
+        L"\u2800\ufff9\ufffb"                                            // braille without dots, annotations
+        L"\U000110bd\U000110cd\U00013430\U0001343f"                      // Kaithi, hieroglyphs
+        L"\U0001bca0\U0001bca3\U0001d173\U0001d17a";                     // shorthand, music
+    const std::wstring shown =                                           // beside these
+        L"\u00a0\u00ac\u00ae\u034e\u0350\u0606\u061b\u06dc\u06de\u0710\u08e1\u08e3\u115e\u1161\u3163\u3165\uff9f\uffa1"
+        L"\u17b3\u17b6\u180a\u1810\ufdff\ufe10\u200a\u2010\u2027\u202f\u205f\u2070\u27ff\u2801\ufffc\ufffd"
+        L"\U000110bc\U000110be\U0001bc9f\U0001d172\U0001d17b\u00e4\u4e2d";
     ASSERT_NE(nullptr, std::setlocale(LC_CTYPE, "C.UTF-8"));
-    for (wchar_t character = 160; character <= 0x10FFFF; ++character) {
-        if (std::iswprint(static_cast<std::wint_t>(character)) == 0) continue;
+    for (const wchar_t character : escaped + shown) {
         char bytes[16];
         std::mbstate_t state = {};
         const std::string text(bytes, std::wcrtomb(bytes, character, &state));
-        ASSERT_EQ(invisible.count(static_cast<std::uint32_t>(character)) == 0, printable(text) == text) << character;
+        EXPECT_EQ(escaped.find(character) == std::wstring::npos, printable(text) == text)
+            << std::hex << static_cast<unsigned int>(character);
     }
 }
