@@ -1,6 +1,5 @@
 #include <map>
 
-#include "../src/DumpText.h"
 #include "Support.h"
 #include "etc/ISCSIQuorinStringTool.h"
 
@@ -48,12 +47,6 @@ TEST(ErrorNames, AreThoseOfTheLibrarysOwnCodesAndOfNoOthers) {
     }
     EXPECT_EQ(nullptr, GetErrorName(0));
     EXPECT_EQ(nullptr, GetErrorName(9001));
-}
-
-TEST(StringTools, LongLabelsAndSectionNamesKeepTheDumpInShape) {
-    EXPECT_EQ(
-        "================ SECTIONS ================\na label of 22 columns!:\t0x1f\na label of 23 columns!!:\t7\n",
-        DumpText({}).section("SECTIONS").hex("a label of 22 columns!", 31).dec("a label of 23 columns!!", 7).str());
 }
 
 TEST(StringTools, TimesFollowTheZoneAndAreSigned) {
