@@ -2,6 +2,7 @@
 #pragma once
 
 #include <sys/mman.h>
+#include <sys/resource.h>
 #include <unistd.h>
 
 #include <cstdint>
@@ -11,6 +12,18 @@
 
 /// Gives way to the program's own, where that is fuzzed.
 extern "C" __attribute__((visibility("default"), weak)) void syslog(int /*priority*/, const char* /*format*/, ...) {}
+
+/// Stops what runs wild: after ten seconds for an input, before a file gets larger than 8 MiB, and without showing what
+/// it prints. Options that are typed come later, and count more.
+extern "C" int LLVMFuzzerInitialize(int* count, char*** arguments) {
+    static char time[] = "-timeout=10", output[] = "-close_fd_mask=3";
+    static std::vector<char*> words(*arguments, *arguments + *count);
+    words.insert(words.begin() + 1, {time, output});
+    *count += 2;
+    *arguments = words.data();
+    const rlimit fileSize = {8U << 20U, RLIM_INFINITY};
+    return setrlimit(RLIMIT_FSIZE, &fileSize);
+}
 
 inline void require(bool holds) {
     if (!holds) std::abort();
