@@ -58,7 +58,9 @@ protected:
     }
 };
 
-const std::string shorter = "epinspect: s: entry …: the file has become shorter while it was read (EP_ERR_…)\n";
+const std::string shorter =
+    "epinspect: s: entry …: the file has become shorter while it was read (EP_ERR_…)\nepinspect: s: has changed while "
+    "it was read\n";
 
 // clang-format off
 const Case cases[] = {
@@ -69,7 +71,7 @@ const Case cases[] = {
      "8: only in the first: unmapped, pool 0, extent 7\n"
      "10 entries: 3 same, 2 only in the first, 1 only in the second, 2 moved, 2 with other flags\n", ""},
     {"diff writes both entries as JSON", "epinspect diff --entries none y --json; epinspect diff --entries a b --json | cut -d, -f 4-6 | head -n 5", 0, R"({"kind":"difference","file":"none","otherFile":"y","first":0,"count":4,"difference":"only-second","a":null,"b":{"extentAddress":12,"poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":true}}
-{"kind":"summary","file":"none","otherFile":"y","summary":true,"fields":0,"same":0,"onlyFirst":0,"onlySecond":4,"moved":0,"flags":0}
+{"kind":"summary","file":"none","otherFile":"y","summary":true,"fields":0,"same":0,"onlyFirst":0,"onlySecond":4,"moved":0,"flags":0,"changed":[]}
 "first":1,"count":2,"difference":"moved"
 "first":3,"count":2,"difference":"flags"
 "first":5,"count":1,"difference":"only-first"
@@ -99,7 +101,7 @@ const Case cases[] = {
     {"find writes matches as JSON", "epinspect find pools gone --json --pool 1 --extent 5-281474976710660", 1, R"({"kind":"match","file":"pools","first":0,"count":1,"entryOffset":24576,"extentAddress":281474976710660,"poolNumber":1,"mapped":true,"vpushed":false,"vpulled":false,"synced":false}
 {"kind":"match","file":"pools","first":1,"count":1,"entryOffset":24584,"extentAddress":281474976710661,"poolNumber":1,"mapped":true,"vpushed":false,"vpulled":false,"synced":false,"addressBits":48}
 {"kind":"error","file":"gone",…}
-{"kind":"summary","file":null,"summary":true,"files":1,"entries":7,"matches":2,"matchedEntries":2}
+{"kind":"summary","file":null,"summary":true,"files":1,"entries":7,"matches":2,"matchedEntries":2,"changed":[]}
 )", "epinspect: gone: …\n"},
     {"check is silent on a sound store", "epinspect check --root store", 0, "10 files, 4352 entries, 0 findings\n", ""},
     {"check finds every fault once", "epsample --broken broken; epinspect check --root broken --json >all; status=$?;"
@@ -122,7 +124,7 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
 "rule":"version","stored":1,"found":33752069,"message":"EP_JNL: version: 1, most files have 33752069"}
 "rule":"extent-size","stored":131072,"found":65536,"lid":13,"message":"EP_TBL: extent-size: 131072 stored, LUN 13 has 65536"}
 "rule":"shared-extents","stored":162,"found":"shared-extents_00000","first":3,"count":1,"otherFile":"shared-extents_00000","otherFirst":2,"message":"shared-extents_00000: shared-extents: entry 3: pool 16, extent 162, used by entry 2 of this map too"}
-{"kind":"summary","file":null,"summary":true,"files":23,"entries":191,"findings":18,"notCompared":["missing-data-file, beyond-data-file: entries with bits 48 to 51 set: address-bits_00000"]}
+{"kind":"summary","file":null,"summary":true,"files":23,"entries":191,"findings":18,"notCompared":["missing-data-file, beyond-data-file: entries with bits 48 to 51 set: address-bits_00000"],"changed":[]}
 )", ""},
     {"check compares maps that are named with their LUNs and tables", "epsample --broken broken; "
      "epinspect check --root broken broken/volume2/*/LUN/*lun-size* broken/volume3/@iSCSI/LUN/*", 3,

@@ -43,7 +43,7 @@ const Case cases[] = {
      R"({"kind":"run","file":"seven","first":6,"count":1,"entryOffset":24624,"extentAddress":9,"poolNumber":0,)"
      R"("mapped":false,"vpushed":true,"vpulled":false,"synced":false})" "\n"
      R"({"kind":"summary","file":"seven","summary":true,"entries":7,"mapped":3,"unmapped":2,"vpushed":3,"vpulled":1,)"
-     R"("synced":1,"holes":2,"runs":5})" "\n", ""},
+     R"("synced":1,"holes":2,"runs":5,"changed":[]})" "\n", ""},
     {"draws a chart", "epinspect map seven --chart", 0, "0 |###....|\nOne cell: 1 entry\n"
      "Mapped: . none  - <1/3  + <2/3  * most  # all\n"
      "7 entries in 5 runs: 3 mapped, 2 unmapped, 2 holes; 3 vpushed, 1 vpulled, 1\nsynced\n", ""},
@@ -76,12 +76,13 @@ const Case cases[] = {
     {"refuses what is no map", "epinspect map data; epinspect entry data 0", 1, "",
      says({"data" + wrongType, "data: entry 0" + wrongType})},
     {"says where a map became unreadable", meanwhile("epinspect map many", "rm many"), 1,
-     "4095: unmapped, pool 2615, extent 2029926973911601\n", says({"many: entry 4096" + missing})},
+     "4095: unmapped, pool 2615, extent 2029926973911601\n", says({"many: entry 4096" + missing, "many: has changed while it was read"})},
     {"says where entries became unreadable", meanwhile("epinspect entry many 1-9999", "rm many"), 1,
      "4096: pool number: 2615 ,…\n", says({"many: entry 4097" + missing})},
     {"says when a map became shorter", meanwhile("epinspect map many --json", "truncate -s 57344 many"), 1,
      "{\"kind\":\"error\",\"file\":\"many\",\"error\":\"EP_ERR_READ_FAILED\",\"code\":18990039,…",
-     says({"many: entry 4096: the file has become shorter while it was read (EP_ERR_READ_FAILED, 18990039)"})},
+     says({"many: entry 4096: the file has become shorter while it was read (EP_ERR_READ_FAILED, 18990039)",
+     "many: has changed while it was read"})},
 };
 // clang-format on
 

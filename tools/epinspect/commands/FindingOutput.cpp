@@ -178,6 +178,7 @@ void FindingOutput::printSummary(const Report& report) const {
             .number("entries", report.entries())
             .number("findings", report.findings())
             .texts("notCompared", report.gaps())
+            .texts("changed", session_.changedFiles())
             .end();
         return;
     }

@@ -8,6 +8,7 @@
 #include "check/DataRules.h"
 #include "check/LunRules.h"
 #include "map/MapWalk.h"
+#include "store/ChangeWatch.h"
 #include "store/FileSize.h"
 
 namespace inspection {
@@ -29,6 +30,7 @@ void StoreCheck::checkFile(const StoreFile& file) {
     checked_.insert(context_.root.targetPath(file.path));
     if (file.missing) return checkMissing(file);
     const FileKind* kind = file.kind != nullptr ? file.kind : &headKind;
+    const ChangeWatch watch(context_, file.path, file.hostPath);
     auto content = kind->make(file.hostPath);
     if (!context_.succeeded(kind->parse(*content), {file.path, ""})) return;
     const FileKind* byType = kindByType(content->head0Type);
@@ -41,6 +43,7 @@ void StoreCheck::checkFile(const StoreFile& file) {
     commonValues_.add(file, *content);
     checkDataStart(file, *content, report_);
     checkContent(file, *kind, *content, checkKind(file, *content, report_));
+    watch.noticeChange();
 }
 
 void StoreCheck::checkMissing(const StoreFile& file) {

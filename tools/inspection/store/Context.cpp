@@ -2,6 +2,7 @@
 
 #include <etc/ISCSIEPDiagnostics.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <utility>
@@ -33,6 +34,12 @@ bool Context::succeeded(int error, const Subject& subject) {
 
 void Context::fail(const Subject& subject, std::string_view what, int error) {
     failed({subject, error, 0, std::string(what)});
+}
+
+void Context::changed(const std::string& name) {
+    if (std::find(changedFiles_.begin(), changedFiles_.end(), name) != changedFiles_.end()) return;
+    changedFiles_.push_back(name);
+    remark(name, "has changed while it was read");
 }
 
 std::optional<std::string> Context::openablePath(const std::string& name) {
