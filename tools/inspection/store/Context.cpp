@@ -36,8 +36,12 @@ void Context::fail(const Subject& subject, std::string_view what, int error) {
     failed({subject, error, 0, std::string(what)});
 }
 
+bool Context::hasChanged(const std::string& name) const {
+    return std::find(changedFiles_.begin(), changedFiles_.end(), name) != changedFiles_.end();
+}
+
 void Context::changed(const std::string& name) {
-    if (std::find(changedFiles_.begin(), changedFiles_.end(), name) != changedFiles_.end()) return;
+    if (hasChanged(name)) return;
     changedFiles_.push_back(name);
     remark(name, "has changed while it was read");
 }

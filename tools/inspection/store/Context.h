@@ -56,6 +56,9 @@ public:
     /// The file that the user called `name` has changed while it was read. Remarks on it, once a file.
     virtual void changed(const std::string& name);
 
+    /// Whether that was said of it.
+    bool hasChanged(const std::string& name) const;
+
     /// These files, in the order in which that was noticed.
     const std::vector<std::string>& changedFiles() const { return changedFiles_; }
 

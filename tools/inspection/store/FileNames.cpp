@@ -41,7 +41,9 @@ bool isDataFileName(std::string_view path) {
 
 std::optional<std::uint64_t> dataFileNumberIn(std::string_view path) {
     if (!isDataFileName(path)) return std::nullopt;
-    return numberIn<std::uint64_t>(lastName(path).substr(std::string_view(tool::EP_DAT_FILE_PREFIX).size()));
+    const auto digits = lastName(path).substr(std::string_view(tool::EP_DAT_FILE_PREFIX).size());
+    const auto number = numberIn<std::uint64_t>(digits);
+    return number && dataFileName(*number) == lastName(path) ? number : std::nullopt;
 }
 
 std::string dataFileName(std::uint64_t number) {
