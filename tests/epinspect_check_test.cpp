@@ -30,7 +30,7 @@ protected:
         write("b", mapOf({m, m + 9, m + 7, m + synced + 3, m + synced + 4, 0, 0, 6, 0, 0}, 32768));
         write("none", mapOf({}));
         write("pools", mapOf({m + pool1 + 4, m + pool1 + 5, 0, m + 5, m + 16 * pool1, 0, 5}));
-        write("x", mapOf({m + 10, m + 11, m + 12, m + 13, 0, m + 11, 12}));
+        write("x", mapOf({m + 10, m + 11, m + 12, m + 13, 0, m + 11, pool1 + 12}));
         write("one", mapOf({0}));
         write("late", EPFileBuilder::data().set(head0::dataStartOffset, 24577));
         write("y", mapOf({m + synced + 12, m + 13, m + 14, m + 16 * pool1 + 10}));
@@ -134,10 +134,11 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "/volume3/@iSCSI/EP/EP_TBL: LUN 13: extent-size: 131072 stored, the LUN has 65536\n2 files, 32 entries, 2 findings: 1 lun-size, 1 extent-size\n", ""},
     {"check finds extents that are shared", "epinspect check late y x ./x other/x large", 3,
      "late: data-start: 0x6001, past the end of the file, which has 24576 bytes\n"
-     "x: unmapped-bits: entry 6: unmapped, but holds 0xc\n"
+     "x: unmapped-bits: entry 6: unmapped, but holds 0x100000000000c\n"
+     "x: address-bits: entry 6: 0x100000000000c, of which bits 48 to 51 are 0x1: they count in extent address and pool number\n"
      "y: shared-extents: entries 0-1: pool 0, extents 12-13, used by entries 2-3 of x too\n"
      "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
-     "5 files, 20012 entries, 4 findings: 1 data-start, 1 unmapped-bits, 2 shared-extents\nNot compared: …the extent size is not known, give --extent-size: …shared-extents: maps in different folders whose paths name no volume\n", ""},
+     "5 files, 20012 entries, 5 findings: 1 data-start, 1 unmapped-bits, 1 address-bits, 2 shared-extents\nNot compared: …the extent size is not known, give --extent-size: …shared-extents: maps in different folders whose paths name no volume\n", ""},
     {"check looks into data files", "epinspect check --root . --extent-size 1M", 3,
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, past the end of EP_DAT_00000, which holds 4194303 extents\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 5: extent 8388608, but there is no EP_DAT_00002\n"
@@ -145,7 +146,7 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 7: extent 8796093022208, but there is no data file\n"
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, past the end of EP_DAT_00001, which holds 2 extents\n"
      "3 files, 8 entries, 5 findings: 3 missing-data-file, 2 beyond-data-file\nNot compared: lun-size, extent-size, missing-map, missing-file: no LUN is known, ids 0 to 255 were tried\n", ""},
-    {"check writes findings as JSON", "epinspect check x y --json | sed -n 2p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","entries":1,"runs":1,"first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
+    {"check writes findings as JSON", "epinspect check x y --json | sed -n 3p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","entries":1,"runs":1,"first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
 )", ""},
     {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,; s/lun1/new/' var/db/iscsi/luns.json;"
      "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; truncate -s 99 volume1/*/EP/EP_DAT_00001; mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,
@@ -163,7 +164,7 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "Not compared: lun-size, extent-size: no LUN with an id from 0 to 255 is known for this map: x and 1 more\n"
      "Not compared: missing-data-file, beyond-data-file: the data files of the volume cannot be listed: volume1/@iSCSI/LUN/m\n"
      "Not compared: missing-data-file, beyond-data-file: the path names no volume: x\n"
-     "Not compared: serial-number: not the name of a data file of the target, which ends in a number of five digits or more: EP_DAT_7x\nNot compared: version: no value that most files have\n"
+     "Not compared: serial-number: not a name that the target gives to a data file: EP_DAT_7x\nNot compared: version: no value that most files have\n"
      "Not compared: what else concerns a map file: the type is another: volume1/@iSCSI/LUN/t\n",
      "epinspect: /volume1/@iSCSI/EP/: cannot be opened: Not a directory (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"diff and find say that a map became shorter",

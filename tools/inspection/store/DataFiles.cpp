@@ -34,8 +34,9 @@ bool DataFiles::list() {
     const std::string folder = first.substr(0, first.rfind('/') + 1);
     std::set<std::uint64_t> numbers;
     const auto error = listFolder(context_, folder, [&numbers](const std::filesystem::directory_entry& entry) {
-        const auto number = dataFileNumberIn(entry.path().filename().string());
-        if (number) numbers.insert(*number);
+        const std::string name = entry.path().filename().string();
+        const auto number = dataFileNumberIn(name);
+        if (number && name == dataFileName(*number)) numbers.insert(*number);
     });
     if (error) {
         listError_ = Failure{{folder, ""}, tool::EP_ERR_OPEN_FAILED, error.value(), {}};

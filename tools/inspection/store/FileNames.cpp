@@ -41,15 +41,19 @@ bool isDataFileName(std::string_view path) {
 
 std::optional<std::uint64_t> dataFileNumberIn(std::string_view path) {
     if (!isDataFileName(path)) return std::nullopt;
-    const auto digits = lastName(path).substr(std::string_view(tool::EP_DAT_FILE_PREFIX).size());
-    const auto number = numberIn<std::uint64_t>(digits);
-    return number && dataFileName(*number) == lastName(path) ? number : std::nullopt;
+    return numberIn<std::uint64_t>(lastName(path).substr(std::string_view(tool::EP_DAT_FILE_PREFIX).size()));
 }
 
 std::string dataFileName(std::uint64_t number) {
     std::string path;
     tool::ISCSIEPFile("/volume1").getDATFilePath(1, number * tool::EP_DAT_FILE_SPAN, path);
     return std::string(lastName(path));
+}
+
+bool isMisnamed(std::string_view path) {
+    if (!isDataFileName(path)) return false;
+    const auto number = dataFileNumberIn(path);
+    return !number || lastName(path) != dataFileName(*number);
 }
 
 std::optional<MapName> mapNameIn(std::string_view fileName) {
