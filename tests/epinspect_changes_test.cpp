@@ -90,4 +90,13 @@ TEST_F(Changes, AreNoticedByEveryCommandThatWalks) {
     }
 }
 
+TEST_F(Changes, OfAMapThatWasWalkedBeforeCastDoubtOnWhatItShares) {
+    write("first", EPFileBuilder::map().entry(0, 0x8000000000000005));
+    write("second", EPFileBuilder::map().entry(0, 0x8000000000000005).entry(8191, 0));
+    run({"check", "first", "second"}, [] { fs::resize_file("first", 24576); });
+    EXPECT_PRED2(matches, content(".err"), "epinspect: first: has changed while it was read\n");
+    EXPECT_PRED2(matches, content(".out"),
+                 "…second: shared-extents: entry 0: …: the file has changed while it was read)\n…");
+}
+
 }  // namespace

@@ -32,6 +32,8 @@ protected:
         write("pools", mapOf({m + pool1 + 4, m + pool1 + 5, 0, m + 5, m + 16 * pool1, 0, 5}));
         write("x", mapOf({m + 10, m + 11, m + 12, m + 13, 0, m + 11, pool1 + 12}));
         write("one", mapOf({0}));
+        write("there", mapOf({m + 10, m + 11, m + 30}));
+        write("back", mapOf({m + 30, m + 10, m + 11}));
         write("late", EPFileBuilder::data().set(head0::dataStartOffset, 24577));
         write("y", mapOf({m + synced + 12, m + 13, m + 14, m + 16 * pool1 + 10}));
         write("other/x", mapOf({m + 10}));
@@ -139,6 +141,9 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "y: shared-extents: entries 0-1: pool 0, extents 12-13, used by entries 2-3 of x too\n"
      "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
      "5 files, 20012 entries, 5 findings: 1 data-start, 1 unmapped-bits, 1 address-bits, 2 shared-extents\nNot compared: …the extent size is not known, give --extent-size: …shared-extents: maps in different folders whose paths name no volume\n", ""},
+    {"check joins what two maps share", "epinspect check there back --json | sed -n '1s/.*\"entries/\"entries/p'; epinspect check there back --each | grep -c ' too$'", 0,
+     R"("entries":3,"runs":2,"first":0,"count":1,"otherFile":"there","otherFirst":2,"message":"back: shared-extents: )"
+     "3 entries in 2 runs, first entry 0: pool 0, extent 30, used by entry 2 of there too\"}\n2\n", ""},
     {"check looks into data files", "epinspect check --root . --extent-size 1M", 3,
      "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, past the end of EP_DAT_00000, which holds 4194303 extents\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 5: extent 8388608, but there is no EP_DAT_00002\n"

@@ -25,7 +25,7 @@ const std::string lun2 = volume2 + "LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522
 // clang-format off
 const Case cases[] = {
     {"a data file is one finding for each map, or all its runs", "rm own/volume1/*/EP/*1; cd own; epinspect --root . check; epinspect --root . check --each | sed 's/^.*lun1_00000//'", 0,
-     lun1 + ": LUN 1: missing-data-file: 768 entries in 3 runs, first 512-767: extent 4194816 and others, but there is no EP_DAT_00001\n"
+     lun1 + ": LUN 1: missing-data-file: 768 entries in 3 runs, first entries 512-767: extent 4194816 and others, but there is no EP_DAT_00001\n"
      "9 files, 4352 entries, 1 finding: 1 missing-data-file\n"
      ": LUN 1: missing-data-file: entries 512-767: extent 4194816 and others, but there is no EP_DAT_00001\n"
      ": LUN 1: missing-data-file: entries 1536-1791: extent 4195840 and others, but there is no EP_DAT_00001\n"
@@ -40,6 +40,9 @@ const Case cases[] = {
      "volume2/@iSCSI/EP/EP_TBL: kind: type 4, a map file, but named like a table file\n"
      "/volume2/@iSCSI/EP/EP_TBL: LUN 2: missing-file: no file, but this LUN needs it\n…",
      "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000" + wrongType + "\n"},
+    {"a table that a journal replaces", "cp own/var/db/iscsi/EP_JNL own/volume1/@iSCSI/EP/EP_TBL; epinspect --root own check", 3,
+     "/volume1/@iSCSI/EP/EP_TBL: kind: type 5, which the journal /var/db/iscsi/EP_JNL has too, but named like a table file\n"
+     "10 files, 4352 entries, 1 finding: 1 kind\nNot compared: extent-size: no table file that can be compared: /volume1/@iSCSI/EP/EP_TBL\n", ""},
     {"one of two kinds with one type", "cd own; rm -r volume2; sed -i '/lid.: 2/,$d; s/},$/}]/' var/db/iscsi/luns.json; "
      "cp volume1/@iSCSI/EP/EP_FRI var/db/iscsi/EP_JNL; epinspect --root . check", 3,
      "/var/db/iscsi/EP_JNL: kind: type 2, which the free-index file /volume1/@iSCSI/EP/EP_FRI has too, but named like a journal\n"
@@ -50,7 +53,7 @@ const Case cases[] = {
      R"({"kind":"finding","file":"/volume1/@iSCSI/EP/EP_TBL","rule":"kind","stored":9,"found":1,"otherFile":"/volume2/@iSCSI/EP/EP_TBL",")"
      "\n{\"kind\":\"summary\",…\"rules\":{\"kind\":1},\"notCompared\":[\"extent-size: no table file that can be compared: /volume1/…", ""},
     {"a name of four digits", "cd own/volume2/@iSCSI/EP; mv EP_DAT_00000 EP_DAT_0000; epinspect --root ../../.. check", 3,
-     lun2 + ": LUN 2: missing-data-file: 128 entries in 2 runs, first 0-63: extent 16 and others, but there is no EP_DAT_00000\n"
+     lun2 + ": LUN 2: missing-data-file: 128 entries in 2 runs, first entries 0-63: extent 16 and others, but there is no EP_DAT_00000\n"
      "10 files, …\nNot compared: serial-number: not a name that the target gives to a data file: /volume2/@iSCSI/EP/EP_DAT_0000\n", ""},
     {"nothing, whatever extent size is given beside the LUNs' own", "epinspect --root own check --extent-size 1G", 0, "10 files, 4352 entries, 0 findings\n", ""},
 };
@@ -66,9 +69,12 @@ TEST_F(Losses, AreNamedWhateverHappensToAFile) {
         int status;
     };
     const Fault faults[] = {
-        {"missing", ":", 3},           {"unreadable", "cp --sparse=always $F.whole $F; chmod 0 $F", 1},
-        {"empty", "> $F", 1},          {"a folder", "mkdir $F", 1},
-        {"a dead link", "ln -s x $F", 3}, {"of a wrong type", "cp $O $F", 3},
+        {"missing", ":", 3},
+        {"unreadable", "cp --sparse=always $F.whole $F; chmod 0 $F", 1},
+        {"empty", "> $F", 1},
+        {"a folder", "mkdir $F", 1},
+        {"a dead link", "ln -s x $F", 3},
+        {"of a wrong type", "cp $O $F", 3},
     };
     const std::pair<std::string, std::string> files[] = {
         {journal, volume1 + "EP/EP_FRI"},
@@ -87,9 +93,10 @@ TEST_F(Losses, AreNamedWhateverHappensToAFile) {
                 std::cout << "not tried, no other user can run the program: " << file << ' ' << fault.name << '\n';
                 continue;
             }
-            const std::string command = "F=own" + file + " O=own" + other + "; mv $F $F.whole; " + fault.command +
-                                        "; mv $F.whole .whole; " + (asUser ? asUser_ : "") +
-                                        "epinspect --root own check 2>&1; status=$?; rm -rf $F; mv .whole $F; exit $status";
+            const std::string command =
+                "F=own" + file + " O=own" + other + "; mv $F $F.whole; " + fault.command + "; mv $F.whole .whole; " +
+                (asUser ? asUser_ : "") +
+                "epinspect --root own check 2>&1; status=$?; rm -rf $F; mv .whole $F; exit $status";
             const bool isLostData = fault.command == ":" && file.find("EP_DAT") != std::string::npos;
             const std::string named = isLostData ? "there is no " + file.substr(file.rfind('/') + 1) : file + ": ";
             SCOPED_TRACE(file + " " + fault.name);

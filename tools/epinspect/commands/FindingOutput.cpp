@@ -49,11 +49,11 @@ std::string extentsText(std::uint64_t first, std::uint64_t count) {
     return rangeText("extent ", "extents ", first, count);
 }
 
-/// "entries 3-5", or "7 entries in 2 runs, first 3-5".
+/// "entries 3-5", or "7 entries in 2 runs, first entries 3-5".
 std::string whichText(const Finding::Entries& entries) {
     if (entries.runs == 1) return entriesText(entries.first, entries.count);
-    return std::to_string(entries.entries) + " entries in " + std::to_string(entries.runs) +
-           rangeText(" runs, first ", " runs, first ", entries.first, entries.count);
+    return std::to_string(entries.entries) + " entries in " + std::to_string(entries.runs) + " runs, first " +
+           entriesText(entries.first, entries.count);
 }
 
 /// The extent of the first of several entries, which need not be a run.
