@@ -46,13 +46,7 @@ const Case cases[] = {
      R"({"kind":"run",…"first":5,"count":1,"entryOffset":24616,…"mapped":false,"vpushed":false,…"synced":true})" "\n"
      R"({"kind":"run",…"first":6,"count":1,"entryOffset":24624,…"mapped":false,"vpushed":true,…"synced":false})" "\n"
      R"({"kind":"summary","file":"seven","summary":true,"entries":7,"mapped":3,"unmapped":2,"vpushed":3,"vpulled":1,)"
-     R"("synced":1,"holes":2,"runs":5})" "\n", ""},
-    {"joins neighbours that are alike in everything, across blocks too", "epinspect map unlike", 0,
-     "0-1: mapped, pool 0, extents 0-1\n2: mapped, pool 16, extent 2\n3: unmapped, pool 16, extent 3\n"
-     "4: unmapped vpushed, pool 16, extent 4\n5: unmapped vpushed vpulled, pool 16, extent 5\n"
-     "6: unmapped vpushed vpulled synced, pool 16, extent 6\n7: hole\n8: unmapped, pool 16, extent 0\n"
-     "9: unmapped, pool 16, extent 0\n10: unmapped synced, pool 0, extent 0\n11-12: hole\n"
-     "13-8999: mapped, pool 0, extents 13-8999\n9000 entries in 12 runs: …", ""},
+     R"("synced":1,"holes":2,"runs":5,"changed":[]})" "\n", ""},
     {"draws a chart", "epinspect map seven --chart", 0, "0 |###....|\nOne cell: 1 entry\n"
      "Mapped: . none  - <1/3  + <2/3  * most  # all\n"
      "7 entries in 5 runs: 3 mapped, 2 unmapped, 2 holes; 3 vpushed, 1 vpulled, 1\nsynced\n", ""},
@@ -86,12 +80,13 @@ const Case cases[] = {
     {"refuses what is no map", "epinspect map data; epinspect entry data 0", 1, "",
      says({"data" + wrongType, "data: entry 0" + wrongType})},
     {"says where a map became unreadable", meanwhile("epinspect map many", "rm many"), 1,
-     "4095: unmapped, pool 2615, extent 2029926973911601\n", says({"many: entry 4096" + missing})},
+     "4095: unmapped, pool 2615, extent 2029926973911601\n", says({"many: entry 4096" + missing, "many: has changed while it was read"})},
     {"says where entries became unreadable", meanwhile("epinspect entry many 1-9999", "rm many"), 1,
      "4096: pool number: 2615 ,…\n", says({"many: entry 4097" + missing})},
     {"says when a map became shorter", meanwhile("epinspect map many --json", "truncate -s 57344 many"), 1,
      "{\"kind\":\"error\",\"file\":\"many\",\"error\":\"EP_ERR_READ_FAILED\",\"code\":18990039,…",
-     says({"many: entry 4096: the file has become shorter while it was read (EP_ERR_READ_FAILED, 18990039)"})},
+     says({"many: entry 4096: the file has become shorter while it was read (EP_ERR_READ_FAILED, 18990039)",
+     "many: has changed while it was read"})},
 };
 // clang-format on
 

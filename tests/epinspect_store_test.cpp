@@ -113,7 +113,7 @@ const Case cases[] = {
      "epinspect: LUN 7: configuration cannot be loaded: The LUN list is missing or cannot be read (code 9002)\n"
      "epinspect: /volume91/@iSCSI/EP: cannot be opened: a link leads out of the folder of --root" + openFailed +
      "epinspect: " + maps + "pipe: cannot be opened: neither a regular file nor a block device (…)\n"
-     "epinspect: " + maps + "self: cannot be opened: Too many levels of symbolic links (…)\n…/: no EP files there (…"},
+     "epinspect: " + maps + "self: cannot be opened: Too many levels of symbolic links (…)\n…LUN/folder: no EP files found (…"},
     {"locate finds bytes", "epinspect --root store locate 1 540000000 430000000 18446744073709551615", 1,
      "LUN 1 byte 540000000: entry 514, byte 1031936 of its extent\n514: mapped, pool 16, extent 4194818\n"
      "/volume1/@iSCSI/EP/EP_DAT_00001 position 540024576 (extent 514 of the file)\n" + assumed + "; extents counted "

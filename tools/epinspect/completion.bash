@@ -48,7 +48,7 @@ _epinspect() {
         help) options=$commands ;;
         list) options+=' --luns --json' ;;
         dump) options+=' --as --json' ;;
-        check) options+=' --luns --extent-size --json' ;;
+        check) options+=' --each --luns --extent-size --json' ;;
         collect) options+=' --luns' ;;
         entry | lun) options+=' --json' ;;
         diff) options+=' --headers --entries --json' ;;

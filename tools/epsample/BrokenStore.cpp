@@ -9,6 +9,8 @@
 //   total-count to lun-size   the map files of LUNs 1 to 11
 //   missing-map        LUN 12 of the LUN list
 //   extent-size        /volume3/@iSCSI/EP/EP_TBL, against LUN 13
+//   same-map           LUNs 14 and 15 of the LUN list, which differ in nothing but their ids
+//   missing-file       /volume4/@iSCSI/EP/EP_FRI, which these two need
 #include "BrokenStore.h"
 
 #include <cstdint>
@@ -81,11 +83,14 @@ void writeVolume1(const std::string& root) {
     soundData(7).write(folder + dataFileName(1));
 }
 
-/// The files of a volume that has one data file and a table for extents of `tableExtentSize` bytes.
+void writeFreeIndex(const std::string& root, unsigned int volume) {
+    EPFileBuilder::freeIndex().write(root + epFolder(volume) + "EP_FRI");
+}
+
+/// The files of a volume but for the free-index file: a data file, and a table for extents of `tableExtentSize` bytes.
 void writeVolume(const std::string& root, unsigned int number, std::uint32_t tableExtentSize) {
     const std::string folder = root + epFolder(number);
     tableFile(tableExtentSize, 1).write(folder + "EP_TBL");
-    EPFileBuilder::freeIndex().write(folder + "EP_FRI");
     soundData(0).write(folder + dataFileName(0));
 }
 
@@ -96,6 +101,9 @@ void writeBrokenStore(const std::string& root) {
     writeVolume1(root);
     writeVolume(root, 2, extentSize);
     writeVolume(root, 3, 2 * extentSize);
+    writeVolume(root, 4, extentSize);
+    writeFreeIndex(root, 2);
+    writeFreeIndex(root, 3);
     std::vector<Lun> luns;
     const auto addLun = [&](const std::string& volume, const char* name) -> Lun& {
         return luns.emplace_back(soundLun(static_cast<unsigned int>(luns.size() + 1), volume, name));
@@ -112,6 +120,10 @@ void writeBrokenStore(const std::string& root) {
     addLun("/volume2", "missing-map");
     const Lun& otherExtents = addLun("/volume3", "extent-size");
     soundMap(otherExtents.lid).write(root + mapFilePath(otherExtents));
+    Lun twin = addLun("/volume4", "same-map");
+    soundMap(twin.lid).write(root + mapFilePath(twin));
+    ++twin.lid;
+    luns.push_back(twin);
     writeLunList(root, luns);
 }
 

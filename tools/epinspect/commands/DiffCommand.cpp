@@ -41,6 +41,7 @@ public:
     }
 
     void trying(bool begins) override { session_.trying(begins); }
+    void changed(const std::string& name) override { session_.changed(folder_ + name); }
 
 private:
     Session& session_;
@@ -89,10 +90,12 @@ private:
                               {b.context, b.name, openMap(b.context, b.name)}};
         if (!maps[0].map.file || !maps[1].map.file) return false;
         totals_.entries.entries += std::max(maps[0].map.entries, maps[1].map.entries);
-        return compareEntries(maps[0], maps[1], [&](const DiffRun& run) {
+        const bool complete = compareEntries(maps[0], maps[1], [&](const DiffRun& run) {
             totals_.entries.add(run);
             output.print(run);
         });
+        for (const ComparedMap& compared : maps) compared.map.watch->noticeChange();
+        return complete;
     }
 
     const DiffScope& scope_;

@@ -133,6 +133,7 @@ void printSummary(const Session& session, const std::string& file, const std::st
             .number("onlySecond", totals.entries.onlySecond)
             .number("moved", totals.entries.moved)
             .number("flags", totals.entries.flags)
+            .texts("changed", session.changedFiles())
             .end();
         return;
     }

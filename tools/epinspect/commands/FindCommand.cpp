@@ -78,6 +78,7 @@ void searchMap(const FindOptions& options, Session& session, const StoreFile& fi
     const auto progress = [&](std::uint64_t done) { session.progress("entries", done, map.entries); };
     const auto failure = walkRuns(file.path, *map.file, {0, map.entries - 1}, progress, each);
     if (failure) session.failed(*failure);
+    map.watch->noticeChange();
 }
 
 void printSummary(const FindSummary& summary) {
@@ -86,7 +87,7 @@ void printSummary(const FindSummary& summary) {
           "\n");
 }
 
-void printSummaryAsJson(const FindSummary& summary) {
+void printSummaryAsJson(const FindSummary& summary, const std::vector<std::string>& changed) {
     Json json("");
     json.begin("summary")
         .boolean("summary", true)
@@ -94,6 +95,7 @@ void printSummaryAsJson(const FindSummary& summary) {
         .number("entries", summary.entries)
         .number("matches", summary.matches)
         .number("matchedEntries", summary.matchedEntries)
+        .texts("changed", changed)
         .end();
 }
 
@@ -106,7 +108,7 @@ void run(const FindOptions& options, Session& session) {
         searchMap(options, session, file, summary);
     });
     if (session.json) {
-        printSummaryAsJson(summary);
+        printSummaryAsJson(summary, session.changedFiles());
     } else {
         printSummary(summary);
     }

@@ -49,15 +49,29 @@ std::string extentsText(std::uint64_t first, std::uint64_t count) {
     return rangeText("extent ", "extents ", first, count);
 }
 
-/// The extent of the first of several entries, which need not be a run.
-std::string firstExtentText(const Finding::Entries& entries) {
-    return extentsText(entries.entry.extentAddress, 1) + (entries.count == 1 ? "" : " in the first");
+/// "entries 3-5", or "7 entries in 2 runs, first entries 3-5".
+std::string whichText(const Finding::Entries& entries) {
+    if (entries.runs == 1) return entriesText(entries.first, entries.count);
+    return std::to_string(entries.entries) + " entries in " + std::to_string(entries.runs) + " runs, first " +
+           entriesText(entries.first, entries.count);
 }
 
-std::string kindText(const KindDoubt& doubt) {
-    return "type " + std::to_string(doubt.type) +
-           (doubt.byType == nullptr ? "" : std::string(", a ") + doubt.byType->title) + ", but named like a " +
-           doubt.byName->title;
+/// The extent of the first of several entries, which need not be a run.
+std::string firstExtentText(const Finding::Entries& entries) {
+    return extentsText(entries.entry.extentAddress, 1) + (entries.entries == 1 ? "" : " and others");
+}
+
+std::string lunText(std::uint32_t lid) { return "LUN " + std::to_string(lid); }
+
+std::string kindText(const Finding& finding) {
+    const KindDoubt& doubt = *finding.kinds;
+    const std::string type = "type " + std::to_string(doubt.type);
+    const std::string named = std::string(", but named like a ") + doubt.byName->title;
+    if (!finding.partner)
+        return type + (doubt.byType == nullptr ? "" : std::string(", a ") + doubt.byType->title) + named;
+    const std::string other = finding.partner->file;
+    if (doubt.byType != nullptr) return type + ", which the " + doubt.byType->title + " " + other + " has too" + named;
+    return type + ", the " + doubt.byName->title + " " + other + " has " + shown(finding.found);
 }
 
 std::string dataStartText(const DataStartDoubt& doubt) {
@@ -71,13 +85,19 @@ std::string partialEntryText(const Finding& finding) {
            std::to_string(entrySize) + " bytes are there";
 }
 
+/// "entries 4-5 of LUN 2, PATH,"; of one of several runs.
+std::string partnerText(const Finding& finding) {
+    const Finding::Entries& entries = *finding.entries;
+    const std::string which = entriesText(finding.partner->first, entries.count) + " of ";
+    if (finding.partner->file == finding.file) return which + "this map";
+    return which +
+           (finding.otherLid ? lunText(*finding.otherLid) + ", " + finding.partner->file + "," : finding.partner->file);
+}
+
 std::string sharedText(const Finding& finding) {
     const Finding::Entries& entries = *finding.entries;
-    const Finding::Partner& partner = *finding.partner;
     return "pool " + std::to_string(entries.entry.poolNumber) + ", " +
-           extentsText(entries.entry.extentAddress, entries.count) + ", used by " +
-           entriesText(partner.first, entries.count) + " of " +
-           (partner.file == finding.file ? "this map" : partner.file) + " too";
+           extentsText(entries.entry.extentAddress, entries.count) + ", used by " + partnerText(finding) + " too";
 }
 
 /// What a finding says of its entries.
@@ -86,12 +106,13 @@ std::string entriesMessage(const Finding& finding) {
     const std::string stored = shown(finding.stored);
     switch (finding.rule) {
         case Rule::unmappedBits:
-            return "unmapped, but " + std::string(entries.count == 1 ? "" : "the first ") + "holds " + stored;
+            return entries.entries == 1 ? "unmapped, but holds " + stored
+                                        : "unmapped, but not zero; the first holds " + stored;
         case Rule::addressBits:
-            return stored + (entries.count == 1 ? "" : " in the first") + ", of which bits 48 to 51 are " +
+            return (entries.entries == 1 ? "" : "the first holds ") + stored + ", of which bits 48 to 51 are " +
                    shown(finding.found) + ": they count in extent address and pool number";
         case Rule::missingDataFile:
-            return firstExtentText(entries) + ", for which there is " + shown(finding.found);
+            return firstExtentText(entries) + ", but there is " + shown(finding.found);
         case Rule::beyondDataFile:
             return firstExtentText(entries) + ", past the end of " + dataFileName(finding.dataFile) + ", which holds " +
                    counted(finding.found.bits, "extent", "extents");
@@ -100,17 +121,21 @@ std::string entriesMessage(const Finding& finding) {
     }
 }
 
+std::string missingFileText(const Finding& finding) {
+    if (!finding.lid) return shown(finding.found);
+    const std::string others = counted(finding.moreLuns, "other", "others");
+    return shown(finding.found) + ", but this LUN " +
+           (finding.moreLuns == 0 ? "needs it" : "and " + others + " need it");
+}
+
 /// What is stored, what was found.
 std::string messageOf(const Finding& finding) {
-    if (finding.entries) {
-        return entriesText(finding.entries->first, finding.entries->count) + ": " + entriesMessage(finding);
-    }
+    if (finding.entries) return whichText(*finding.entries) + ": " + entriesMessage(finding);
     const std::string stored = shown(finding.stored);
     const std::string found = shown(finding.found);
-    const std::string lun = finding.lid ? "LUN " + std::to_string(*finding.lid) : "";
     switch (finding.rule) {
         case Rule::kind:
-            return kindText(*finding.kinds);
+            return kindText(finding);
         case Rule::dataStart:
             return stored + dataStartText(*finding.dataStart);
         case Rule::magic:
@@ -130,16 +155,19 @@ std::string messageOf(const Finding& finding) {
             return stored + " stored, the name says " + found;
         case Rule::lunSize:
             return std::to_string(finding.totalCount) + " entries of " + std::to_string(finding.extentSize) +
-                   " bytes are " + stored + " bytes, " + lun + " has " + found;
+                   " bytes are " + stored + " bytes, the LUN has " + found;
         case Rule::extentSize:
-            return stored + " stored, " + lun + " has " + found;
+            return stored + " stored, the LUN has " + found;
+        case Rule::sameMap:
+            return found + " has this map file too";
         default:
-            return lun + " is configured, but has no map file";
+            return missingFileText(finding);
     }
 }
 
 std::string lineOf(const Finding& finding) {
-    return finding.file + ": " + nameOf(finding.rule) + ": " + messageOf(finding);
+    return finding.file + ": " + (finding.lid ? lunText(*finding.lid) + ": " : "") + nameOf(finding.rule) + ": " +
+           messageOf(finding) + (finding.passing ? " (possibly passing: the file has changed while it was read)" : "");
 }
 
 }  // namespace
@@ -161,29 +189,41 @@ void FindingOutput::printAsJson(const Finding& finding) {
     json_->begin("finding").text("rule", nameOf(finding.rule));
     write(*json_, "stored", finding.stored);
     write(*json_, "found", finding.found);
-    if (finding.entries) json_->number("first", finding.entries->first).number("count", finding.entries->count);
-    if (finding.partner) {
-        json_->path("otherFile", finding.partner->file).number("otherFirst", finding.partner->first);
-    }
     if (finding.lid) json_->number("lid", *finding.lid);
+    if (finding.otherLid) json_->number("otherLid", *finding.otherLid);
+    if (const auto& entries = finding.entries) {
+        json_->number("entries", entries->entries).number("runs", entries->runs);
+        json_->number("first", entries->first).number("count", entries->count);
+    }
+    if (finding.partner) json_->path("otherFile", finding.partner->file);
+    if (finding.partner && finding.entries) json_->number("otherFirst", finding.partner->first);
+    if (finding.passing) json_->boolean("passing", true);
     json_->text("message", lineOf(finding)).end();
 }
 
 void FindingOutput::printSummary(const Report& report) const {
-    if (session_.json) {
-        Json json("");
-        json.begin("summary")
-            .boolean("summary", true)
-            .number("files", report.files())
-            .number("entries", report.entries())
-            .number("findings", report.findings())
-            .texts("notCompared", report.gaps())
-            .end();
-        return;
+    std::uint64_t findings = 0;
+    std::string rules;
+    for (const auto& [rule, count] : report.findings()) {
+        rules += (findings == 0 ? ": " : ", ") + std::to_string(count) + " " + nameOf(rule);
+        findings += count;
     }
+    if (session_.json) return printSummaryAsJson(report, findings);
     epinspect::print(counted(report.files(), "file", "files") + ", " + counted(report.entries(), "entry", "entries") +
-                     ", " + counted(report.findings(), "finding", "findings") + "\n");
+                     ", " + counted(findings, "finding", "findings") + rules + "\n");
     for (const std::string& text : report.gaps()) epinspect::print("Not compared: " + forReader(text) + "\n");
+}
+
+void FindingOutput::printSummaryAsJson(const Report& report, std::uint64_t findings) const {
+    Json json("");
+    json.begin("summary")
+        .boolean("summary", true)
+        .number("files", report.files())
+        .number("entries", report.entries())
+        .number("findings", findings)
+        .beginObject("rules");
+    for (const auto& [rule, count] : report.findings()) json.number(std::string_view(nameOf(rule)), count);
+    json.endObject().texts("notCompared", report.gaps()).texts("changed", session_.changedFiles()).end();
 }
 
 }  // namespace epinspect

@@ -22,6 +22,7 @@ public:
 
 private:
     void printAsJson(const Finding& finding);
+    void printSummaryAsJson(const Report& report, std::uint64_t findings) const;
 
     Session& session_;
     std::optional<Json> json_;  ///< for findings in `jsonFile_`

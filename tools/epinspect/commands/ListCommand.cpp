@@ -88,7 +88,7 @@ void run(Session& session, const std::optional<Range>& lids) {
             printFile(file, entries);
         }
     });
-    if (!any) session.fail({"/", ""}, "no EP files there", tool::EP_ERR_NO_PATH);
+    if (!any) failEmptyStore(session);
 }
 
 }  // namespace

@@ -31,7 +31,7 @@ std::string textOf(const MapSummary& summary) {
            std::to_string(summary.vpulled) + " vpulled, " + std::to_string(summary.synced) + " synced";
 }
 
-void printSummary(Json& json, const MapSummary& summary) {
+void printSummary(Json& json, const MapSummary& summary, const std::vector<std::string>& changed) {
     json.begin("summary")
         .boolean("summary", true)
         .number("entries", summary.entries)
@@ -42,6 +42,7 @@ void printSummary(Json& json, const MapSummary& summary) {
         .number("synced", summary.synced)
         .number("holes", summary.holes)
         .number("runs", summary.runs)
+        .texts("changed", changed)
         .end();
 }
 
@@ -76,9 +77,11 @@ void run(const MapOptions& options, Session& session) {
     const Range range = {options.first, options.first + count - 1};
     const auto progress = [&](std::uint64_t done) { session.progress("entries", done, count); };
     const auto failure = count > 0 ? walkRuns(options.file, file, range, progress, each) : std::nullopt;
-    if (failure) return session.failed(*failure);
+    if (failure) session.failed(*failure);
+    map.watch->noticeChange();
+    if (failure) return;
     if (session.json) {
-        printSummary(json, summary);
+        printSummary(json, summary, session.changedFiles());
     } else if (options.chart) {
         print(chart.draw(outputIsUnicode()) + wrapped(textOf(summary), outputWidth(), 0));
     } else {

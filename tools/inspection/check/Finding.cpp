@@ -40,6 +40,10 @@ const char* nameOf(Rule rule) {
             return "extent-size";
         case Rule::missingMap:
             return "missing-map";
+        case Rule::sameMap:
+            return "same-map";
+        case Rule::missingFile:
+            return "missing-file";
     }
     return "";
 }

@@ -28,7 +28,9 @@ enum class Rule {
     serialNumber,
     lunSize,
     extentSize,
-    missingMap
+    missingMap,
+    sameMap,
+    missingFile
 };
 
 /// "shared-extents".
@@ -49,32 +51,41 @@ struct Value {
 
 /// A difference between what a file says and what it or another one holds.
 struct Finding {
-    /// Entries of a map.
+    /// Entries of a map, in runs of neighbours.
     struct Entries {
-        std::uint64_t first;
+        /// One run of `number` entries. Which extents they have does not matter, `firstEntry` is the first of them.
+        Entries(std::uint64_t index, std::uint64_t number, const MapEntry& firstEntry)
+            : first(index), count(number), entry(firstEntry), entries(number) {}
+
+        std::uint64_t first;  ///< of the first run
         std::uint64_t count;
-        MapEntry entry;  ///< the first one; the others need not be a run
+        MapEntry entry;
+        std::uint64_t entries;  ///< in all runs
+        std::uint64_t runs = 1;
     };
 
-    /// The entries of a map with which others share their extents.
+    /// The other file that a finding is about.
     struct Partner {
         std::string file;
-        std::uint64_t first;
+        std::uint64_t first;  ///< of its entries that share extents with the first run
     };
 
     std::string file;
     Rule rule;
     Value stored;
     Value found;
-    std::optional<std::uint32_t> lid = {};  ///< where a LUN is concerned
-    std::optional<Entries> entries = {};    ///< where entries are concerned
-    std::optional<Partner> partner = {};    ///< of sharedExtents
-    std::optional<KindDoubt> kinds = {};    ///< of kind
+    std::optional<std::uint32_t> lid = {};       ///< where a LUN is concerned
+    std::optional<std::uint32_t> otherLid = {};  ///< where another one is too
+    std::optional<Entries> entries = {};         ///< where entries are concerned
+    std::optional<Partner> partner = {};         ///< of sharedExtents, and of kind where another file is like this one
+    std::optional<KindDoubt> kinds = {};         ///< of kind
     std::optional<DataStartDoubt> dataStart = {};
     std::optional<PartialEntry> partial = {};
     std::uint64_t totalCount = 0;  ///< of lunSize, with the next
     std::uint64_t extentSize = 0;
-    std::uint64_t dataFile = 0;  ///< of beyondDataFile: its number
+    std::uint64_t dataFile = 0;  ///< of beyondDataFile and missingDataFile: its number
+    std::uint64_t moreLuns = 0;  ///< of missingFile: how many need it beside `lid`
+    bool passing = false;        ///< possibly so: a file that it is about has changed while it was read
 };
 
 }  // namespace inspection

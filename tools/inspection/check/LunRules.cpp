@@ -12,11 +12,39 @@ Finding findingOf(const std::string& file, Rule rule, const Lun& lun, const Valu
     return finding;
 }
 
+std::string nameOf(const Lun& lun) { return "LUN " + std::to_string(lun.record.lid); }
+
+Value missing(const MissingFile& file) { return Value::text(file.isLink ? "a link that leads nowhere" : "no file"); }
+
 }  // namespace
 
-void tellMissingMap(const StoreFile& file, const Lun& lun, Report& report) {
-    report.add(findingOf(file.path, Rule::missingMap, lun, Value::text("LUN " + std::to_string(lun.record.lid)),
-                         Value::text("no file")));
+void checkMissingMap(const MissingFile& file, Report& report) {
+    for (const Lun* lun : file.luns) {
+        report.add(findingOf(file.path, Rule::missingMap, *lun, Value::text(nameOf(*lun)), missing(file)));
+    }
+}
+
+void checkMissingFile(const MissingFile& file, Report& report) {
+    Finding finding = {file.path, Rule::missingFile, Value::text("a link"), missing(file)};
+    if (!file.luns.empty()) {
+        finding.stored = Value::text(nameOf(*file.luns.front()));
+        finding.lid = file.luns.front()->record.lid;
+        finding.moreLuns = file.luns.size() - 1;
+    }
+    report.add(finding);
+}
+
+void checkMissingDataFile(const MissingFile& file, Report& report) {
+    report.add({file.path, Rule::missingDataFile, Value::text("a link"), missing(file)});
+}
+
+void checkSameMap(const std::string& map, const std::vector<const Lun*>& luns, Report& report) {
+    for (std::size_t i = 1; i < luns.size(); ++i) {
+        Finding finding =
+            findingOf(map, Rule::sameMap, *luns[i], Value::text(nameOf(*luns[i])), Value::text(nameOf(*luns.front())));
+        finding.otherLid = luns.front()->record.lid;
+        report.add(finding);
+    }
 }
 
 void checkLunSize(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFileMAP& content, const Lun& lun, Report& report) {

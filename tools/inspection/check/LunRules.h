@@ -4,6 +4,7 @@
 #include <ISCSIEPFileMAP.h>
 
 #include <string>
+#include <vector>
 
 #include "check/Report.h"
 #include "store/Luns.h"
@@ -11,8 +12,24 @@
 
 namespace inspection {
 
-/// `missing-map`: there is no file where the LUN's map file should be.
-void tellMissingMap(const StoreFile& file, const Lun& lun, Report& report);
+/// What is expected at a path and is not there: a link leads nowhere, or there is not even that.
+struct MissingFile {
+    std::string path;
+    bool isLink;
+    std::vector<const Lun*> luns;  ///< that should have it
+};
+
+/// `missing-map`: there is no file where the map file of these LUNs should be.
+void checkMissingMap(const MissingFile& file, Report& report);
+
+/// `missing-file`: there is no journal, table or free-index file for these LUNs, or what leads to one leads nowhere.
+void checkMissingFile(const MissingFile& file, Report& report);
+
+/// `missing-data-file`: a link leads nowhere.
+void checkMissingDataFile(const MissingFile& file, Report& report);
+
+/// `same-map`: two LUNs have one map file.
+void checkSameMap(const std::string& map, const std::vector<const Lun*>& luns, Report& report);
 
 /// `lun-size`: the map's total count times the LUN's extent size against the LUN's size.
 void checkLunSize(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFileMAP& content, const Lun& lun, Report& report);

@@ -1,6 +1,8 @@
 #include "check/MapRules.h"
 
 #include <algorithm>
+#include <limits>
+#include <utility>
 
 #include <etc/ISCSIEPFormat.h>
 
@@ -11,6 +13,8 @@ namespace inspection {
 namespace {
 
 constexpr std::uint32_t mostPools = ISCSI::TOOL::EP_POOL_COUNT_MAX;
+
+constexpr std::uint64_t noDataFile = std::numeric_limits<std::uint64_t>::max();  ///< past any that there can be
 
 /// The entries of `run` from the one that is `skipped` behind the first on.
 MapRun partOf(const MapRun& run, std::uint64_t skipped, std::uint64_t count) {
@@ -52,23 +56,26 @@ void MapRules::finish(bool complete) {
     if (!unreadable_.empty()) report_.notCompared("beyond-data-file: a data file cannot be read", file_.path);
 }
 
-void MapRules::take(Stretch& stretch, const MapRun& part) {
-    if (stretch.entries.count > 0 && stretch.entries.first + stretch.entries.count == part.first) {
-        stretch.entries.count += part.count;
+void MapRules::take(Stretch& stretch, const MapRun& part, std::uint64_t dataFile) {
+    MapRun& run = stretch.run;
+    if (run.count > 0 && run.first + run.count == part.first && stretch.dataFile == dataFile) {
+        run.count += part.count;
     } else {
         end(stretch);
-        stretch.entries = part;
+        run = part;
+        stretch.dataFile = dataFile;
     }
 }
 
 void MapRules::end(Stretch& stretch) {
-    if (stretch.entries.count > 0) (this->*stretch.report)(stretch.entries);
+    if (stretch.run.count > 0) (this->*stretch.report)(stretch);
 }
 
-void MapRules::addFinding(Rule rule, const MapRun& entries, const Value& stored, const Value& found) const {
+void MapRules::addFinding(Rule rule, const Stretch& stretch, const Value& stored, const Value& found) const {
     Finding finding = {file_.path, rule, stored, found};
-    finding.entries = Finding::Entries{entries.first, entries.count, entries.entry};
-    report_.add(finding);
+    finding.entries = Finding::Entries(stretch.run.first, stretch.run.count, stretch.run.entry);
+    finding.dataFile = stretch.dataFile;
+    report_.add(std::move(finding));
 }
 
 void MapRules::checkCount(Rule rule, std::uint64_t stored, std::uint64_t found) const {
@@ -98,17 +105,18 @@ void MapRules::checkUnmappedBits(const MapRun& run) {
     if (!run.entry.mapped) take(unmappedBits_, run);
 }
 
-void MapRules::reportUnmappedBits(const MapRun& entries) const {
-    addFinding(Rule::unmappedBits, entries, Value::hexadecimal(bitsOf(entries.entry)), Value::hexadecimal(0));
+void MapRules::reportUnmappedBits(const Stretch& stretch) const {
+    addFinding(Rule::unmappedBits, stretch, Value::hexadecimal(bitsOf(stretch.run.entry)), Value::hexadecimal(0));
 }
 
 void MapRules::checkAddressBits(const MapRun& run) {
     if (isAmbiguous(run.entry)) take(addressBits_, run);
 }
 
-void MapRules::reportAddressBits(const MapRun& entries) const {
-    addFinding(Rule::addressBits, entries, Value::hexadecimal(bitsOf(entries.entry)),
-               Value::hexadecimal(ambiguousBitsOf(entries.entry)));
+void MapRules::reportAddressBits(const Stretch& stretch) const {
+    const MapEntry& entry = stretch.run.entry;
+    addFinding(Rule::addressBits, stretch, Value::hexadecimal(bitsOf(entry)),
+               Value::hexadecimal(ambiguousBitsOf(entry)));
 }
 
 void MapRules::checkDataFiles(const MapRun& run) {
@@ -119,7 +127,7 @@ void MapRules::checkDataFiles(const MapRun& run) {
     for (std::uint64_t done = 0; done < run.count;) {
         const std::uint64_t address = run.entry.extentAddress + done;
         const auto place = placeOf(address, extentSize_);
-        if (!place) return take(missingDataFile_, partOf(run, done, run.count - done));
+        if (!place) return take(missingDataFile_, partOf(run, done, run.count - done), noDataFile);
         const std::uint64_t count = std::min(run.count - done, place->next - address);
         checkDataFile(partOf(run, done, count), *place);
         done += count;
@@ -130,31 +138,27 @@ void MapRules::checkDataFiles(const MapRun& run) {
 /// extent lies further on than counted within the data file: past the end by that reading, it is so by both.
 void MapRules::checkDataFile(const MapRun& part, const ExtentPlace& place) {
     const DataFile& data = dataFiles_->at(place.dataFile);
-    if (data.missing) return take(missingDataFile_, part);
+    if (data.missing) return take(missingDataFile_, part, place.dataFile);
     if (data.failure) {
         unreadable_.emplace(place.dataFile, *data.failure);
         return;
     }
     const std::uint64_t held = data.dataSize / extentSize_;
     const std::uint64_t inside = held > place.inFile ? std::min(part.count, held - place.inFile) : 0;
-    if (inside < part.count) take(beyondDataFile_, partOf(part, inside, part.count - inside));
+    if (inside < part.count) {
+        take(beyondDataFile_, partOf(part, inside, part.count - inside), place.dataFile);
+    }
 }
 
-void MapRules::reportMissingDataFile(const MapRun& entries) const {
-    const std::uint64_t address = entries.entry.extentAddress;
-    const auto place = placeOf(address, extentSize_);
-    addFinding(Rule::missingDataFile, entries, Value::number(address),
-               Value::text("no " + (place ? dataFileName(place->dataFile) : "data file")));
+void MapRules::reportMissingDataFile(const Stretch& stretch) const {
+    const std::string name = stretch.dataFile == noDataFile ? "data file" : dataFileName(stretch.dataFile);
+    addFinding(Rule::missingDataFile, stretch, Value::number(stretch.run.entry.extentAddress),
+               Value::text("no " + name));
 }
 
-void MapRules::reportBeyondDataFile(const MapRun& entries) const {
-    const std::uint64_t address = entries.entry.extentAddress;
-    const std::uint64_t number = placeOf(address, extentSize_)->dataFile;
-    Finding finding = {file_.path, Rule::beyondDataFile, Value::number(address),
-                       Value::number(dataFiles_->at(number).dataSize / extentSize_)};
-    finding.entries = Finding::Entries{entries.first, entries.count, entries.entry};
-    finding.dataFile = number;
-    report_.add(finding);
+void MapRules::reportBeyondDataFile(const Stretch& stretch) const {
+    addFinding(Rule::beyondDataFile, stretch, Value::number(stretch.run.entry.extentAddress),
+               Value::number(dataFiles_->at(stretch.dataFile).dataSize / extentSize_));
 }
 
 }  // namespace inspection

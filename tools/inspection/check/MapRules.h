@@ -15,7 +15,7 @@
 namespace inspection {
 
 /// Takes the runs of one map, in their order, from a single walk that serves all rules. Neighbouring entries that break
-/// one rule are one finding, which shows the first of them.
+/// one rule, as to data files against one of them, are a finding.
 class MapRules {
 public:
     MapRules(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFileMAP& content, Report& report)
@@ -35,13 +35,14 @@ public:
 private:
     /// Neighbouring entries that break a rule, as far as they have come, and how that is reported.
     struct Stretch {
-        void (MapRules::*report)(const MapRun& entries) const;
-        MapRun entries = {};
+        void (MapRules::*report)(const Stretch& stretch) const;
+        MapRun run = {};
+        std::uint64_t dataFile = 0;  ///< the number of the one that they point into
     };
 
-    void take(Stretch& stretch, const MapRun& part);
+    void take(Stretch& stretch, const MapRun& part, std::uint64_t dataFile = 0);
     void end(Stretch& stretch);
-    void addFinding(Rule rule, const MapRun& entries, const Value& stored, const Value& found) const;
+    void addFinding(Rule rule, const Stretch& stretch, const Value& stored, const Value& found) const;
 
     void checkCount(Rule rule, std::uint64_t stored, std::uint64_t found) const;
     void checkTotalCount() const;
@@ -54,10 +55,10 @@ private:
     void checkDataFiles(const MapRun& run);
     void checkDataFile(const MapRun& part, const ExtentPlace& place);
 
-    void reportUnmappedBits(const MapRun& entries) const;
-    void reportAddressBits(const MapRun& entries) const;
-    void reportMissingDataFile(const MapRun& entries) const;
-    void reportBeyondDataFile(const MapRun& entries) const;
+    void reportUnmappedBits(const Stretch& stretch) const;
+    void reportAddressBits(const Stretch& stretch) const;
+    void reportMissingDataFile(const Stretch& stretch) const;
+    void reportBeyondDataFile(const Stretch& stretch) const;
 
     const StoreFile& file_;
     const ISCSI::TOOL::ISCSIEPFileMAP& content_;

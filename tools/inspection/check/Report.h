@@ -1,26 +1,37 @@
-// What a check amounts to: findings as they come, totals, and what could not be compared.
+// What a check amounts to: findings, totals, and what could not be compared.
 #pragma once
 
 #include <cstdint>
 #include <functional>
 #include <map>
+#include <optional>
 #include <string>
+#include <tuple>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
 #include "check/Finding.h"
+#include "store/ChangeWatch.h"
+#include "store/Context.h"
 
 namespace inspection {
 
+/// Joins the findings about entries that break one rule against one partner, unless `each` run is to be seen, and hands
+/// all of them to `take` in the order of their files.
 class Report {
 public:
-    /// `take` gets each finding when it is found.
-    explicit Report(std::function<void(const Finding&)> take) : take_(std::move(take)) {}
+    Report(Context& context, bool each, std::function<void(const Finding&)> take)
+        : context_(context), each_(each), take_(std::move(take)) {}
 
-    void add(const Finding& finding) {
-        ++findings_;
-        take_(finding);
-    }
+    /// Findings about the file `path` may come from now on; it is the map of the LUN `lid`, where that is known, and
+    /// `watch` knows whether it changes.
+    void beginFile(const std::string& path, std::optional<std::uint32_t> lid, const ChangeWatch& watch);
+
+    void add(Finding finding);
+
+    /// Hands out what was added.
+    void handOut();
 
     /// Remembers that `what` could not be compared; where that concerns one file: which one.
     void notCompared(const std::string& what, const std::string& file = {});
@@ -31,21 +42,41 @@ public:
 
     std::uint64_t files() const { return files_; }
     std::uint64_t entries() const { return entries_; }
-    std::uint64_t findings() const { return findings_; }
+
+    /// How many findings were handed out, by rule.
+    const std::map<Rule, std::uint64_t>& findings() const { return findings_; }
 
     /// What could not be compared and why, a text each.
     std::vector<std::string> gaps() const;
 
 private:
+    struct File {
+        std::size_t rank;  ///< files come in this order
+        std::optional<std::uint32_t> lid;
+        ChangeWatch watch;
+    };
+
     struct Files {
         std::uint64_t count = 0;
         std::string first;
     };
 
+    /// What findings have in common that are joined: file, rule, other file, data file.
+    using Group = std::tuple<std::string, Rule, std::string, std::uint64_t>;
+
+    void askForChanges() const;
+    void complete(Finding& finding) const;
+    std::pair<std::size_t, std::size_t> rankOf(const Finding& finding) const;
+
+    Context& context_;
+    bool each_;
     std::function<void(const Finding&)> take_;
+    std::unordered_map<std::string, File> known_;  ///< files, by path
+    std::vector<Finding> waiting_;
+    std::map<Group, std::size_t> groups_;  ///< those that are waiting
     std::uint64_t files_ = 0;
     std::uint64_t entries_ = 0;
-    std::uint64_t findings_ = 0;
+    std::map<Rule, std::uint64_t> findings_;
     std::map<std::string, Files> notCompared_;
 };
 

@@ -66,7 +66,7 @@ void SharedExtents::reportShared(const Use& earlier, const Use& later, Report& r
     const MapEntry entry = mappedEntry(later.extent);
     Finding finding = {files_[later.map], Rule::sharedExtents, Value::number(entry.extentAddress),
                        Value::text(files_[earlier.map])};
-    finding.entries = Finding::Entries{later.first, count, entry};
+    finding.entries = Finding::Entries(later.first, count, entry);
     finding.partner = Finding::Partner{files_[earlier.map], otherFirst};
     report.add(finding);
 }

@@ -3,31 +3,58 @@
 #include <ISCSIEPFileDAT.h>
 #include <ISCSIEPFileTBL.h>
 
+#include <algorithm>
 #include <cerrno>
+#include <filesystem>
+#include <iterator>
+#include <system_error>
 
 #include "check/DataRules.h"
-#include "check/LunRules.h"
 #include "map/MapWalk.h"
+#include "store/ChangeWatch.h"
 #include "store/FileSize.h"
 
 namespace inspection {
 
 namespace tool = ISCSI::TOOL;
 
+namespace {
+
+std::string lidsText(Range lids) { return std::to_string(lids.first) + " to " + std::to_string(lids.last); }
+
+/// Whether a link lies at `hostPath`, wherever it leads.
+bool isLink(const std::string& hostPath) {
+    std::error_code error;
+    return std::filesystem::is_symlink(std::filesystem::symlink_status(hostPath, error));
+}
+
+}  // namespace
+
 void StoreCheck::run() {
-    if (!files_.areNamed() && files_.luns().empty()) {
-        report_.notCompared("lun-size, extent-size, missing-map: no LUN is configured with an id from " +
-                            std::to_string(options_.lids.first) + " to " + std::to_string(options_.lids.last));
+    for (const Lun& lun : files_.luns()) lunsByMap_[plainPath(lun.mapPath)].push_back(&lun);
+    if (!files_.areNamed() && lunsByMap_.empty()) {
+        report_.notCompared("lun-size, extent-size, missing-map, missing-file: no LUN is known, ids " +
+                            lidsText(options_.lids) + " were tried");
     }
-    files_.forEach([this](const StoreFile& file) { checkFile(file); });
+    files_.forEach([this](const StoreFile& file) {
+        checkFile(file);
+        report_.handOut();
+    });
+    if (!files_.areNamed() && !anyFile_) failEmptyStore(context_);
     commonValues_.check(report_);
+    checkKinds();
     checkExtentSizes();
+    checkSameMaps();
     checkSharedExtents();
+    report_.handOut();
 }
 
 void StoreCheck::checkFile(const StoreFile& file) {
     checked_.insert(context_.root.targetPath(file.path));
+    const ChangeWatch watch(context_, file.path, file.hostPath);
+    report_.beginFile(file.path, file.lun != nullptr ? std::optional(file.lun->record.lid) : std::nullopt, watch);
     if (file.missing) return checkMissing(file);
+    anyFile_ = true;
     const FileKind* kind = file.kind != nullptr ? file.kind : &headKind;
     auto content = kind->make(file.hostPath);
     if (!context_.succeeded(kind->parse(*content), {file.path, ""})) return;
@@ -39,16 +66,39 @@ void StoreCheck::checkFile(const StoreFile& file) {
     }
     report_.countFile();
     commonValues_.add(file, *content);
+    kindTypes_.add(file, *content);
     checkDataStart(file, *content, report_);
     checkContent(file, *kind, *content, checkKind(file, *content, report_));
+    if (kind->type == tool::EP_FILE_TYPE_MAP) watch.noticeChange();
 }
 
 void StoreCheck::checkMissing(const StoreFile& file) {
+    const MissingFile missing = missingAt(file.path, file.hostPath);
     if (file.lun != nullptr) {
-        tellMissingMap(file, *file.lun, report_);
+        checkMissingMap(missing, report_);
+    } else if (file.kind->type == tool::EP_FILE_TYPE_DAT) {
+        checkMissingDataFile(missing, report_);
     } else {
-        report_.notCompared("what the file holds: it is missing", file.path);
+        checkMissingFile(missing, report_);
     }
+}
+
+/// What is missing at `path` of the target, and which LUNs should have it.
+MissingFile StoreCheck::missingAt(const std::string& path, const std::string& hostPath) const {
+    MissingFile missing = {path, isLink(hostPath), {}};
+    const Trial trial(context_);
+    for (const Lun& lun : files_.luns()) {
+        const tool::ISCSIEPFile map(plainPath(lun.mapPath));
+        std::string table;
+        std::string freeIndex;
+        std::string journal;
+        map.getTBLFilePath(table);
+        map.getFRIFilePath(freeIndex);
+        map.getJNLFilePath(journal);
+        const std::string needed[] = {map.path, table, freeIndex, journal};
+        if (std::find(std::begin(needed), std::end(needed), path) != std::end(needed)) missing.luns.push_back(&lun);
+    }
+    return missing;
 }
 
 void StoreCheck::checkContent(const StoreFile& file, const FileKind& kind, tool::ISCSIEPFile& content, bool isKind) {
@@ -68,10 +118,13 @@ void StoreCheck::checkContent(const StoreFile& file, const FileKind& kind, tool:
 }
 
 void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) {
-    if (file.lun != nullptr) {
-        checkLunSize(file, content, *file.lun, report_);
-    } else if (files_.areNamed() || !files_.luns().empty()) {
-        report_.notCompared("lun-size, extent-size: no LUN is configured for this map", file.path);
+    const auto luns = lunsByMap_.find(context_.root.targetPath(file.path));
+    if (luns != lunsByMap_.end()) {
+        for (const Lun* lun : luns->second) checkLunSize(file, content, *lun, report_);
+    } else if (files_.areNamed() || !lunsByMap_.empty()) {
+        report_.notCompared(
+            "lun-size, extent-size: no LUN with an id from " + lidsText(options_.lids) + " is known for this map",
+            file.path);
     }
     unsigned long long entries = 0;
     if (!context_.succeeded(content.getEntryCount(entries), {file.path, ""})) return;
@@ -122,6 +175,19 @@ void StoreCheck::useDataFiles(const StoreFile& file, MapRules& rules) {
     rules.useDataFiles(dataFiles, *extentSize);
 }
 
+void StoreCheck::checkKinds() {
+    for (const std::string& path : kindTypes_.check(report_)) {
+        const auto table = tables_.find(context_.root.targetPath(path));
+        if (table != tables_.end()) table->second.reset();
+    }
+}
+
+void StoreCheck::checkSameMaps() {
+    for (const auto& [map, luns] : lunsByMap_) {
+        if (!files_.areNamed() || checked_.count(map) > 0) checkSameMap(map, luns, report_);
+    }
+}
+
 void StoreCheck::checkExtentSizes() {
     const Trial trial(context_);
     for (const Lun& lun : files_.luns()) {
@@ -132,7 +198,7 @@ void StoreCheck::checkExtentSizes() {
         if (extentSize) {
             checkExtentSize(table, *extentSize, lun, report_);
         } else if (onVolume) {
-            report_.notCompared("extent-size: no table file that could be read", table);
+            report_.notCompared("extent-size: no table file that can be compared", table);
         } else {
             report_.notCompared("extent-size: the path of the LUN's map file names no volume", lun.mapPath);
         }
@@ -144,7 +210,11 @@ std::optional<std::uint32_t> StoreCheck::tableExtentSize(const std::string& path
     const auto [row, added] = tables_.try_emplace(path);
     if (!added || !files_.areNamed() || checked_.count(path) > 0) return row->second;
     const std::optional<std::string> hostPath = context_.openablePath(path);
-    if (!hostPath || (!context_.sizeOf(*hostPath) && errno == ENOENT)) return std::nullopt;
+    if (!hostPath) return std::nullopt;
+    if (!context_.sizeOf(*hostPath) && (errno == ENOENT || errno == ENOTDIR)) {
+        checkMissingFile(missingAt(path, *hostPath), report_);
+        return std::nullopt;
+    }
     tool::ISCSIEPFileTBL table(*hostPath);
     if (context_.succeeded(table.parseFile(), {path, ""})) row->second = table.extentSize;
     return row->second;

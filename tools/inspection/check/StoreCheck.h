@@ -11,6 +11,8 @@
 #include <vector>
 
 #include "check/HeadRules.h"
+#include "check/KindRules.h"
+#include "check/LunRules.h"
 #include "check/MapRules.h"
 #include "check/Report.h"
 #include "check/SharedExtents.h"
@@ -37,10 +39,13 @@ public:
 private:
     void checkFile(const StoreFile& file);
     void checkMissing(const StoreFile& file);
+    MissingFile missingAt(const std::string& path, const std::string& hostPath) const;
     void checkContent(const StoreFile& file, const FileKind& kind, ISCSI::TOOL::ISCSIEPFile& content, bool isKind);
     void checkMap(const StoreFile& file, ISCSI::TOOL::ISCSIEPFileMAP& content);
     void useDataFiles(const StoreFile& file, MapRules& rules);
     void reportUnreadable(const MapRules& rules);
+    void checkSameMaps();
+    void checkKinds();
     void checkExtentSizes();
     void checkSharedExtents();
     std::optional<std::uint32_t> tableExtentSize(const std::string& path);
@@ -49,7 +54,10 @@ private:
     const CheckOptions& options_;
     ChosenFiles files_;
     Report& report_;
+    std::map<std::string, std::vector<const Lun*>> lunsByMap_;  ///< by path on the target
+    bool anyFile_ = false;                                      ///< something lies there
     CommonValues commonValues_;
+    KindTypes kindTypes_;
     SharedExtents sharedExtents_;
     std::set<std::string> checked_;                               ///< paths on the target
     std::set<std::string> foldersWithoutVolume_;                  ///< with map files

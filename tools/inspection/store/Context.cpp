@@ -2,6 +2,7 @@
 
 #include <etc/ISCSIEPDiagnostics.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <utility>
@@ -33,6 +34,16 @@ bool Context::succeeded(int error, const Subject& subject) {
 
 void Context::fail(const Subject& subject, std::string_view what, int error) {
     failed({subject, error, 0, std::string(what)});
+}
+
+bool Context::hasChanged(const std::string& name) const {
+    return std::find(changedFiles_.begin(), changedFiles_.end(), name) != changedFiles_.end();
+}
+
+void Context::changed(const std::string& name) {
+    if (hasChanged(name)) return;
+    changedFiles_.push_back(name);
+    remark(name, "has changed while it was read");
 }
 
 std::optional<std::string> Context::openablePath(const std::string& name) {

@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "Failure.h"
 #include "store/Collection.h"
@@ -52,6 +53,15 @@ public:
     /// Until the call with false, the log lines of the library are about what is only tried out. May be nested.
     virtual void trying(bool begins) = 0;
 
+    /// The file that the user called `name` has changed while it was read. Remarks on it, once a file.
+    virtual void changed(const std::string& name);
+
+    /// Whether that was said of it.
+    bool hasChanged(const std::string& name) const;
+
+    /// These files, in the order in which that was noticed.
+    const std::vector<std::string>& changedFiles() const { return changedFiles_; }
+
     /// Reports the failure of a call of the library, right after it (the system's reason is still in errno), when
     /// `error` is not 0. Returns whether it is 0.
     bool succeeded(int error, const Subject& subject);
@@ -71,6 +81,7 @@ public:
 
 private:
     bool lunsPrepared_ = false;
+    std::vector<std::string> changedFiles_;
 };
 
 /// While one lives, things are only tried out.

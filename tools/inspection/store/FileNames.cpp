@@ -50,6 +50,12 @@ std::string dataFileName(std::uint64_t number) {
     return std::string(lastName(path));
 }
 
+bool isMisnamed(std::string_view path) {
+    if (!isDataFileName(path)) return false;
+    const auto number = dataFileNumberIn(path);
+    return !number || lastName(path) != dataFileName(*number);
+}
+
 std::optional<MapName> mapNameIn(std::string_view fileName) {
     static constexpr std::string_view end = "_00000";
     const auto dash = fileName.find('-');  // no type name holds one: it is the UUID's

@@ -5,15 +5,17 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 
-#include "store/Context.h"
+#include "store/ChangeWatch.h"
 
 namespace inspection {
 
 struct OpenedMap {
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFileMAP> file;  ///< HEAD[0] is decoded; null after a failure
     std::uint64_t entries = 0;                          ///< how many the file holds
+    std::optional<ChangeWatch> watch;                   ///< from before it was opened; to be asked after the walk
 };
 
 /// Opens the map file that the user called `name` and says what is doubtful about it. Reports failures.

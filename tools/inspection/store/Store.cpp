@@ -46,6 +46,11 @@ std::uint32_t volumeOf(Context& context, const std::string& path) {
     return volumeIn(std::string_view(table).substr(1, table.find('/', 1) - 1));
 }
 
+void failEmptyStore(Context& context) {
+    const std::string top = context.root.hostPath("");
+    context.fail({top.empty() ? "/" : top, ""}, "no EP files found", tool::EP_ERR_NO_PATH);
+}
+
 Store::Store(Context& context, Range lids) : context_(context) {
     forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
     std::string journal;
@@ -82,7 +87,9 @@ std::vector<std::string> Store::namesIn(const std::string& folder, std::set<std:
     visitFolder(context_, folder, [&](const fs::directory_entry& entry) {
         std::error_code error;
         std::string name = entry.path().filename().string();
-        if (kindByName(folder + "/" + name) != nullptr && !entry.is_directory(error)) names.insert(std::move(name));
+        const FileKind* kind = kindByName(folder + "/" + name);
+        const bool anyName = kind != nullptr && kind->type == tool::EP_FILE_TYPE_MAP && !mapNameIn(name);
+        if (kind != nullptr && !(anyName && entry.is_directory(error))) names.insert(std::move(name));
     });
     std::vector<std::string> sorted(names.begin(), names.end());
     std::sort(sorted.begin(), sorted.end(), precedes);

@@ -23,6 +23,9 @@ namespace inspection {
 /// The volume on which a file at `path` of the target lies, 0 when the path names none.
 std::uint32_t volumeOf(Context& context, const std::string& path);
 
+/// Reports that there is no store below the root folder.
+void failEmptyStore(Context& context);
+
 /// A file of the store.
 struct StoreFile {
     const FileKind* kind = nullptr;  ///< what its name tells; never null

@@ -1,0 +1,102 @@
+// A map that changes while epinspect walks it: every command that walks says so.
+#include <sys/syscall.h>
+
+#include <utility>
+
+#include "InProcess.h"
+#include "ProgramTest.h"
+
+static std::function<void()> happens;  ///< once, when the second block of a map's entries is about to be read
+
+// read() itself, whatever a hardened build makes of that name.
+ssize_t readInAStoreInUse(int descriptor, void* bytes, std::size_t size) __asm__("read");
+__attribute__((visibility("default"))) ssize_t readInAStoreInUse(int descriptor, void* bytes, std::size_t size) {
+    if (happens && lseek(descriptor, 0, SEEK_CUR) == 24576 + 8 * 4096) std::exchange(happens, {})();
+    return syscall(SYS_read, descriptor, bytes, size);
+}
+
+namespace {
+
+namespace fs = std::filesystem;
+
+class Changes : public ProgramTest {
+protected:
+    /// Runs epinspect on the map "m" of 8192 entries, to which `change` happens.
+    int run(std::vector<const char*> words, const std::function<void()>& change) const {
+        namespace map = epbuilder::map;
+        EPFileBuilder file = EPFileBuilder::map().set(map::totalCount, 8192).set(map::mappedCount, 0);
+        write("m", file.set(map::syncCount, 0).entry(8191, 5));
+        fs::last_write_time(path("m"), before_);
+        const pid_t child = fork();
+        if (child == 0) {
+            fs::current_path(path(""));
+            if (std::freopen(".out", "w", stdout) == nullptr || std::freopen(".err", "w", stderr) == nullptr) _exit(99);
+            unsetenv("KELPISCSIEP_LUNS");
+            happens = change;
+            words.insert(words.begin(), "epinspect");
+            const int status = runHere(words);
+            _exit(happens && change ? 98 : status);
+        }
+        int status = 0;
+        EXPECT_EQ(child, waitpid(child, &status, 0));
+        return exitStatus(status);
+    }
+
+    const fs::file_time_type before_ = fs::file_time_type::clock::now() - std::chrono::hours(1);
+};
+
+TEST_F(Changes, AreNoticedByEveryCommandThatWalks) {
+    const auto writeAt = [](std::streamoff position) {
+        std::fstream("m", std::ios::in | std::ios::out).seekp(position) << "x";
+    };
+    const std::pair<const char*, std::function<void()>> changes[] = {
+        {"nothing", {}},
+        {"it grows within one tick of the clock",
+         [&] {
+             fs::resize_file("m", 24576 + 8 * 8193);
+             fs::last_write_time("m", before_);
+         }},
+        {"entries are rewritten", [&] { writeAt(24576); }},
+        {"the header is rewritten within one tick of the clock",
+         [&] {
+             writeAt(24575);
+             fs::last_write_time("m", before_);
+         }},
+        {"its like takes its place",
+         [&] {
+             fs::copy("m", "new");
+             fs::last_write_time("new", before_);
+             fs::rename("new", "m");
+         }},
+        {"it shrinks", [] { fs::resize_file("m", 24576 + 8 * 4097); }},
+    };
+    write("none", EPFileBuilder::map());
+    for (const auto& [what, change] : changes) {
+        const bool whole = what != std::string("it shrinks");
+        for (const auto& [words, status] :
+             std::vector<std::pair<std::vector<const char*>, int>>{{{"map", "m", "--json"}, 0},
+                                                                   {{"diff", "m", "none", "--json"}, 3},
+                                                                   {{"find", "m", "--json", "--pool", "7"}, 0},
+                                                                   {{"check", "m", "--json"}, 3}}) {
+            EXPECT_EQ(whole ? status : 1, run(words, change)) << words[0] << ": " << what;
+            const std::string says = !change ? "" : "epinspect: m: has changed while it was read\n";
+            EXPECT_PRED2(matches, content(".err"), (whole ? "" : "…") + says) << words[0] << ": " << what;
+            const bool isCheck = words[0] == std::string("check");
+            const std::string list = !change   ? "…\"changed\":[]…"
+                                     : isCheck ? "…\"passing\":true…\"changed\":[\"m\"]…"
+                                               : "…\"changed\":[\"m\"]…";
+            EXPECT_PRED2(matches, content(".out"), whole ? list : "…") << words[0] << ": " << what;
+        }
+    }
+}
+
+TEST_F(Changes, OfAMapThatWasWalkedBeforeCastDoubtOnWhatItShares) {
+    write("first", EPFileBuilder::map().entry(0, 0x8000000000000005));
+    write("second", EPFileBuilder::map().entry(0, 0x8000000000000005).entry(8191, 0));
+    run({"check", "first", "second"}, [] { fs::resize_file("first", 24576); });
+    EXPECT_PRED2(matches, content(".err"), "epinspect: first: has changed while it was read\n");
+    EXPECT_PRED2(matches, content(".out"),
+                 "…second: shared-extents: entry 0: …: the file has changed while it was read)\n…");
+}
+
+}  // namespace
