@@ -80,12 +80,12 @@ TEST_F(Changes, AreNoticedByEveryCommandThatWalks) {
                                                                    {{"check", "m", "--json"}, 3}}) {
             EXPECT_EQ(whole ? status : 1, run(words, change)) << words[0] << ": " << what;
             const std::string says = !change ? "" : "epinspect: m: has changed while it was read\n";
-            EXPECT_PRED2(matches, content(".err"), (whole ? "" : "…") + says) << words[0] << ": " << what;
+            EXPECT_TRUE(fits(content(".err"), (whole ? "" : "…") + says)) << words[0] << ": " << what;
             const bool isCheck = words[0] == std::string("check");
             const std::string list = !change   ? "…\"changed\":[]…"
                                      : isCheck ? "…\"passing\":true…\"changed\":[\"m\"]…"
                                                : "…\"changed\":[\"m\"]…";
-            EXPECT_PRED2(matches, content(".out"), whole ? list : "…") << words[0] << ": " << what;
+            EXPECT_TRUE(fits(content(".out"), whole ? list : "…")) << words[0] << ": " << what;
         }
     }
 }
@@ -94,9 +94,9 @@ TEST_F(Changes, OfAMapThatWasWalkedBeforeCastDoubtOnWhatItShares) {
     write("first", EPFileBuilder::map().entry(0, 0x8000000000000005));
     write("second", EPFileBuilder::map().entry(0, 0x8000000000000005).entry(8191, 0));
     run({"check", "first", "second"}, [] { fs::resize_file("first", 24576); });
-    EXPECT_PRED2(matches, content(".err"), "epinspect: first: has changed while it was read\n");
-    EXPECT_PRED2(matches, content(".out"),
-                 "…second: shared-extents: entry 0: …: the file has changed while it was read)\n…");
+    EXPECT_TRUE(fits(content(".err"), "epinspect: first: has changed while it was read\n"));
+    EXPECT_TRUE(
+        fits(content(".out"), "…second: shared-extents: entry 0: …: the file has changed while it was read)\n…"));
 }
 
 }  // namespace

@@ -85,8 +85,9 @@ TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {
     listing.shownUntil(" left");
     listing.signal(SIGINT);  // which it ignores, as it was told when it started
     std::filesystem::resize_file(path("endless"), 24576);
-    EXPECT_PRED2(matches, listing.shown(),
-                 "  …%…\r\033[Kepinspect: endless: entry …: the file has become shorter while it was read (…)\n…=1");
+    EXPECT_TRUE(
+        fits(listing.shown(),
+             "  …%…\r\033[Kepinspect: endless: entry …: the file has become shorter while it was read (…)\n…=1"));
 }
 
 TEST_F(OnTerminal, ThereIsNoProgressBesideAListingNorInAFile) {
