@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <exception>
 #include <new>
+#include <utility>
 
 #include "DumpText.h"
 #include "EPLayout.h"
@@ -35,6 +36,21 @@ int unusableExtentSize(const ISCSIEPFile& file, const EPLookupIdentity& lookup, 
     return EP_ERR_BAD_EXTENT_SIZE;
 }
 
+#ifdef __SSE2__
+/// PutHexDigits() in vectors twice as wide, for machines with AVX2.
+__attribute__((target("avx2"))) void putDigitsWide(const unsigned char* bytes, std::size_t count, char* digits) {
+    const std::size_t done = PutHexBlocks(bytes, count, digits, std::make_index_sequence<32>());
+    PutHexDigits(bytes + done, count - done, digits + 2 * done);
+}
+#endif
+
+void putDigits(const unsigned char* bytes, std::size_t count, char* digits) {
+#ifdef __SSE2__
+    if (__builtin_cpu_supports("avx2") != 0) return putDigitsWide(bytes, count, digits);
+#endif
+    PutHexDigits(bytes, count, digits);
+}
+
 /// Reads `size` bytes from `stream` and makes their hexadecimal digits the content of `text`, which is empty. False
 /// when the read fails. Throws when memory cannot hold the digits.
 bool readDigits(EPFileStream& stream, std::size_t size, std::string& text) {
@@ -44,7 +60,7 @@ bool readDigits(EPFileStream& stream, std::size_t size, std::string& text) {
     text.resize_and_overwrite(2 * size, [&stream, size](char* digits, std::size_t /*room*/) -> std::size_t {
         auto* bytes = reinterpret_cast<unsigned char*>(digits + size);
         if (!stream.read(bytes, size)) return 0;
-        PutHexDigits(bytes, size, digits);
+        putDigits(bytes, size, digits);
         return 2 * size;
     });
     return !text.empty();
@@ -55,7 +71,7 @@ bool readDigits(EPFileStream& stream, std::size_t size, std::string& text) {
         const std::size_t count = std::min(size - done, sizeof block);
         if (!stream.read(block, count)) return false;
         text.append(2 * count, '0');
-        PutHexDigits(block, count, &text[2 * done]);
+        putDigits(block, count, &text[2 * done]);
         done += count;
     }
     return true;

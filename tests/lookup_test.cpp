@@ -191,6 +191,21 @@ TEST(Extent, MarksComeOutFromBeyondThe32BitRange) {
     EXPECT_EQ(std::string("34") + std::string(0x200000 - 2, '0'), data);
 }
 
+TEST(Extent, EveryByteBecomesItsDigitsWhateverTheSize) {
+    std::string content, digits;
+    for (unsigned int i = 0; i < 256 * 65; ++i) {  // every value in every place of a block
+        content.push_back(static_cast<char>(i * 3));
+        digits.append(1, "0123456789abcdef"[i * 3 / 16 % 16]).append(1, "0123456789abcdef"[i * 3 % 16]);
+    }
+    const TempDir folder;
+    ISCSIEPFileDAT file(folder.write("data", EPFileBuilder::data().bytes(blockSize, content)));
+    for (const unsigned int size : {1U, 15U, 31U, 32U, 33U, 63U, 64U, 256U * 65}) {
+        std::string data;
+        EXPECT_EQ(0, file.getExtentData(0, size, data));
+        EXPECT_EQ(digits.substr(0, std::size_t{2} * size), data);
+    }
+}
+
 TEST(Extent, BytesComeOutInFileOrderAndSizesAreChecked) {
     const TempDir folder;
     const std::string bytes("\x00\x0f\xa0\xff\x12\x34", 6);

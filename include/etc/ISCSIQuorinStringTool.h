@@ -14,6 +14,7 @@
 #include <exception>
 #include <new>
 #include <string>
+#include <utility>
 
 #include "ISCSIEPDiagnostics.h"
 #include "ISCSIEPLog.h"
@@ -29,29 +30,44 @@ inline constexpr auto HexDigitPairs = [] {
     return pairs;
 }();
 
-/// Writes the two hexadecimal digits of each of `count` bytes to `digits`. The bytes may lie at the end of the room for
-/// the digits, in which case they are written over.
-inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* digits) {
-    std::size_t i = 0;
+/// PutHexDigits() a block at a time, in vectors of as many bytes as there are `Places`. Returns how many of the `count`
+/// bytes are done: all whole blocks, or none where machine or compiler have no such vectors.
+template <std::size_t... Places>
+[[gnu::always_inline]] inline std::size_t PutHexBlocks([[maybe_unused]] const unsigned char* bytes,
+                                                       [[maybe_unused]] std::size_t count,
+                                                       [[maybe_unused]] char* digits,
+                                                       std::index_sequence<Places...> /*places*/) {
+    std::size_t done = 0;
 #if defined(__SSE2__) && defined(__has_builtin)
 #if __has_builtin(__builtin_shufflevector)
-    // Sixteen bytes at a time, whatever the compiler makes of the loop below.
-    using Bytes = signed char __attribute__((vector_size(16)));
-    using Words = unsigned short __attribute__((vector_size(16)));
-    const auto digitsOf = [](Bytes values) { return values + (Bytes(values > '9') & ('a' - '9' - 1)); };
-    for (; i + sizeof(Bytes) <= count; i += sizeof(Bytes)) {
+    constexpr std::size_t size = sizeof...(Places);
+    // NOLINTBEGIN(modernize-use-using): of a type alias g++ forgets the size
+    typedef signed char Bytes __attribute__((vector_size(size)));
+    typedef unsigned short Words __attribute__((vector_size(size)));
+    // NOLINTEND(modernize-use-using)
+    for (; done + size <= count; done += size) {
         Bytes block;
-        std::memcpy(&block, bytes + i, sizeof block);
-        const Bytes high = digitsOf((Bytes(Words(block) >> 4) & 0xF) | '0');
-        const Bytes low = digitsOf((block & 0xF) | '0');
-        const Bytes pairs[] = {
-            __builtin_shufflevector(high, low, 0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23),
-            __builtin_shufflevector(high, low, 8, 24, 9, 25, 10, 26, 11, 27, 12, 28, 13, 29, 14, 30, 15, 31)};
-        std::memcpy(digits + 2 * i, pairs, sizeof pairs);
+        std::memcpy(&block, bytes + done, size);
+        Bytes high = (Bytes(Words(block) >> 4) & 0xF) | '0';
+        Bytes low = (block & 0xF) | '0';
+        high += Bytes(high > '9') & ('a' - '9' - 1);
+        low += Bytes(low > '9') & ('a' - '9' - 1);
+        const Bytes first = __builtin_shufflevector(high, low, (Places / 2 + Places % 2 * size)...);
+        const Bytes second = __builtin_shufflevector(high, low, ((size + Places) / 2 + Places % 2 * size)...);
+        std::memcpy(digits + 2 * done, &first, size);
+        std::memcpy(digits + 2 * done + size, &second, size);
     }
 #endif
 #endif
-    for (; i < count; ++i) std::memcpy(digits + 2 * i, &HexDigitPairs[2 * std::size_t{bytes[i]}], 2);
+    return done;
+}
+
+/// Writes the two hexadecimal digits of each of `count` bytes to `digits`. The bytes may lie at the end of the room for
+/// the digits, in which case they are written over.
+inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* digits) {
+    for (auto i = PutHexBlocks(bytes, count, digits, std::make_index_sequence<16>()); i < count; ++i) {
+        std::memcpy(digits + 2 * i, &HexDigitPairs[2 * std::size_t{bytes[i]}], 2);
+    }
 }
 
 /// Replaces `text` by `length` bytes as lower-case hexadecimal digits, two per byte, high four bits first.
