@@ -7,5 +7,9 @@
 int main(int argc, char** argv) {
     epinspect::prepareStreams();
     std::setlocale(LC_CTYPE, "");
+#ifdef EPINSPECT_STATIC
+    // For any other character set the C library would load a library of the machine, which need not fit.
+    if (!epinspect::outputIsUnicode()) std::setlocale(LC_CTYPE, "C");
+#endif
     return epinspect::runProgram(argc, argv);
 }
