@@ -115,7 +115,7 @@ const Case cases[] = {
      "epinspect -V --nonsense", 0, "Usage: epinspect SUBCOMMAND ... [-V, --version]\n…"
      "Usage: epinspect map MAPFILE [--first N] [--count N] [--chart] [--json]\n…"
      "Usage: epinspect path SUBCOMMAND ...\n…Usage: epinspect path dat EPFILE --extent-size SIZE --extent-address N\n"
-     "…       [--address-bits 48|52] [--count-from file|volume]\n\n--\n"
+     "…       [--json] [--extent-size SIZE] [--address-bits 48|52]\n       [--count-from file|volume]\n\n--\n"
      "  --address-bits 48|52  How many bits of an entry are its extent address;\n"
      "                        matters where bits 48 to 51 are set\n  --count-from file|volume\n"
      "                        From where extents are counted: within the data file, or\n"

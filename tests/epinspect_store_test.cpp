@@ -150,11 +150,10 @@ const Case cases[] = {
     {"read gets all that can be had", "epinspect --root far read 5 >image; echo $?; wc -c <image; "
      "grep -abo '[a-z][a-z]*' image; epinspect --root far read 5 --count-from file --address-bits 48 2>/dev/null | "
      "grep -abo '[a-z][a-z]*'", 0, "1\n6291456\n4194304:three\n1048576:here\n2097152:two\n4194304:three\n",
-     "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: past the end, …\nepinspect: " + ep + "0: LUN 5 bytes "
-     "0-1048575: " + beyond0 + "epinspect: " + ep + "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and "
+     "epinspect: " + ep + "0: LUN 5 bytes 0-1048575: " + beyond0 + "epinspect: " + ep + "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and "
      "both places lie inside the file; --count-from decides …\nepinspect: LUN 5 bytes 2097152-3145727: " + open2 +
      "epinspect: " + ep + "2: LUN 5 bytes 3145728-4194303: " + notFound + "epinspect: " + ep + "0: LUN 5 bytes "
-     "4718592-5242879: " + beyond0 +
+     "4718592-5242879: " + beyond0 + "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: past the end, …\n"
      "epinspect: LUN 5: 5242880 of 6291456 bytes could not be read, zeros stand in their place\n"},
     {"read reaches beyond four TiB", "T='epinspect --root far read --count-from volume'; $T 5 --offset 1M --length 5; "
      "$T --extent-size 1M " + lun5 + " --offset 1048578 --length 0x1; "
@@ -189,11 +188,13 @@ TEST_F(Store, ReadLosesNoMoreThanWhatCannotBeRead) {
         EXPECT_TRUE(fits(content(".err"),
                          "epinspect: " + lost + " of 600000 bytes could not be read, zeros stand in their place\n"));
     };
-    // Of the bytes asked for, which start at byte 100 of the extent, number 72 of the pieces of 4096; then the map.
-    const std::string zeros(600000, '\0'), xs(294912, 'x'), all = lun5 + ": LUN 5 bytes 4194404-4794403: ";
+    // Of the extent's blocks of 4096 bytes number 72; the bytes asked for start at byte 100 of the extent. Then the
+    // map.
+    const std::string zeros(600000, '\0'), all = lun5 + ": LUN 5 bytes 4194404-4794403: ";
     const std::string reason = "cannot be read: Input/output error (EP_ERR_READ_FAILED, 18990039)";
-    expectRead(-1, 24576 + 3 * MiB + 298000, xs + std::string(4096, '\0') + xs + std::string(6080, 'x'),
-               ep + "0: LUN 5 bytes 4489316-4493411: " + reason + "…LUN 5: 4096");
+    expectRead(-1, 24576 + 3 * MiB + 298000,
+               std::string(294812, 'x') + std::string(4096, '\0') + std::string(301092, 'x'),
+               ep + "0: LUN 5 bytes 4489216-4493311: " + reason + "…LUN 5: 4096");
     expectRead(-1, 24576 + 32, zeros, all + reason + "…LUN 5: 600000");
     expectRead(0, 24576 + 32, zeros, all + "the file has become shorter while it was read (…LUN 5: 600000");
 }

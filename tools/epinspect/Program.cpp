@@ -1,12 +1,14 @@
 #include "Program.h"
 
 #include <cerrno>
+#include <csignal>
 #include <cstring>
 #include <exception>
 #include <new>
 
 #include "commands/Commands.h"
 #include "frame/CommandLine.h"
+#include "frame/Interruption.h"
 #include "frame/Output.h"
 
 namespace epinspect {
@@ -61,6 +63,8 @@ int runProgram(int argc, char** argv) {
         return run(argc, argv);
     } catch (const OutputFailure& failure) {
         if (failure.error != EPIPE) complainPlainly({"standard output: ", std::strerror(failure.error)});
+    } catch (const Interrupted& interrupted) {
+        static_cast<void>(std::raise(interrupted.signal));  // what it does by default: the shell can tell
     } catch (const std::bad_alloc&) {
         complainPlainly({"out of memory"});
     } catch (const std::exception& error) {

@@ -7,9 +7,9 @@ namespace epinspect {
 
 namespace {
 
-volatile std::sig_atomic_t interrupted = 0;
+volatile std::sig_atomic_t arrived = 0;
 
-extern "C" void remember(int /*signal*/) { interrupted = 1; }
+extern "C" void remember(int signal) { arrived = signal; }
 
 }  // namespace
 
@@ -19,11 +19,15 @@ void holdInterruptions() {
         if (sigaction(signal, nullptr, &action) != 0 || action.sa_handler == SIG_IGN) continue;
         action = {};
         action.sa_handler = remember;
-        action.sa_flags = static_cast<int>(SA_RESETHAND);
+        action.sa_flags = static_cast<int>(SA_RESETHAND);  // and not SA_RESTART: a write that waits comes back
         sigaction(signal, &action, nullptr);
     }
 }
 
-bool isInterrupted() noexcept { return interrupted != 0; }
+int interruption() noexcept { return arrived; }
+
+void checkInterruption() {
+    if (arrived != 0) throw Interrupted{arrived};
+}
 
 }  // namespace epinspect

@@ -7,7 +7,18 @@ namespace epinspect {
 /// progress can come to an orderly end. The second one ends the program.
 void holdInterruptions();
 
+/// The signal that was remembered, 0 before.
+int interruption() noexcept;
+
 /// Whether there was one.
-bool isInterrupted() noexcept;
+inline bool isInterrupted() noexcept { return interruption() != 0; }
+
+/// Thrown to end a work.
+struct Interrupted {
+    int signal;
+};
+
+/// Throws Interrupted when there was one.
+void checkInterruption();
 
 }  // namespace epinspect

@@ -12,6 +12,7 @@
 #include <cwchar>
 #include <cwctype>
 
+#include "frame/Interruption.h"
 #include "frame/StatusLine.h"
 
 namespace epinspect {
@@ -80,6 +81,7 @@ void print(std::string_view text) {
         text.remove_prefix(part.size());
         if (buffered == bufferSize || terminal) flushOutput();
     }
+    if (outputError == EINTR) checkInterruption();
     if (outputError != 0) throw OutputFailure{outputError};
 }
 

@@ -18,7 +18,7 @@ struct OutputFailure {
 void prepareStreams();
 
 /// Writes data to standard output, which is a terminal line by line and otherwise in large pieces. Throws
-/// OutputFailure.
+/// OutputFailure, and Interrupted when a signal ended the wait for somebody to take it.
 void print(std::string_view text);
 
 /// Makes sure that all data has arrived. Throws OutputFailure.

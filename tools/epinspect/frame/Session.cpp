@@ -27,8 +27,6 @@ void Session::remarkOnCollection() {
 }
 
 void Session::failed(const Failure& failure) {
-    failed_ = true;
-    const std::string message = messageOf(failure);
     if (json) {
         Json object(failure.subject.file);
         object.begin("error");
@@ -37,9 +35,14 @@ void Session::failed(const Failure& failure) {
         } else {
             object.null("error");
         }
-        object.number("code", failure.error).text("message", message).end();
+        object.number("code", failure.error).text("message", messageOf(failure)).end();
     }
-    complain(message);
+    complainOf(failure);
+}
+
+void Session::complainOf(const Failure& failure) {
+    failed_ = true;
+    complain(messageOf(failure));
 }
 
 void Session::remark(const std::string& subject, const std::string& text) { complain(subject + ": " + text); }

@@ -27,6 +27,9 @@ public:
     /// Prints the message, as an object too with --json. The exit status is 1 from then on. Throws OutputFailure.
     void failed(const Failure& failure) override;
 
+    /// The same without the object, for which the caller has one that says more.
+    void complainOf(const Failure& failure);
+
     void remark(const std::string& subject, const std::string& text) override;
     void progress(const char* things, std::uint64_t done, std::uint64_t total) override;
     void trying(bool begins) override;

@@ -6,6 +6,8 @@
 #include <csignal>
 #include <utility>
 
+#include "frame/Interruption.h"
+
 namespace epinspect {
 
 namespace {
@@ -49,7 +51,7 @@ void eraseStatusLine() noexcept {
 int writeAll(int stream, std::string_view text) noexcept {
     while (!text.empty()) {
         const ssize_t written = write(stream, text.data(), text.size());
-        if (written < 0 && errno == EINTR) continue;
+        if (written < 0 && errno == EINTR && interruption() == 0) continue;
         if (written < 0) return errno;
         text.remove_prefix(static_cast<std::size_t>(written));
     }

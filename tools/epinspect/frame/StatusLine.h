@@ -13,7 +13,7 @@ void showStatusLine(std::string_view text);
 void eraseStatusLine() noexcept;
 
 /// Writes all of `text` to the file descriptor `stream`; may be called in a signal handler. Returns 0 or the errno
-/// value of the write that failed.
+/// value of the write that failed, EINTR when interruption() did it.
 int writeAll(int stream, std::string_view text) noexcept;
 
 }  // namespace epinspect

@@ -8,7 +8,6 @@
 
 #include "store/Doubts.h"
 #include "store/FileNames.h"
-#include "store/FileSize.h"
 #include "store/Folder.h"
 
 namespace inspection {
@@ -21,9 +20,17 @@ DataFiles::DataFiles(Context& context, const std::string& path, bool remarks)
 const DataFile& DataFiles::at(std::uint64_t number) {
     constexpr std::size_t mostFiles = 64;  // 256 TiB; what a file takes is mainly its header block
     const auto known = files_.find(number);
-    if (known != files_.end()) return known->second;
-    if (files_.size() >= mostFiles) files_.clear();
-    return files_.emplace(number, open(number)).first->second;
+    if (known != files_.end() && isAsOpened(known->second)) {
+        known->second.looks = looks_;
+        return known->second;
+    }
+    if (known == files_.end() && files_.size() >= mostFiles) files_.clear();
+    return files_[number] = open(number);
+}
+
+bool DataFiles::isAsOpened(const DataFile& data) const {
+    if (data.looks == looks_) return true;
+    return !data.failure && stateOf(context_.root.hostPath(data.path)) == data.state;
 }
 
 bool DataFiles::list() {
@@ -50,6 +57,7 @@ bool DataFiles::isListedMissing(std::uint64_t number) const { return listed_ && 
 
 DataFile DataFiles::open(std::uint64_t number) {
     DataFile data;
+    data.looks = looks_;
     const auto failed = [&data](int error, int reason, std::string what = {}) {
         data.failure = Failure{{data.path, ""}, error, reason, std::move(what)};
         data.file.reset();
@@ -66,6 +74,7 @@ DataFile DataFiles::open(std::uint64_t number) {
         data.missing = true;
         return failed(tool::EP_ERR_OPEN_FAILED, ENOENT);
     }
+    data.state = stateOf(hostPath);
     data.file = std::make_unique<tool::ISCSIEPFileDAT>(hostPath);
     // Nothing is read yet: this finds out whether there can be extents at all.
     const int error = data.file->getExtentBytes(0, 1, 0, 0, nullptr);

@@ -11,6 +11,7 @@
 #include <string>
 
 #include "store/Context.h"
+#include "store/FileSize.h"
 
 namespace inspection {
 
@@ -22,6 +23,9 @@ struct DataFile {
     std::uint64_t held = 0;                             ///< how many of these lie here: of a collection fewer
     bool missing = false;                               ///< nothing lies there
     std::optional<Failure> failure;                     ///< without a part; `file` is then null
+
+    FileState state;         ///< of what lay there when it was opened
+    unsigned int looks = 0;  ///< how often DataFiles had been told to look again
 };
 
 /// The data files of one volume. Opens each of them when it is asked for, and keeps those that were, up to a limit.
@@ -34,6 +38,9 @@ public:
     /// The data file `number`. The reference holds until the next call.
     const DataFile& at(std::uint64_t number);
 
+    /// From now on what at() gives is as it lies there now, looked at once for each file.
+    void lookAgain() { ++looks_; }
+
     /// Lists the volume's folder, once: from then on a data file that it does not hold costs no look. False when that
     /// cannot be done, or when the path names no volume; error() then says why.
     bool list();
@@ -41,12 +48,14 @@ public:
 
 private:
     DataFile open(std::uint64_t number);
+    bool isAsOpened(const DataFile& data) const;
     bool isListedMissing(std::uint64_t number) const;
 
     Context& context_;
     std::string path_;
     bool remarks_;
     std::map<std::uint64_t, DataFile> files_;  ///< by number
+    unsigned int looks_ = 0;
     bool listTried_ = false;
     std::optional<std::set<std::uint64_t>> listed_;
     std::optional<Failure> listError_;

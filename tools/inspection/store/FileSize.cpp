@@ -18,4 +18,10 @@ std::optional<std::uint64_t> sizeOf(const std::string& path) {
     return static_cast<std::uint64_t>(end);
 }
 
+FileState stateOf(const std::string& path) {
+    struct stat status = {};
+    if (stat(path.c_str(), &status) != 0) return {};
+    return {status.st_dev, status.st_ino, static_cast<std::uint64_t>(status.st_size)};
+}
+
 }  // namespace inspection

@@ -6,11 +6,18 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <tuple>
 
 namespace inspection {
 
 /// Its bytes, or nothing when that cannot be told; errno then says why.
 std::optional<std::uint64_t> sizeOf(const std::string& path);
+
+/// What tells a file from another one, or from itself when it was longer or shorter: device, inode, size.
+using FileState = std::tuple<std::uint64_t, std::uint64_t, std::uint64_t>;
+
+/// The state of what lies at `path`; all zero when nothing does.
+FileState stateOf(const std::string& path);
 
 /// The bytes from the data start offset of `file`, whose HEAD[0] is decoded, to its end, if it has `size` bytes.
 inline std::uint64_t payloadOf(const ISCSI::TOOL::ISCSIEPFile& file, std::uint64_t size) {

@@ -13,19 +13,6 @@ namespace inspection {
 
 namespace {
 
-/// Returns 0 or the errno value.
-int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position) {
-    while (size > 0) {
-        const ssize_t written = pwrite(file, bytes, size, static_cast<off_t>(position));
-        if (written < 0 && errno == EINTR) continue;
-        if (written < 0) return errno;
-        bytes += written;
-        position += static_cast<std::uint64_t>(written);
-        size -= static_cast<std::size_t>(written);
-    }
-    return 0;
-}
-
 /// Where the next data starts from `position` on, at most `end`; `position` itself where the system cannot tell.
 std::uint64_t nextData(int file, std::uint64_t position, std::uint64_t end) {
     const off_t data = lseek(file, static_cast<off_t>(position), SEEK_DATA);
@@ -45,6 +32,18 @@ Descriptor::~Descriptor() { close(); }
 int Descriptor::close() {
     const int number = std::exchange(number_, -1);
     return number >= 0 && ::close(number) != 0 ? errno : 0;
+}
+
+int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position) {
+    while (size > 0) {
+        const ssize_t written = pwrite(file, bytes, size, static_cast<off_t>(position));
+        if (written < 0 && errno == EINTR) continue;
+        if (written < 0) return errno;
+        bytes += written;
+        position += static_cast<std::uint64_t>(written);
+        size -= static_cast<std::size_t>(written);
+    }
+    return 0;
 }
 
 int writeWhole(const std::string& path, const std::string& text) {

@@ -1,6 +1,7 @@
-// Files that are written here: of a collection, never of a store.
+// Files that are written here, never those of a store.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <string>
@@ -24,6 +25,9 @@ public:
 private:
     int number_;
 };
+
+/// Writes all of the bytes. Returns 0 or the errno value.
+int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position);
 
 /// Replaces the file at `path` by one that holds `text`, in one step. Returns 0 or the errno value of what failed.
 int writeWhole(const std::string& path, const std::string& text);

@@ -36,6 +36,10 @@ std::uint64_t LunMap::mappableSize() const {
     return std::min<std::uint64_t>(entries, sizeLimit / extentSize) * extentSize;
 }
 
+LunMap LunMap::copy() const {
+    return {lid, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, entries, size};
+}
+
 Subject LunMap::subject(const std::string& part) const {
     if (!lid) return {file, part};
     return {"", "LUN " + std::to_string(*lid) + (part.empty() ? "" : " ") + part};

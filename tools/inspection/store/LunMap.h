@@ -24,6 +24,9 @@ struct LunMap {
     /// How many bytes the entries stand for, at most 2^63.
     std::uint64_t mappableSize() const;
 
+    /// The same LUN, for another thread.
+    LunMap copy() const;
+
     /// How messages name a part of the LUN, "byte 5".
     Subject subject(const std::string& part) const;
 
