@@ -10,11 +10,13 @@
 #include <iostream>
 #include <new>
 #include <optional>
+#include <set>
 #include <stdexcept>
 #include <string>
 #include <system_error>
 
 #include "BrokenStore.h"
+#include "DiskStore.h"
 #include "SampleStore.h"
 #include "StoreFiles.h"
 
@@ -22,6 +24,7 @@ namespace {
 
 constexpr const char* help = R"(Usage: epsample [--map-entries N] DIR
        epsample --broken DIR
+       epsample --disk IMAGE DIR
 
 Writes a LUN store to try the tools on below DIR, a new or empty folder that
 stands for / of the target: journal, LUN list, and the files of two volumes,
@@ -30,6 +33,7 @@ the same at each run.
   --map-entries N   entries of the map file of LUN 1, 4096 if not given; each
                     is 1 MiB of the LUN
   --broken          write a store in which one thing of each kind is wrong
+  --disk IMAGE      write a store whose LUN 1 holds the bytes of the file IMAGE
   -h, --help        show this text
   -V, --version     show the version
 )";
@@ -38,11 +42,12 @@ struct WrongUsage : std::runtime_error {
     using std::runtime_error::runtime_error;
 };
 
-enum class Action { write, writeBroken, showHelp, showVersion };
+enum class Action { write, writeBroken, writeDisk, showHelp, showVersion };
 
 struct Wanted {
     Action action = Action::write;
     std::optional<std::uint64_t> mapEntries;
+    std::string image;
     std::string root;
 };
 
@@ -61,25 +66,28 @@ std::uint64_t parseEntries(const std::string& text) {
 /// Reads the command line; getopt_long() itself says which option is wrong.
 Wanted parse(int argc, char** argv) {
     static char program[] = "epsample";
-    static const option options[] = {{"map-entries", required_argument, nullptr, 'm'},
-                                     {"broken", no_argument, nullptr, 'b'},
-                                     {"help", no_argument, nullptr, 'h'},
-                                     {"version", no_argument, nullptr, 'V'},
-                                     {nullptr, 0, nullptr, 0}};
+    static const option options[] = {
+        {"map-entries", required_argument, nullptr, 'm'}, {"broken", no_argument, nullptr, 'b'},
+        {"disk", required_argument, nullptr, 'd'},        {"help", no_argument, nullptr, 'h'},
+        {"version", no_argument, nullptr, 'V'},           {nullptr, 0, nullptr, 0}};
     if (argc > 0) argv[0] = program;
     Wanted wanted;
+    std::set<std::string> chosen;
     for (int found = 0; (found = getopt_long(argc, argv, "hV", options, nullptr)) != -1;) {
-        if (found == 'h') return {Action::showHelp, {}, {}};
-        if (found == 'V') return {Action::showVersion, {}, {}};
-        if (found == 'b') wanted.action = Action::writeBroken;
+        if (found == 'h') return {Action::showHelp, {}, {}, {}};
+        if (found == 'V') return {Action::showVersion, {}, {}, {}};
+        if (found == 'b') chosen.insert("--broken");
+        if (found == 'd') chosen.insert("--disk");
+        if (found == 'd') wanted.image = optarg;
+        if (found == 'm') chosen.insert("--map-entries");
         if (found == 'm') wanted.mapEntries = parseEntries(optarg);
         if (found == '?') throw WrongUsage("");
     }
     if (optind >= argc || *argv[optind] == '\0') throw WrongUsage("DIR is missing");
     if (optind + 1 < argc) throw WrongUsage("'" + std::string(argv[optind + 1]) + "': only one DIR is possible");
-    if (wanted.action == Action::writeBroken && wanted.mapEntries) {
-        throw WrongUsage("--map-entries and --broken exclude each other");
-    }
+    if (chosen.size() > 1) throw WrongUsage(*chosen.rbegin() + " and " + *chosen.begin() + " exclude each other");
+    if (chosen.count("--broken") > 0) wanted.action = Action::writeBroken;
+    if (chosen.count("--disk") > 0) wanted.action = Action::writeDisk;
     wanted.root = argv[optind];
     return wanted;
 }
@@ -107,6 +115,8 @@ bool writeStore(const Wanted& wanted) {
     const bool written = succeeds([&wanted] {
         if (wanted.action == Action::writeBroken) {
             epsample::writeBrokenStore(wanted.root);
+        } else if (wanted.action == Action::writeDisk) {
+            epsample::writeDiskStore(wanted.root, wanted.image);
         } else {
             epsample::writeSampleStore(wanted.root, wanted.mapEntries.value_or(4096));
         }

@@ -6,26 +6,9 @@ namespace epinspect {
 
 namespace {
 
-AddressBits parseAddressBits(const std::string& text) {
-    const std::uint64_t bits = parseNumber(text);
-    if (bits == 48) return AddressBits::bits48;
-    if (bits == 52) return AddressBits::bits52;
-    throw UsageError{"not 48 or 52"};
-}
-
-CountFrom parseCountFrom(const std::string& text) {
-    if (text == "file") return CountFrom::file;
-    if (text == "volume") return CountFrom::volume;
-    throw UsageError{"not file or volume"};
-}
-
-LunName parseLunName(const std::string& text) {
-    const std::string prefix = text.substr(0, 2);
-    const bool number = prefix == "0x" || prefix == "0X" ||
-                        (!text.empty() && text.find_first_not_of("0123456789") == std::string::npos);
-    if (number) return {parseNumber32(text), ""};
-    return {std::nullopt, text};
-}
+AddressBits parseAddressBits(const std::string& text) { return meant(addressBitsIn(text)); }
+CountFrom parseCountFrom(const std::string& text) { return meant(countFromIn(text)); }
+LunName parseLunName(const std::string& text) { return meant(lunNameIn(text)); }
 
 }  // namespace
 

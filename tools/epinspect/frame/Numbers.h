@@ -1,13 +1,21 @@
-// Numbers on the command line: decimal or 0x, nothing before or after. Whatever is off is wrong usage.
+// Numbers on the command line. Whatever is wrong with one is wrong usage.
 #pragma once
 
 #include <cstdint>
 #include <string>
 
-#include "Range.h"
+#include "Typed.h"
 #include "frame/Inspection.h"
+#include "frame/UsageError.h"
 
 namespace epinspect {
+
+/// What was typed. Throws UsageError.
+template <typename Value>
+Value meant(const Typed<Value>& typed) {
+    if (typed.fault != nullptr) throw UsageError{typed.fault};
+    return typed.value;
+}
 
 /// A number of 64 bits. Like the others throws UsageError.
 std::uint64_t parseNumber(const std::string& text);
@@ -15,7 +23,7 @@ std::uint64_t parseNumber(const std::string& text);
 /// A number of 32 bits.
 std::uint32_t parseNumber32(const std::string& text);
 
-/// A number of bytes of 64 bits; K, M, G, T or KiB, MiB, GiB, TiB after it stands for a power of 1024.
+/// A number of bytes of 64 bits.
 std::uint64_t parseSize(const std::string& text);
 
 /// A number of bytes of 32 bits.

@@ -19,6 +19,27 @@ std::string named(const ExtentAddress& address) {
 
 }  // namespace
 
+Typed<std::uint32_t> extentSizeIn(std::string_view text) {
+    const auto size = sizeIn(text, most32Bits);
+    if (size.fault != nullptr) return size.fault;
+    if (size.value == 0) return "must not be 0";
+    return static_cast<std::uint32_t>(size.value);
+}
+
+Typed<AddressBits> addressBitsIn(std::string_view text) {
+    const auto bits = numberIn(text, most64Bits);
+    if (bits.fault != nullptr) return bits.fault;
+    if (bits.value == 48) return AddressBits::bits48;
+    if (bits.value == 52) return AddressBits::bits52;
+    return "not 48 or 52";
+}
+
+Typed<CountFrom> countFromIn(std::string_view text) {
+    if (text == "file") return CountFrom::file;
+    if (text == "volume") return CountFrom::volume;
+    return "not file or volume";
+}
+
 std::optional<std::uint64_t> extentAddressOf(const MapEntry& entry, const PlaceChoice& choice) {
     if (isAmbiguous(entry) && !choice.addressBits) return std::nullopt;
     return isAmbiguous(entry) ? readAs(entry, *choice.addressBits).extent : entry.extentAddress;

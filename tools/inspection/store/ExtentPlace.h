@@ -4,7 +4,9 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
 
+#include "Typed.h"
 #include "map/EntryBits.h"
 
 namespace inspection {
@@ -17,6 +19,11 @@ struct PlaceChoice {
     std::optional<AddressBits> addressBits;
     std::optional<CountFrom> countFrom;
 };
+
+/// What is typed of it: a size, 48 or 52, "file" or "volume".
+Typed<std::uint32_t> extentSizeIn(std::string_view text);
+Typed<AddressBits> addressBitsIn(std::string_view text);
+Typed<CountFrom> countFromIn(std::string_view text);
 
 /// The extent address of an entry; nothing when it is ambiguous, as ambiguousAddressText() says.
 std::optional<std::uint64_t> extentAddressOf(const MapEntry& entry, const PlaceChoice& choice);

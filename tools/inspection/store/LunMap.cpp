@@ -56,6 +56,16 @@ Failure LunMap::pastMap(const std::string& part) const {
             "past the end, the map's entries stand for " + std::to_string(mappableSize()) + " bytes"};
 }
 
+Typed<LunName> lunNameIn(const std::string& text) {
+    const std::string prefix = text.substr(0, 2);
+    const bool number = prefix == "0x" || prefix == "0X" ||
+                        (!text.empty() && text.find_first_not_of("0123456789") == std::string::npos);
+    if (!number) return LunName{std::nullopt, text};
+    const auto lid = numberIn(text, most32Bits);
+    if (lid.fault != nullptr) return lid.fault;
+    return LunName{static_cast<std::uint32_t>(lid.value), ""};
+}
+
 std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::optional<std::uint32_t> extentSize) {
     LunMap map;
     if (!findMap(context, lun, map)) return std::nullopt;

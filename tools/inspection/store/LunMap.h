@@ -8,6 +8,7 @@
 #include <optional>
 #include <string>
 
+#include "Typed.h"
 #include "store/Context.h"
 
 namespace inspection {
@@ -40,6 +41,9 @@ struct LunName {
     std::optional<std::uint32_t> lid;
     std::string file;
 };
+
+/// What is typed as such.
+Typed<LunName> lunNameIn(const std::string& text);
 
 /// Opens the map of a LUN. The extent size is that of the configuration unless one is given, which it must be for a LUN
 /// named by its map file. Reports what fails.
