@@ -18,5 +18,6 @@ as_root() {
 # shellcheck disable=SC2034
 {
   build_packages=(g++ cmake make nlohmann-json3-dev libgtest-dev libbenchmark-dev)
+  plugin_packages=(nbdkit nbdkit-plugin-dev pkg-config)
   test_packages=("${build_packages[@]}" pkg-config strace)
 }
