@@ -52,6 +52,7 @@ std::unique_ptr<Served> served;
 struct Connection {
     Connection() : lun(served->lun->copy()), bytes(context, lun, served->choice) {
         context.root = served->context.root;
+        context.collection = served->context.collection;
     }
 
     PluginContext context;
@@ -98,8 +99,10 @@ std::string absolute(const char* path) {
 }
 
 std::string takeRoot(const char* value) {
-    const std::error_code error = served->context.root.set(absolute(value));
-    return error ? error.message() : "";
+    const std::error_code error = served->context.setRoot(absolute(value));
+    if (error) return error.message();
+    const auto& damaged = served->context.damagedCollection;
+    return damaged ? messageOf(*damaged) : "";
 }
 
 std::string takeParameter(const std::string& key, const char* value) {
