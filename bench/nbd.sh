@@ -1,0 +1,40 @@
+#!/usr/bin/env bash
+# How fast a LUN of 2 GiB, all mapped and in the page cache, gets out: through the plugin against nbdkit's own file
+# plugin on the same bytes in one file, and by `read`, `read --output` and `dd` to files. The best of several runs in
+# turn. bench/nbd.sh [BUILD_DIR [OTHER_EPINSPECT]]; the latter is measured too, an older version say. Takes 4 GiB of disk, and 2 GiB of memory for the image.
+set -euo pipefail
+build=$(realpath "${1:-build/release}") other=${2:+$(realpath "$2")}
+scratch=$(mktemp -d "${TMPDIR:-/var/tmp}/epnbdXXXXXX")
+image=$(mktemp -u /dev/shm/epnbdXXXXXX)
+trap 'rm -rf "$scratch" "$image"' EXIT
+cd "$scratch"
+head -c 2G /dev/urandom >disk
+"$build/bin/epsample" --disk disk store
+cat disk store/volume1/@iSCSI/EP/EP_DAT_* >/dev/null
+
+declare -A best
+run() { # NAME COMMAND...
+  local name=$1 start end
+  shift
+  rm -f "$image"
+  start=$(date +%s%N)
+  "$@" >/dev/null
+  end=$(date +%s%N)
+  local took=$(((end - start) / 1000))
+  [ "${best[$name]:-$took}" -lt "$took" ] || best[$name]=$took
+}
+nbdcopied() { nbdkit -U - "$@" --run 'nbdcopy --connections=4 "$uri" null:'; } # shellcheck disable=SC2016
+written() { "$@" >"$image"; }
+for _ in {1..7}; do
+  run "file plugin" nbdcopied file disk
+  run "ep plugin" nbdcopied "$build/lib/nbdkit-ep-plugin.so" 1 root=store
+  run "read > image" written "$build/bin/epinspect" --root store read 1
+  run "read --output image" "$build/bin/epinspect" --root store read 1 --output "$image"
+  run "dd bs=1M > image" written dd if=disk bs=1M status=none
+  [ -z "$other" ] || run "other read > image" written "$other" --root store read 1
+done
+cmp "$image" disk
+for name in "${!best[@]}"; do
+  printf '%-22s %8d ms %8d MiB/s\n' "$name" $((best[$name] / 1000)) $((2048 * 1000000 / best[$name]))
+done | sort
+printf 'ep plugin against file plugin: %d %% of the speed\n' $((100 * best["file plugin"] / best["ep plugin"]))
