@@ -61,7 +61,8 @@ const Case cases[] = {
      table1 + ": kind: type 9, the table file /volume2/@iSCSI/EP/EP_TBL has 1\n"
      "11 files, 4352 entries, 1 finding: 1 kind\n" + uncompared + table1 + "\n"
      R"(stored":9,"found":1,"otherFile)" "\n" R"(rules":{"kind":1)" "\n", ""},
-    {"a name of four digits", "cd own/volume2/@iSCSI/EP; mv EP_DAT_00000 EP_DAT_0000; epinspect --root ../../.. check", 3,
+    {"a name of four digits",
+     "cd own/volume2/@iSCSI/EP; mv EP_DAT_00000 EP_DAT_0000; epinspect --root ../../.. check", 3,
      lun2 + ": LUN 2: missing-data-file: 128 entries in 2 runs, first entries 0-63: extent 16 and others, but there is "
      "no EP_DAT_00000\n10 files, …\nNot compared: serial-number: not a name that the target gives to a data file: "
      "/volume2/@iSCSI/EP/EP_DAT_0000\n", ""},
@@ -81,7 +82,7 @@ TEST_F(Losses, AreNamedWhateverHappensToAFile) {
     };
     const Fault faults[] = {
         {"missing", ":", 3},
-        {"unreadable", "cp --sparse=always $F.whole $F; chmod 0 $F", 1},
+        {"unreadable", "ln .whole $F; chmod 0 $F", 1},
         {"empty", "> $F", 1},
         {"a folder", "mkdir $F", 1},
         {"a dead link", "ln -s x $F", 3},
@@ -104,10 +105,10 @@ TEST_F(Losses, AreNamedWhateverHappensToAFile) {
                 std::cout << "not tried, no other user can run the program: " << file << ' ' << fault.name << '\n';
                 continue;
             }
-            const std::string command =
-                "F=own" + file + " O=own" + other + "; mv $F $F.whole; " + fault.command + "; mv $F.whole .whole; " +
-                (asUser ? asUser_ : "") +
-                "epinspect --root own check 2>&1; status=$?; rm -rf $F; mv .whole $F; exit $status";
+            const std::string command = "F=own" + file + " O=own" + other + "; mv $F .whole; " + fault.command + "; " +
+                                        (asUser ? asUser_ : "") +
+                                        "epinspect --root own check 2>&1; status=$?; "
+                                        "rm -rf $F; mv .whole $F; chmod 644 $F; exit $status";
             const bool isLostData = fault.command == ":" && file.find("EP_DAT") != std::string::npos;
             const std::string named = isLostData ? "there is no " + file.substr(file.rfind('/') + 1) : file + ": ";
             SCOPED_TRACE(file + " " + fault.name);
