@@ -9,14 +9,14 @@
 #include <sstream>
 #include <thread>
 
-#include "frame/CommandLine.h"
 #include "InProcess.h"
+#include "ProgramTest.h"
+#include "commands/MapChart.h"
+#include "frame/CommandLine.h"
 #include "frame/Numbers.h"
 #include "frame/Output.h"
-#include "ProgramTest.h"
 #include "frame/Progress.h"
 #include "frame/Session.h"
-#include "commands/MapChart.h"
 #include "map/MapRuns.h"
 
 using namespace epinspect;

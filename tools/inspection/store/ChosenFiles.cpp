@@ -31,6 +31,7 @@ void ChosenFiles::forEach(const std::function<void(const StoreFile&)>& each) {
         file.path = name;
         file.hostPath = *path;
         file.size = context_.sizeOf(*path).value_or(0);
+        file.identity = identityOf(*path);
         file.volume = volumeOf(context_, targetPath);
         file.lun = lunOf(targetPath);
         each(file);

@@ -104,6 +104,7 @@ std::optional<StoreFile> Store::fileAt(const std::string& path) {
         return std::nullopt;
     }
     file.size = size.value_or(0);
+    file.identity = identityOf(file.hostPath);
     file.volume = volumeOf(context_, path);
     if (lun == lunsByMap_.end()) {
         if (file.kind->type == tool::EP_FILE_TYPE_MAP) file.mapName = mapNameIn(fs::path(path).filename().string());

@@ -14,6 +14,7 @@
 
 #include "Range.h"
 #include "store/Context.h"
+#include "store/FileIdentity.h"
 #include "store/FileKind.h"
 #include "store/FileNames.h"
 #include "store/Luns.h"
@@ -25,14 +26,15 @@ std::uint32_t volumeOf(Context& context, const std::string& path);
 
 /// A file of the store.
 struct StoreFile {
-    const FileKind* kind = nullptr;  ///< what its name tells; never null
+    const FileKind* kind = nullptr;  ///< what its name tells; null where it tells none, as a file named by the user may
     std::string path;                ///< on the target
     std::string hostPath;            ///< where it is to be opened here
     std::uint64_t size = 0;
-    bool missing = false;            ///< nothing is there, though a LUN should have it or a link leads there
-    std::uint32_t volume = 0;        ///< 0: on no volume
-    const Lun* lun = nullptr;        ///< of a map file, where the configuration knows the LUN
-    std::optional<MapName> mapName;  ///< of a map file, where the parts of its name are known
+    std::optional<FileIdentity> identity;  ///< nothing where it is missing
+    bool missing = false;                  ///< nothing is there, though a LUN should have it or a link leads there
+    std::uint32_t volume = 0;              ///< 0: on no volume
+    const Lun* lun = nullptr;              ///< of a map file, where the configuration knows the LUN
+    std::optional<MapName> mapName;        ///< of a map file, where the parts of its name are known
 };
 
 /// The store below the root folder.
