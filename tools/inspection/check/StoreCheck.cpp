@@ -26,7 +26,7 @@ void StoreCheck::run() {
 }
 
 void StoreCheck::checkFile(const StoreFile& file) {
-    checked_.insert(context_.root.targetPath(file.path));
+    checked_.insert(file.targetPath);
     if (file.missing) return checkMissing(file);
     const FileKind* kind = file.kind != nullptr ? file.kind : &headKind;
     auto content = kind->make(file.hostPath);
@@ -63,7 +63,7 @@ void StoreCheck::checkContent(const StoreFile& file, const FileKind& kind, tool:
     } else if (data != nullptr) {
         checkSerialNumber(file, *data, report_);
     } else {
-        tables_[context_.root.targetPath(file.path)] = table->extentSize;
+        tables_[file.targetPath] = table->extentSize;
     }
 }
 
@@ -75,8 +75,7 @@ void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) 
     }
     unsigned long long entries = 0;
     if (!context_.succeeded(content.getEntryCount(entries), {file.path, ""})) return;
-    const std::string targetPath = context_.root.targetPath(file.path);
-    const std::string folder = targetPath.substr(0, targetPath.rfind('/'));
+    const std::string folder = file.targetPath.substr(0, file.targetPath.rfind('/'));
     if (file.volume == 0) foldersWithoutVolume_.insert(folder);
     sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file.path);
     MapRules rules(file, content, report_);
@@ -112,8 +111,7 @@ void StoreCheck::useDataFiles(const StoreFile& file, MapRules& rules) {
     if (!extentSize) return giveUp("the extent size is not known, give --extent-size");
     if (*extentSize == 0) return giveUp("the extent size is 0");
     if (file.volume == 0) return giveUp("the path names no volume");
-    const std::string path = context_.root.targetPath(file.path);
-    const auto [volume, added] = dataFiles_.try_emplace(file.volume, context_, path, false);
+    const auto [volume, added] = dataFiles_.try_emplace(file.volume, context_, file.targetPath, false);
     DataFiles& dataFiles = volume->second;
     if (!dataFiles.list()) {
         if (added && files_.areNamed() && dataFiles.error()) context_.failed(*dataFiles.error());
@@ -127,7 +125,9 @@ void StoreCheck::checkExtentSizes() {
     for (const Lun& lun : files_.luns()) {
         std::string table;
         const bool onVolume = tool::ISCSIEPFile(lun.mapPath).getTBLFilePath(table) == 0;
-        if (files_.areNamed() && checked_.count(plainPath(lun.mapPath)) == 0 && checked_.count(table) == 0) continue;
+        if (files_.areNamed() && checked_.count(context_.root.plainPath(lun.mapPath)) == 0 &&
+            checked_.count(table) == 0)
+            continue;
         const auto extentSize = onVolume ? tableExtentSize(table) : std::nullopt;
         if (extentSize) {
             checkExtentSize(table, *extentSize, lun, report_);
@@ -143,7 +143,7 @@ void StoreCheck::checkExtentSizes() {
 std::optional<std::uint32_t> StoreCheck::tableExtentSize(const std::string& path) {
     const auto [row, added] = tables_.try_emplace(path);
     if (!added || !files_.areNamed() || checked_.count(path) > 0) return row->second;
-    const std::optional<std::string> hostPath = context_.openablePath(path);
+    const std::optional<std::string> hostPath = context_.openablePath(path, NamedBy::target);
     if (!hostPath || (!context_.sizeOf(*hostPath) && errno == ENOENT)) return std::nullopt;
     tool::ISCSIEPFileTBL table(*hostPath);
     if (context_.succeeded(table.parseFile(), {path, ""})) row->second = table.extentSize;

@@ -16,6 +16,7 @@ struct FileIdentity {
     friend bool operator==(const FileIdentity& one, const FileIdentity& other) {
         return one.device == other.device && one.inode == other.inode;
     }
+    friend bool operator!=(const FileIdentity& one, const FileIdentity& other) { return !(one == other); }
     friend bool operator<(const FileIdentity& one, const FileIdentity& other) {
         return std::tie(one.device, one.inode) < std::tie(other.device, other.inode);
     }

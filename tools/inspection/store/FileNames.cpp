@@ -5,7 +5,6 @@
 
 #include <cctype>
 #include <charconv>
-#include <filesystem>
 #include <system_error>
 
 namespace inspection {
@@ -50,6 +49,12 @@ std::string dataFileName(std::uint64_t number) {
     return std::string(lastName(path));
 }
 
+bool isMisnamed(std::string_view path) {
+    if (!isDataFileName(path)) return false;
+    const auto number = dataFileNumberIn(path);
+    return !number || lastName(path) != dataFileName(*number);
+}
+
 std::optional<MapName> mapNameIn(std::string_view fileName) {
     static constexpr std::string_view end = "_00000";
     const auto dash = fileName.find('-');  // no type name holds one: it is the UUID's
@@ -69,7 +74,5 @@ std::uint32_t volumeIn(std::string_view name) {
     const bool plain = !digits.empty() && digits[0] >= '1' && digits[0] <= '9';
     return plain ? static_cast<std::uint32_t>(numberIn<std::int32_t>(digits).value_or(0)) : 0;
 }
-
-std::string plainPath(const std::string& path) { return std::filesystem::path("/" + path).lexically_normal().string(); }
 
 }  // namespace inspection

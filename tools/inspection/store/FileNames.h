@@ -14,6 +14,9 @@ inline std::string_view lastName(std::string_view path) { return path.substr(pat
 /// Whether a path ends in the name of a data file, whatever follows its prefix.
 bool isDataFileName(std::string_view path);
 
+/// Whether that name is none that the target gives to a data file: the number in it has another form.
+bool isMisnamed(std::string_view path);
+
 /// The number in the name of a data file, without or with folders; nothing where there is none.
 std::optional<std::uint64_t> dataFileNumberIn(std::string_view path);
 
@@ -33,8 +36,5 @@ std::optional<MapName> mapNameIn(std::string_view fileName);
 
 /// The number in the name of a volume's folder, 0 when it is not "volume" and a number in plain form.
 std::uint32_t volumeIn(std::string_view name);
-
-/// The path of the target as the folders lead there: absolute, without doubled slashes and dots.
-std::string plainPath(const std::string& path);
 
 }  // namespace inspection

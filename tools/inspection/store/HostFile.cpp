@@ -40,13 +40,6 @@ std::uint64_t nextHole(int file, std::uint64_t position, std::uint64_t end) {
 
 }  // namespace
 
-Descriptor::~Descriptor() { close(); }
-
-int Descriptor::close() {
-    const int number = std::exchange(number_, -1);
-    return number >= 0 && ::close(number) != 0 ? errno : 0;
-}
-
 int writeWhole(const std::string& path, const std::string& text) {
     const std::string fresh = path + ".new";
     Descriptor file(open(fresh.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666));

@@ -5,25 +5,9 @@
 #include <functional>
 #include <string>
 
+#include "store/Descriptor.h"
+
 namespace inspection {
-
-/// A file descriptor that is closed at its end; -1: none.
-class Descriptor {
-public:
-    explicit Descriptor(int number) : number_(number) {}
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-    ~Descriptor();
-
-    int number() const { return number_; }
-    bool isOpen() const { return number_ >= 0; }
-
-    /// Closes it now. Returns 0 or the errno value.
-    int close();
-
-private:
-    int number_;
-};
 
 /// Replaces the file at `path` by one that holds `text`, in one step. Returns 0 or the errno value of what failed.
 int writeWhole(const std::string& path, const std::string& text);

@@ -16,7 +16,7 @@ struct OpenedMap {
     std::uint64_t entries = 0;                          ///< how many the file holds
 };
 
-/// Opens the map file that the user called `name` and says what is doubtful about it. Reports failures.
-OpenedMap openMap(Context& context, const std::string& name);
+/// Opens the map file that messages call `name` and says what is doubtful about it. Reports failures.
+OpenedMap openMap(Context& context, const std::string& name, NamedBy by);
 
 }  // namespace inspection
