@@ -74,7 +74,7 @@ protected:
 
     /// What makes the shell do `command` in the test's folder, whatever the environment of the tests is.
     std::string script(const std::string& command) const {
-        return "unset KELPISCSIEP_LUNS; export TZ=UTC LC_ALL=C PATH='" PROGRAMS "':\"$PATH\"; cd '" + path("") +
+        return "unset KELPISCSIEP_LUNS COLUMNS; export TZ=UTC LC_ALL=C PATH='" PROGRAMS "':\"$PATH\"; cd '" + path("") +
                "'; {\n" + command + "\n}";
     }
 

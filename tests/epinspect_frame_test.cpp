@@ -101,6 +101,7 @@ const Case cases[] = {
     usage("map -- x --y", "unexpected argument: '--y'", " map"),
     usage("map x --chart --json", "--chart excludes --json", " map"),
     usage("dump --as foo x", "--as: 'foo': not one of tbl, dat, fri, jnl, map, head", " dump"),
+    usage("dump x ''", "FILE: '': must not be empty", " dump"),
     usage("entry x -1", "INDEX: '-1': not a number, nor FIRST-LAST", " entry"),
     usage("lun 9-8", "LID: '9-8': range runs backwards", " lun"),
     usage("locate 1 5X", "OFFSET: '5X': not a size; K, M, G, T, KiB, MiB, GiB or TiB may follow a number", " locate"),

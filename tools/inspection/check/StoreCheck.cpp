@@ -77,12 +77,13 @@ void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) 
     if (!context_.succeeded(content.getEntryCount(entries), {file.path, ""})) return;
     const std::string folder = file.targetPath.substr(0, file.targetPath.rfind('/'));
     if (file.volume == 0) foldersWithoutVolume_.insert(folder);
-    sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file.path);
+    const bool isOwner = file.sameAs.empty();  // under another name it has been counted
+    if (isOwner) sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file.path);
     MapRules rules(file, content, report_);
     useDataFiles(file, rules);
     const auto each = [&](const MapRun& run) {
         rules.add(run);
-        sharedExtents_.add(run);
+        if (isOwner) sharedExtents_.add(run);
     };
     std::optional<Failure> failure;
     if (entries > 0) {

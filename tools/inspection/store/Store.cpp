@@ -19,10 +19,12 @@ namespace {
 constexpr std::uint64_t journalPlace = 0;
 constexpr std::uint64_t noVolumePlace = std::numeric_limits<std::uint64_t>::max();
 
-/// The order of files in a folder: the table first, data files last and by number, the others by name.
+/// The order of files in a folder: the table first, data files last and by number, what is only called like them behind
+/// them, the others by name.
 bool precedes(const std::string& one, const std::string& other) {
     const auto rank = [](const std::string& name) -> std::size_t {
         if (name == tool::EP_TBL_FILE_NAME) return 0;
+        if (isMisnamed(name)) return std::numeric_limits<std::size_t>::max();
         return isDataFileName(name) ? name.size() : 1;
     };
     return std::pair(rank(one), std::string_view(one)) < std::pair(rank(other), std::string_view(other));

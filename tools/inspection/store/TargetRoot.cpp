@@ -107,7 +107,8 @@ std::string TargetRoot::plain(const std::string& path, bool* climbs) const {
             result.erase(result.rfind('/'));
         }
     }
-    return result.empty() ? "/" : result;
+    if (result.empty() || path.back() == '/') result += '/';  // which only a folder has at its end
+    return result;
 }
 
 Located TargetRoot::locate(const std::string& path) const {
