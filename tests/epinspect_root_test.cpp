@@ -32,6 +32,7 @@ const std::string tables =
 const std::string openFailed = " (EP_ERR_OPEN_FAILED, 18990038)";
 const std::string denied = ": cannot be opened: Permission denied" + openFailed;
 const std::string leadsOut = ": cannot be opened: a link leads out of the folder of --root" + openFailed;
+const std::string tooMany = ": cannot be opened: Too many levels of symbolic links" + openFailed;
 const std::string noList =
     "LUN 3: configuration cannot be loaded: The LUN list is missing or cannot be read (code 9002)";
 const std::string ep = "/volume1/@iSCSI/EP/", table = ep + "EP_TBL", map = "/volume1/@iSCSI/LUN/THINun_00000";
@@ -57,21 +58,23 @@ const Case cases[] = {
      in + in + in + in + in + in + in + in + in + in + in + table + "\n", ""},
     {"links that lead out are refused in every component", tables + "ln -s ../out r/folder; ln -s ../out" + table +
      " r/file; ln -s file r/chain; ln -s ../../out r/volume1/up; mkdir -p r/volume2 r/var; "
-     "ln -s ../../out/volume1/@iSCSI r/volume2/@iSCSI; ln -s ../../out/volume1 r/var/db; "
+     "ln -s ../../out/volume1/@iSCSI r/volume2/@iSCSI; ln -s ../../out/volume1 r/var/db; ln -s gone r/volume3; "
      "t folder" + table + " file chain volume1/up" + table + " r/folder/../r" + table + "; "
      "for c in 'extent --raw file 0 --extent-size 1' 'list --luns 3'; do epinspect --root r $c; done", 1,
      refused + refused + refused + refused + refused + listed,
      says({"folder" + table + leadsOut, "file" + leadsOut, "chain" + leadsOut, "volume1/up" + table + leadsOut,
            "r/folder/../r" + table + leadsOut, "file" + leadsOut, "/var/db/iscsi/luns.json" + leadsOut, noList,
-           "/var/db/iscsi" + leadsOut, "/volume2/@iSCSI/EP" + leadsOut, "/volume2/@iSCSI/LUN" + leadsOut})},
+           "/var/db/iscsi" + leadsOut, "/volume2/@iSCSI/EP" + leadsOut, "/volume2/@iSCSI/LUN" + leadsOut,
+           "/volume3/@iSCSI/EP" + missing, "/volume3/@iSCSI/LUN" + missing})},
     {"links are followed however long the way is", tables + deep + "mkdir -p r/var/db; "
      "ln -s b/b/out/volume1 r/volume2; ln -s /b/b/out/volume1/@iSCSI r/var/db/iscsi; t b/b/in/@iSCSI/EP/EP_TBL "
      "b/b/out" + table + "; epinspect --root r list --luns 3; s=$?; rm -r r; exit $s", 1, in + refused + listed,
      says({"b/b/out" + table + leadsOut, "/var/db/iscsi/luns.json" + leadsOut, noList, "/var/db/iscsi" + leadsOut,
            "/volume2/@iSCSI/EP" + leadsOut, "/volume2/@iSCSI/LUN" + leadsOut})},
-    {"no more links are followed than by the system", tables + "ln -s ." + table + " r/1; for i in $(seq 40); do "
-     "ln -s $i r/$((i + 1)); done; t --as tbl 40 41", 0, in + refused,
-     says({"41: cannot be opened: Too many levels of symbolic links" + openFailed})},
+    {"no more links are followed than by the system", tables + lun + "ln -s ." + table + " r/1; for i in $(seq 40); do "
+     "ln -s $i r/$((i + 1)); done; t --as tbl 40 41; lun /volume1; mv r/var/db/iscsi/luns.json .; ln -sf ../luns.json "
+     "r/1; ln -s /41 r/var/db/iscsi/luns.json; epinspect --root r lun 3", 1, in + refused,
+     says({"41" + tooMany, "/var/db/iscsi/luns.json" + tooMany, noList})},
     {"a path of the target is none that the user typed", lun + "lun \"$PWD/r\"; m=$PWD/r/@iSCSI/LUN; "
      "mkdir -p r/@iSCSI \"r$m\"; cp map \"r$m/THINun_00000\"; for c in list 'find --pool 0' 'read 3'; do "
      "epinspect --root r $c; done | grep -ac 'LUN 3'", 0, "2\n",
