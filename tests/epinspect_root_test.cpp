@@ -60,12 +60,14 @@ const Case cases[] = {
      " r/file; ln -s file r/chain; ln -s ../../out r/volume1/up; mkdir -p r/volume2 r/var; "
      "ln -s ../../out/volume1/@iSCSI r/volume2/@iSCSI; ln -s ../../out/volume1 r/var/db; ln -s gone r/volume3; "
      "t folder" + table + " file chain volume1/up" + table + " r/folder/../r" + table + "; "
-     "for c in 'extent --raw file 0 --extent-size 1' 'list --luns 3'; do epinspect --root r $c; done", 1,
+     "T='epinspect --root r'; $T extent --raw file 0 --extent-size 1; $T list --luns 3; ln -s ../map r/collection.json; "
+     "$T lun 3; epinspect diff r r >r/none", 1,
      refused + refused + refused + refused + refused + listed,
      says({"folder" + table + leadsOut, "file" + leadsOut, "chain" + leadsOut, "volume1/up" + table + leadsOut,
            "r/folder/../r" + table + leadsOut, "file" + leadsOut, "/var/db/iscsi/luns.json" + leadsOut, noList,
            "/var/db/iscsi" + leadsOut, "/volume2/@iSCSI/EP" + leadsOut, "/volume2/@iSCSI/LUN" + leadsOut,
-           "/volume3/@iSCSI/EP" + missing, "/volume3/@iSCSI/LUN" + missing})},
+           "/volume3/@iSCSI/EP" + missing, "/volume3/@iSCSI/LUN" + missing, "r/collection.json" + leadsOut,
+           "r/collection.json" + leadsOut}) + "…"},
     {"links are followed however long the way is", tables + deep + "mkdir -p r/var/db; "
      "ln -s b/b/out/volume1 r/volume2; ln -s /b/b/out/volume1/@iSCSI r/var/db/iscsi; t b/b/in/@iSCSI/EP/EP_TBL "
      "b/b/out" + table + "; epinspect --root r list --luns 3; s=$?; rm -r r; exit $s", 1, in + refused + listed,

@@ -23,6 +23,7 @@ public:
     SideOfDiff(Session& session, const std::string& folder) : session_(session), folder_(folder) {
         const std::error_code error = setRoot(folder);
         if (error) throw UsageError{"'" + folder + "': " + error.message()};
+        if (damagedCollection) session.failed(*damagedCollection);
         while (folder_.size() > 1 && folder_.back() == '/') folder_.pop_back();
     }
 

@@ -15,7 +15,10 @@ namespace tool = ISCSI::TOOL;
 std::error_code Context::setRoot(const std::string& folder) {
     const std::error_code error = root.set(folder);
     if (error) return error;
-    auto found = Collection::read(folder);
+    const Located list = root.locate(std::string("/") + Collection::listName);
+    damagedCollection = list.obstacleToFile(folder + "/" + Collection::listName);
+    if (!list.isThere() || damagedCollection) return {};
+    auto found = Collection::read(folder, list.hostPath);
     if (auto* made = std::get_if<Collection>(&found)) collection = std::move(*made);
     if (auto* failure = std::get_if<Failure>(&found)) damagedCollection = std::move(*failure);
     return {};
