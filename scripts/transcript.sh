@@ -5,6 +5,7 @@
 # then follows what it prints. All commands of a document run in one shell, in a new folder, with the time zone UTC.
 set -euo pipefail
 export TZ=UTC LC_ALL=C.UTF-8
+unset COLUMNS
 scratch=$(mktemp -d)
 trap 'rm -rf "$scratch"' EXIT
 

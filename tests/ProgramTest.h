@@ -74,7 +74,7 @@ protected:
     /// What makes the shell do `command` in the test's folder. There `large` lifts the limit of a file's size, as
     /// epsample needs it for its sparse files.
     std::string script(const std::string& command) const {
-        return "PATH='" PROGRAMS
+        return "unset COLUMNS; PATH='" PROGRAMS
                "':\"$PATH\"; large() { (ulimit -S -f unlimited; \"$@\"); }; "
                "epsample() { large command epsample \"$@\"; }; cd '" +
                path("") + "'; {\n" + command + "\n}";

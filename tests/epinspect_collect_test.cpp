@@ -75,7 +75,7 @@ const Case cases[] = {
      "epinspect collect s/volume1/@iSCSI/EP", 1, "1\n1\n1\n1\n2\nvar\nvolume1\nvolume2\n",
      "epinspect: full: is not empty, and nothing is overwritten; name a new folder or an empty one\n"
      "epinspect: file: is not a folder\nepinspect: own/c: lies inside the store, which is never written\n"
-     "epinspect: own: is not empty, …\nepinspect: FOLDER: '' names none. Try 'epinspect collect --help'.\n"
+     "epinspect: own: is not empty, …\nepinspect: FOLDER: '': must not be empty. Try 'epinspect collect --help'.\n"
      "epinspect: s/volume1/@iSCSI/EP: lies inside the store, which is never written\n"},
     {"says that a collection is incomplete", "(ulimit -f 20; epinspect --root own collect c); echo $?; "
      "epinspect --root c list | grep -c EP_; rm -r c; rm own" + table2 + "; mkdir own" + table2 + "; "

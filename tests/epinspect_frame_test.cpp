@@ -84,8 +84,7 @@ const Case cases[] = {
      "store/var/db/iscsi/EP_JNL ./store//var/../var/db/iscsi/EP_JNL \"$PWD/store/var/db/iscsi/EP_JNL\"; "
      "do epinspect --root=./store// dump --json \"$f\"; done | grep -c '\"kind\":\"jnl\"'", 0, "5\n", ""},
     {"looks for the LUN list below root only", "mkdir -p r/var/db/iscsi; ln -s ../../../../luns.json r/var/db/iscsi; "
-     "epinspect --root r/ lun 7 8", 1, "",
-     says({"r/var/db/iscsi/luns.json: not used: a link leads out of the folder of --root",
+     "epinspect --root r/ lun 7 8", 1, "", says({"/var/db/iscsi/luns.json" + leadsOut,
            "LUN 7" + noLun + "The LUN list is missing or cannot be read (code 9002)", "LUN 8…"})},
     {"refuses links out of root", "mkdir r; cp data r/EP_DAT_1; ln -s EP_DAT_1 r/EP_DAT_2; ln -s ../data r/out; "
      "ln -s out r/in; cp data r2; ln -s ../r2 r/beside; epinspect --root r dump --json EP_DAT_1 EP_DAT_2 out in beside",
@@ -103,6 +102,7 @@ const Case cases[] = {
     usage("map -- x --y", "unexpected argument: '--y'", " map"),
     usage("map x --chart --json", "--chart excludes --json", " map"),
     usage("dump --as foo x", "--as: 'foo': not one of tbl, dat, fri, jnl, map, head", " dump"),
+    usage("dump x ''", "FILE: '': must not be empty", " dump"),
     usage("entry x -1", "INDEX: '-1': not a number, nor FIRST-LAST", " entry"),
     usage("lun 9-8", "LID: '9-8': range runs backwards", " lun"),
     usage("locate 1 5X", "OFFSET: '5X': not a size; K, M, G, T, KiB, MiB, GiB or TiB may follow a number", " locate"),

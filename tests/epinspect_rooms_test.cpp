@@ -1,9 +1,12 @@
 // Parts of epinspect on their own: numbers, the system log, progress, memory that runs out, characters that deceive.
+#include <fcntl.h>
+
 #include <clocale>
 #include <cstdarg>
 #include <cstdlib>
 #include <map>
 #include <new>
+#include <stdexcept>
 #include <thread>
 
 #include "InProcess.h"
@@ -18,8 +21,8 @@ using namespace epinspect;
 
 namespace {
 
-std::string forwarded;   ///< what went to the system log
-bool haveMemory = true;  ///< operator new fails otherwise
+std::string forwarded;                  ///< what went to the system log
+std::uint64_t memoryLeft = UINT64_MAX;  ///< how often operator new does not fail yet
 
 }  // namespace
 
@@ -38,8 +41,9 @@ extern "C" [[gnu::visibility("default"), gnu::format(printf, 3, 0)]] void __vsys
 extern "C" void syslog(int priority, const char* format, ...);
 
 [[gnu::noinline]] void* operator new(std::size_t size) {
-    if (void* memory = haveMemory ? std::malloc(size) : nullptr) return memory;
-    throw std::bad_alloc();
+    if (memoryLeft == 0) throw std::bad_alloc();
+    --memoryLeft;
+    return std::malloc(size);
 }
 [[gnu::noinline]] void operator delete(void* memory) noexcept { std::free(memory); }
 [[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept { std::free(memory); }
@@ -89,8 +93,40 @@ TEST(Progress, TellsHowFarAndHowLongAndIsGoneAtTheEnd) {
 }
 
 TEST(Program, SaysThatMemoryRanOut) {
-    const auto work = [] { _exit(runHere({"epinspect"}, [] { haveMemory = false; })); };
+    const auto work = [] { _exit(runHere({"epinspect"}, [] { memoryLeft = 0; })); };
     EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, work).shown());
+}
+
+/// What a run ends with in which memory lasts for so many pieces, and none for the next one.
+int statusOfList(const char* root, std::uint64_t pieces) {
+    const pid_t child = fork();
+    if (child == 0) {
+        dup2(open("/dev/null", O_WRONLY), STDOUT_FILENO);
+        dup2(STDOUT_FILENO, STDERR_FILENO);
+        _exit(runHere({"epinspect", "--root", root, "list", "--luns", "1-2"}, [pieces] { memoryLeft = pieces; }));
+    }
+    int status = 0;
+    EXPECT_EQ(child, waitpid(child, &status, 0));
+    return exitStatus(status);
+}
+
+using ProgramOnStore = ProgramTest;
+
+TEST_F(ProgramOnStore, EndsInOrderWhereverMemoryRunsOut) {
+    const std::string root = path("store");
+    unsetenv("KELPISCSIEP_LUNS");
+    std::uint64_t pieces = 0;
+    int status = 1;
+    for (; status == 1; ++pieces) status = statusOfList(root.c_str(), pieces);
+    EXPECT_EQ(0, status) << pieces;
+    EXPECT_GT(pieces, 300U);
+}
+
+TEST(CommandLine, TakesNoShortOptionWithAValue) {
+    std::uint64_t value = 0;
+    for (const char* name : {"-f", "-f, --first", "--first, -f"}) {
+        EXPECT_THROW(Command("", "").option(name, "N", "", value, parseNumber), std::logic_error) << name;
+    }
 }
 
 TEST(Output, EscapesPrintableCharactersThatAreInvisibleOrTurnTheDirection) {

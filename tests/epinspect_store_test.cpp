@@ -107,9 +107,9 @@ const Case cases[] = {
      R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-b" + same + "\n",
      "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read (code 9002)\n"},
     {"list says what may not be opened", "rm far/var/db/iscsi/*; cd far/volume91/@iSCSI; mv EP LUN/folder; "
-     "ln -s /usr EP; rm LUN/THIN*; mkfifo LUN/pipe; ln -s none LUN/link; ln -s self LUN/self; "
+     "ln -s ../../../usr EP; rm LUN/THIN*; mkfifo LUN/pipe; ln -s none LUN/link; ln -s self LUN/self; "
      "epinspect --root ../.. list --luns 7; epinspect --root LUN/folder list", 1,
-     "map       missing  " + maps + "link\n",
+     "map       missing  " + maps + "link  link to none\n",
      "epinspect: LUN 7: configuration cannot be loaded: The LUN list is missing or cannot be read (code 9002)\n"
      "epinspect: /volume91/@iSCSI/EP: cannot be opened: a link leads out of the folder of --root" + openFailed +
      "epinspect: " + maps + "pipe: cannot be opened: neither a regular file nor a block device (…)\n"

@@ -53,7 +53,6 @@ bool makeFolder(Session& session, const std::string& name) {
 }
 
 void run(const CollectOptions& options, Session& session) {
-    if (options.folder.empty()) throw UsageError{"FOLDER: '' names none"};
     if (!makeFolder(session, options.folder)) return;
     holdInterruptions();
     Collector collector(session, options.folder, std::string("epinspect ") + EPINSPECT_VERSION, std::time(nullptr));

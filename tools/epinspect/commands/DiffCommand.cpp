@@ -23,6 +23,7 @@ public:
     SideOfDiff(Session& session, const std::string& folder) : session_(session), folder_(folder) {
         const std::error_code error = setRoot(folder);
         if (error) throw UsageError{"'" + folder + "': " + error.message()};
+        if (damagedCollection) session.failed(*damagedCollection);
         while (folder_.size() > 1 && folder_.back() == '/') folder_.pop_back();
     }
 
@@ -52,6 +53,7 @@ private:
 struct DiffSide {
     Context& context;
     const std::string& name;
+    NamedBy by;
 };
 
 /// Compares two files and counts what differs. What cannot be read is reported.
@@ -63,7 +65,7 @@ public:
     bool compare(const DiffSide& a, const DiffSide& b, DiffOutput& output, bool& isMap) {
         isMap = scope_.entries && !scope_.headers;
         if (scope_.headers) {
-            const OpenedHeader headers[] = {openHeader(a.context, a.name), openHeader(b.context, b.name)};
+            const OpenedHeader headers[] = {openHeader(a.context, a.name, a.by), openHeader(b.context, b.name, b.by)};
             if (!headers[0].file || !headers[1].file) return false;
             if (!areAlike(headers[0], headers[1], a, b)) return false;
             for (const FieldDifference& difference : fieldDifferencesOf(*headers[0].file, *headers[1].file)) {
@@ -86,8 +88,8 @@ private:
     }
 
     bool compareMaps(const DiffSide& a, const DiffSide& b, DiffOutput& output) {
-        ComparedMap maps[] = {{a.context, a.name, openMap(a.context, a.name)},
-                              {b.context, b.name, openMap(b.context, b.name)}};
+        ComparedMap maps[] = {{a.context, a.name, openMap(a.context, a.name, a.by)},
+                              {b.context, b.name, openMap(b.context, b.name, b.by)}};
         if (!maps[0].map.file || !maps[1].map.file) return false;
         totals_.entries.entries += std::max(maps[0].map.entries, maps[1].map.entries);
         const bool complete = compareEntries(maps[0], maps[1], [&](const DiffRun& run) {
@@ -106,7 +108,9 @@ void compareFiles(const DiffOptions& options, DiffScope scope, Session& session)
     DiffTotals totals;
     DiffOutput output(session, options.a, options.b, "");
     bool areMaps = false;
-    if (!FilesDiff(scope, totals).compare({session, options.a}, {session, options.b}, output, areMaps)) return;
+    const DiffSide a = {session, options.a, NamedBy::user};
+    const DiffSide b = {session, options.b, NamedBy::user};
+    if (!FilesDiff(scope, totals).compare(a, b, output, areMaps)) return;
     scope.entries = areMaps;
     printSummary(session, options.a, options.b, totals, scope);
 }
@@ -136,7 +140,9 @@ void compareStores(const DiffOptions& options, DiffScope scope, Session& session
         DiffOutput output(session, path, path, path);
         if (scope.headers) compareSizes(pair, output, totals);
         bool isMap = pair.a->kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
-        if (scope.headers || isMap) files.compare({sides[0], path}, {sides[1], path}, output, isMap);
+        const DiffSide a = {sides[0], path, NamedBy::target};
+        const DiffSide b = {sides[1], path, NamedBy::target};
+        if (scope.headers || isMap) files.compare(a, b, output, isMap);
     }
     printSummary(session, options.a, options.b, totals, scope);
 }

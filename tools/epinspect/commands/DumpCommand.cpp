@@ -37,7 +37,7 @@ const FileKind* parseKind(const std::string& name) {
 }
 
 void dumpFile(const DumpOptions& options, Session& session, const std::string& name) {
-    const std::optional<std::string> path = session.openablePath(name);
+    const std::optional<std::string> path = session.openablePath(name, NamedBy::user);
     if (!path) return;
     const FileKind* byName = options.kind == nullptr ? kindByName(session.root.targetPath(name)) : nullptr;
     const FileKind* kind = options.kind != nullptr ? options.kind : byName;

@@ -49,7 +49,7 @@ void printRange(const EntryOptions& options, Session& session, Json* json, tool:
 }
 
 void run(const EntryOptions& options, Session& session) {
-    const std::optional<std::string> path = session.openablePath(options.file);
+    const std::optional<std::string> path = session.openablePath(options.file, NamedBy::user);
     if (!path) return;
     tool::ISCSIEPFileMAP file(*path);
     if (!session.succeeded(file.parseHead0(), {options.file, ""})) return;

@@ -64,7 +64,7 @@ int printExtent(const ExtentOptions& options, Session& session, tool::ISCSIEPFil
 
 void run(const ExtentOptions& options, Session& session) {
     if (options.raw && outputIsTerminal()) throw UsageError{"--raw: standard output is a terminal"};
-    const std::optional<std::string> path = session.openablePath(options.file);
+    const std::optional<std::string> path = session.openablePath(options.file, NamedBy::user);
     if (!path) return;
     tool::ISCSIEPFileDAT file(*path);
     const std::string place = "extent " + std::to_string(options.index);

@@ -58,7 +58,8 @@ void printMatchAsJson(SearchedMap& map, const RunMatch& match) {
 }
 
 void searchMap(const FindOptions& options, Session& session, const StoreFile& file, FindSummary& summary) {
-    const OpenedMap map = openMap(session, file.path);
+    const NamedBy by = options.files.empty() ? NamedBy::target : NamedBy::user;
+    const OpenedMap map = openMap(session, file.path, by);
     if (!map.file) return;
     ++summary.files;
     SearchedMap searched = {file.path, file.lun, *map.file, Json(file.path), LineBuffer()};

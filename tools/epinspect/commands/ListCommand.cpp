@@ -31,17 +31,25 @@ std::optional<std::uint64_t> entriesOf(Session& session, const StoreFile& file) 
     return entries;
 }
 
-/// What is known of a file, its path last: one line where it fits.
+/// What is known of a file, its path and what it is beside that last: one line where it fits.
 void printFile(const StoreFile& file, const std::optional<std::uint64_t>& entries) {
     constexpr std::size_t sizeColumns = 14;
     constexpr unsigned int indent = 6;
     const std::string size = file.missing ? "missing" : std::to_string(file.size);
-    std::string text = file.kind->name + std::string(sizeColumns - std::min(sizeColumns - 1, size.size()), ' ') + size;
-    if (file.lun != nullptr) text += "  LUN " + std::to_string(file.lun->record.lid);
-    if (entries) text += "  " + counted(*entries, "entry", "entries");
-    if (file.mapName) text += "  " + file.mapName->typeName + " " + file.mapName->uuid;
-    if (file.mapName && !file.mapName->name.empty()) text += " " + file.mapName->name;
-    print(wrapped(forReader(text + "  " + file.path), outputWidth(), indent, "  "));
+    std::vector<std::string> pieces = {file.kind->name +
+                                       std::string(sizeColumns - std::min(sizeColumns - 1, size.size()), ' ') + size};
+    if (file.misnamed) pieces.emplace_back("no data file of the target");
+    if (file.lun != nullptr) pieces.push_back("LUN " + std::to_string(file.lun->record.lid));
+    if (entries) pieces.push_back(counted(*entries, "entry", "entries"));
+    if (file.mapName) {
+        const std::string& name = file.mapName->name;
+        pieces.push_back(file.mapName->typeName + " " + file.mapName->uuid + (name.empty() ? "" : " ") + name);
+    }
+    pieces.push_back(file.path);
+    if (file.link) pieces.push_back("link to " + *file.link);
+    if (!file.sameAs.empty()) pieces.push_back("same file as " + file.sameAs);
+    for (std::string& piece : pieces) piece = forReader(piece);
+    print(wrapped({pieces.begin(), pieces.end()}, outputWidth(), indent, "  "));
 }
 
 void writeFile(const StoreFile& file, const std::optional<std::uint64_t>& entries) {
@@ -58,6 +66,9 @@ void writeFile(const StoreFile& file, const std::optional<std::uint64_t>& entrie
         json.text("typeName", file.mapName->typeName).text("uuid", file.mapName->uuid).text("name", file.mapName->name);
     }
     if (file.lun != nullptr) json.number("lid", file.lun->record.lid);
+    if (file.misnamed) json.boolean("misnamed", true);
+    if (file.link) json.path("link", *file.link);
+    if (!file.sameAs.empty()) json.path("sameAs", file.sameAs);
     json.end();
 }
 

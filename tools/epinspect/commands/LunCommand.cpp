@@ -11,11 +11,13 @@ namespace epinspect {
 
 namespace {
 
-void printLun(const Session& session, const Lun& lun) {
+void printLun(Session& session, const Lun& lun) {
     if (!session.json) {
         print(forReader(lun.record.toString()) + "\n" + forReader(lun.mapPath) + "\n");
         return;
     }
+    const Located map = session.root.locate(lun.mapPath);
+    if (const auto obstacle = map.obstacle(lun.mapPath)) session.failed(*obstacle);
     Json object(lun.mapPath);
     object.begin("lun")
         .number("lid", lun.record.lid)
@@ -26,9 +28,13 @@ void printLun(const Session& session, const Lun& lun) {
         .text("uuid", lun.record.uuid)
         .text("rootPath", lun.record.rootPath)
         .text("name", lun.record.name)
-        .text("typeName", lun.record.getTypeName())
-        .boolean("missing", !session.root.exists(lun.mapPath))
-        .end();
+        .text("typeName", lun.record.getTypeName());
+    if (map.isThere() || map.isMissing()) {
+        object.boolean("missing", map.isMissing());
+    } else {
+        object.null("missing");
+    }
+    object.end();
 }
 
 void printLuns(Session& session, Range range) {

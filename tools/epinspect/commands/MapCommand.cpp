@@ -47,7 +47,7 @@ void printSummary(Json& json, const MapSummary& summary, const std::vector<std::
 }
 
 void run(const MapOptions& options, Session& session) {
-    const OpenedMap map = openMap(session, options.file);
+    const OpenedMap map = openMap(session, options.file, NamedBy::user);
     if (!map.file) return;
     tool::ISCSIEPFileMAP& file = *map.file;
     const std::uint64_t total = map.entries;

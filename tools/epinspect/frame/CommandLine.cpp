@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <stdexcept>
 #include <string_view>
 #include <utility>
 
@@ -37,6 +38,19 @@ bool isOptional(Command::Need need) { return need == Command::Need::oneOrNone ||
 bool takesSeveral(Command::Need need) { return need == Command::Need::several || need == Command::Need::severalOrNone; }
 
 }  // namespace
+
+std::string Command::asTyped(const std::string& text) {
+    if (text.empty()) throw UsageError{"must not be empty"};
+    return text;
+}
+
+void Command::requireLongNames(const std::string& names) {
+    for (std::size_t name = 0;; name += 2) {
+        if (names.compare(name, 2, "--") != 0) throw std::logic_error("a short option with a value: " + names);
+        name = names.find(", ", name);
+        if (name == std::string::npos) return;
+    }
+}
 
 Command& Command::flag(const char* name, const char* about, const std::function<void()>& take) {
     options_.push_back({name, "", about, [take](const std::string&) { take(); }, Need::severalOrNone});

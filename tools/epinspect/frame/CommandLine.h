@@ -43,10 +43,12 @@ public:
         return arguments(name, about, target, asTyped, need);
     }
 
-    /// An option with a value: "--first N".
+    /// An option with a value: "--first N". Its names are long ones, for short ones take no value; others throw
+    /// std::logic_error.
     template <typename Target, typename Parse>
     Command& option(const char* name, const char* value, const char* about, Target& target, Parse parse,
                     Need need = Need::oneOrNone) {
+        requireLongNames(name);
         options_.push_back({name, value, about, assignTo(target, parse), need});
         return *this;
     }
@@ -87,7 +89,8 @@ private:
         std::vector<std::unique_ptr<Command>> commands;
     };
 
-    static std::string asTyped(const std::string& text) { return text; }
+    static std::string asTyped(const std::string& text);
+    static void requireLongNames(const std::string& names);
 
     template <typename Target, typename Parse>
     static Take assignTo(Target& target, Parse parse) {

@@ -7,10 +7,13 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <charconv>
 #include <csignal>
+#include <cstdlib>
 #include <cstring>
 #include <cwchar>
 #include <cwctype>
+#include <system_error>
 
 #include "frame/Interruption.h"
 #include "frame/StatusLine.h"
@@ -94,7 +97,13 @@ bool outputIsTerminal() { return isatty(STDOUT_FILENO) == 1; }
 
 unsigned int terminalWidth(int stream) {
     winsize size = {};
-    return ioctl(stream, TIOCGWINSZ, &size) == 0 && size.ws_col > 0 ? size.ws_col : 80;
+    if (ioctl(stream, TIOCGWINSZ, &size) == 0 && size.ws_col > 0) return size.ws_col;
+    const char* const columns = std::getenv("COLUMNS");  // NOLINT(concurrency-mt-unsafe): there is one thread
+    const std::string_view text = columns != nullptr ? columns : "";
+    std::uint16_t width = 0;  // as wide as a terminal can be
+    const auto result = std::from_chars(text.data(), text.data() + text.size(), width);
+    const bool isNumber = result.ec == std::errc() && result.ptr == text.data() + text.size();
+    return isNumber && width > 0 ? width : 80;
 }
 
 unsigned int outputWidth() { return terminalWidth(STDOUT_FILENO); }
@@ -127,25 +136,35 @@ std::string counted(std::uint64_t count, const char* one, const char* several) {
     return std::to_string(count) + " " + (count == 1 ? one : several);
 }
 
-std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap) {
-    const auto columns = [](std::string_view piece) {  // every character of our own texts is one column wide
+std::string wrapped(const std::vector<std::string_view>& pieces, unsigned int width, unsigned int indent,
+                    std::string_view gap) {
+    const auto columns = [](std::string_view piece) {  // each character counts as one column, which few are not
         return static_cast<std::size_t>(std::count_if(
             piece.begin(), piece.end(), [](char c) { return (static_cast<unsigned char>(c) & 0xC0U) != 0x80U; }));
     };
     std::string result;
     std::string line;
-    for (bool first = true;; first = false) {
-        const auto end = std::min(text.find(gap), text.size());
-        const auto piece = text.substr(0, end);
+    bool first = true;
+    for (const std::string_view piece : pieces) {
         if (!first && columns(line) + columns(gap) + columns(piece) > width) {
             result.append(line).append("\n");
             line.assign(indent, ' ').append(piece);
         } else {
             line.append(first ? "" : gap).append(piece);
         }
-        if (end == text.size()) return result + line + "\n";
+        first = false;
+    }
+    return result + line + "\n";
+}
+
+std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap) {
+    std::vector<std::string_view> pieces;
+    for (auto end = text.find(gap); end != std::string_view::npos; end = text.find(gap)) {
+        pieces.push_back(text.substr(0, end));
         text.remove_prefix(end + gap.size());
     }
+    pieces.push_back(text);
+    return wrapped(pieces, width, indent, gap);
 }
 
 void complain(std::string_view message) {

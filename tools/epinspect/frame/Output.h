@@ -5,6 +5,7 @@
 #include <initializer_list>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace epinspect {
 
@@ -13,12 +14,12 @@ struct OutputFailure {
     int error;
 };
 
-/// Prepares the standard streams: one that is missing gets a number that nothing else can take and that fails when it
-/// is used, and a write that fails is an error, never a signal.
+/// Prepares the standard streams: one that is closed is opened on /dev/null, so that no other file takes its number,
+/// but a write to it fails; and a write that fails is an error, never a signal.
 void prepareStreams();
 
-/// Writes data to standard output, which is a terminal line by line and otherwise in large pieces. Throws
-/// OutputFailure, and Interrupted when a signal ended the wait for somebody to take it.
+/// Writes data to standard output: at once to a terminal, otherwise in large pieces. Throws OutputFailure, and
+/// Interrupted when a signal ended the wait for somebody to take it.
 void print(std::string_view text);
 
 /// Makes sure that all data has arrived. Throws OutputFailure.
@@ -27,7 +28,8 @@ void finishOutput();
 /// Whether standard output is a terminal.
 bool outputIsTerminal();
 
-/// The columns of the terminal that `stream` (a file descriptor) is, 80 when it is none.
+/// The columns of the terminal that `stream` (a file descriptor) is; where none tells them, what COLUMNS in the
+/// environment says, else 80.
 unsigned int terminalWidth(int stream);
 
 /// The same for standard output.
@@ -45,8 +47,12 @@ std::string forReader(std::string_view text);
 /// "1 entry", "2 entries".
 std::string counted(std::uint64_t count, const char* one, const char* several);
 
-/// `text` in lines of at most `width` columns, broken where it has `gap`; every line but the first starts with `indent`
-/// blanks, every line ends with a line feed. What is too long stays whole.
+/// `pieces` with `gap` between them, in lines of at most `width` columns; every line but the first starts with `indent`
+/// blanks, every line ends with a line feed. No piece is broken, however long it is.
+std::string wrapped(const std::vector<std::string_view>& pieces, unsigned int width, unsigned int indent,
+                    std::string_view gap);
+
+/// The same of a text, whose pieces stand between its gaps.
 std::string wrapped(std::string_view text, unsigned int width, unsigned int indent, std::string_view gap = " ");
 
 /// Writes "epinspect: MESSAGE" to standard error, after all data that came before.

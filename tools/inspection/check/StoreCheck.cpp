@@ -31,7 +31,7 @@ bool isLink(const std::string& hostPath) {
 }  // namespace
 
 void StoreCheck::run() {
-    for (const Lun& lun : files_.luns()) lunsByMap_[plainPath(lun.mapPath)].push_back(&lun);
+    for (const Lun& lun : files_.luns()) lunsByMap_[context_.root.plainPath(lun.mapPath)].push_back(&lun);
     if (!files_.areNamed() && lunsByMap_.empty()) {
         report_.notCompared("lun-size, extent-size, missing-map, missing-file: no LUN is known, ids " +
                             lidsText(options_.lids) + " were tried");
@@ -50,7 +50,7 @@ void StoreCheck::run() {
 }
 
 void StoreCheck::checkFile(const StoreFile& file) {
-    checked_.insert(context_.root.targetPath(file.path));
+    checked_.insert(file.targetPath);
     const ChangeWatch watch(context_, file.path, file.hostPath);
     report_.beginFile(file.path, file.lun != nullptr ? std::optional(file.lun->record.lid) : std::nullopt, watch);
     if (file.missing) return checkMissing(file);
@@ -88,7 +88,7 @@ MissingFile StoreCheck::missingAt(const std::string& path, const std::string& ho
     MissingFile missing = {path, isLink(hostPath), {}};
     const Trial trial(context_);
     for (const Lun& lun : files_.luns()) {
-        const tool::ISCSIEPFile map(plainPath(lun.mapPath));
+        const tool::ISCSIEPFile map(context_.root.plainPath(lun.mapPath));
         std::string table;
         std::string freeIndex;
         std::string journal;
@@ -113,7 +113,7 @@ void StoreCheck::checkContent(const StoreFile& file, const FileKind& kind, tool:
     } else if (data != nullptr) {
         checkSerialNumber(file, *data, report_);
     } else {
-        tables_[context_.root.targetPath(file.path)] = table->extentSize;
+        tables_[file.targetPath] = table->extentSize;
     }
 }
 
@@ -128,15 +128,15 @@ void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) 
     }
     unsigned long long entries = 0;
     if (!context_.succeeded(content.getEntryCount(entries), {file.path, ""})) return;
-    const std::string targetPath = context_.root.targetPath(file.path);
-    const std::string folder = targetPath.substr(0, targetPath.rfind('/'));
+    const std::string folder = file.targetPath.substr(0, file.targetPath.rfind('/'));
     if (file.volume == 0) foldersWithoutVolume_.insert(folder);
-    sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file.path);
+    const bool isOwner = file.sameAs.empty();  // under another name it has been counted
+    if (isOwner) sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file.path);
     MapRules rules(file, content, report_);
     useDataFiles(file, rules);
     const auto each = [&](const MapRun& run) {
         rules.add(run);
-        sharedExtents_.add(run);
+        if (isOwner) sharedExtents_.add(run);
     };
     std::optional<Failure> failure;
     if (entries > 0) {
@@ -165,8 +165,7 @@ void StoreCheck::useDataFiles(const StoreFile& file, MapRules& rules) {
     if (!extentSize) return giveUp("the extent size is not known, give --extent-size");
     if (*extentSize == 0) return giveUp("the extent size is 0");
     if (file.volume == 0) return giveUp("the path names no volume");
-    const std::string path = context_.root.targetPath(file.path);
-    const auto [volume, added] = dataFiles_.try_emplace(file.volume, context_, path, false);
+    const auto [volume, added] = dataFiles_.try_emplace(file.volume, context_, file.targetPath, false);
     DataFiles& dataFiles = volume->second;
     if (!dataFiles.list()) {
         if (added && files_.areNamed() && dataFiles.error()) context_.failed(*dataFiles.error());
@@ -193,7 +192,9 @@ void StoreCheck::checkExtentSizes() {
     for (const Lun& lun : files_.luns()) {
         std::string table;
         const bool onVolume = tool::ISCSIEPFile(lun.mapPath).getTBLFilePath(table) == 0;
-        if (files_.areNamed() && checked_.count(plainPath(lun.mapPath)) == 0 && checked_.count(table) == 0) continue;
+        if (files_.areNamed() && checked_.count(context_.root.plainPath(lun.mapPath)) == 0 &&
+            checked_.count(table) == 0)
+            continue;
         const auto extentSize = onVolume ? tableExtentSize(table) : std::nullopt;
         if (extentSize) {
             checkExtentSize(table, *extentSize, lun, report_);
@@ -209,7 +210,7 @@ void StoreCheck::checkExtentSizes() {
 std::optional<std::uint32_t> StoreCheck::tableExtentSize(const std::string& path) {
     const auto [row, added] = tables_.try_emplace(path);
     if (!added || !files_.areNamed() || checked_.count(path) > 0) return row->second;
-    const std::optional<std::string> hostPath = context_.openablePath(path);
+    const std::optional<std::string> hostPath = context_.openablePath(path, NamedBy::target);
     if (!hostPath) return std::nullopt;
     if (!context_.sizeOf(*hostPath) && (errno == ENOENT || errno == ENOTDIR)) {
         checkMissingFile(missingAt(path, *hostPath), report_);

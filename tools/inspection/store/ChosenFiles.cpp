@@ -1,13 +1,8 @@
 #include "store/ChosenFiles.h"
 
-#include <filesystem>
-#include <system_error>
-
 #include "store/FileSize.h"
 
 namespace inspection {
-
-namespace fs = std::filesystem;
 
 ChosenFiles::ChosenFiles(Context& context, const std::vector<std::string>& names, Range lids)
     : context_(context), names_(names) {
@@ -20,26 +15,29 @@ ChosenFiles::ChosenFiles(Context& context, const std::vector<std::string>& names
 
 void ChosenFiles::forEach(const std::function<void(const StoreFile&)>& each) {
     if (store_) return store_->forEachFile(each);
-    std::set<fs::path> done;
+    std::set<FileIdentity> done;
+    std::set<std::string> missing;
     for (const std::string& name : names_) {
-        const std::optional<std::string> path = context_.openablePath(name);
-        std::error_code error;
-        if (!path || !done.insert(fs::weakly_canonical(*path, error)).second) continue;
-        const std::string targetPath = context_.root.targetPath(name);
+        const std::optional<std::string> path = context_.openablePath(name, NamedBy::user);
+        if (!path) continue;
         StoreFile file;
-        file.kind = kindByName(targetPath);
         file.path = name;
+        file.targetPath = context_.root.targetPath(name);
+        file.identity = identityOf(*path);
+        if (file.identity ? !done.insert(*file.identity).second : !missing.insert(file.targetPath).second) continue;
+        file.kind = kindByName(file.targetPath);
+        file.misnamed = isMisnamed(file.targetPath);
         file.hostPath = *path;
         file.size = context_.sizeOf(*path).value_or(0);
-        file.volume = volumeOf(context_, targetPath);
-        file.lun = lunOf(targetPath);
+        file.volume = volumeOf(context_, file.targetPath);
+        file.lun = lunOf(file.targetPath);
         each(file);
     }
 }
 
 const Lun* ChosenFiles::lunOf(const std::string& targetPath) const {
     for (const Lun& lun : luns_) {
-        if (plainPath(lun.mapPath) == targetPath) return &lun;
+        if (context_.root.plainPath(lun.mapPath) == targetPath) return &lun;
     }
     return nullptr;
 }

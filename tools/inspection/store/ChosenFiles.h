@@ -20,8 +20,9 @@ public:
     const std::vector<Lun>& luns() const { return store_ ? store_->luns() : luns_; }
 
     /// Calls each() for the files, in the order of Store::forEachFile() or as they were named, a file that is named
-    /// twice once. Of a named file `path` is the name as typed, the kind is null where its name tells none, and what is
-    /// missing is left for the library to find. What may not be opened is reported and left out.
+    /// twice, under whatever names, once. Of a named file `path` is the name as typed, the kind is null where its name
+    /// tells none, and what is missing is left for the library to find. What may not be opened is reported and left
+    /// out.
     void forEach(const std::function<void(const StoreFile&)>& each);
 
 private:

@@ -12,6 +12,7 @@
 #include <nlohmann/json.hpp>
 #include <set>
 
+#include "store/FileSize.h"
 #include "store/HostFile.h"
 
 namespace inspection {
@@ -22,8 +23,6 @@ using nlohmann::json;
 
 constexpr std::uint64_t largestList = std::uint64_t{64} << 20U;  ///< bytes; a file takes about 100
 constexpr auto positionLimit = static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max());
-
-std::string listPath(const std::string& folder) { return folder + "/collection.json"; }
 
 /// The bytes of a path, which JSON cannot hold where they are not UTF-8.
 std::string hexOf(const std::string& path) {
@@ -110,15 +109,10 @@ Failure damaged(const std::string& list, const std::string& how) {
 
 }  // namespace
 
-std::variant<std::monostate, Collection, Failure> Collection::read(const std::string& folder) {
-    const std::string list = listPath(folder);
-    struct stat status = {};
-    if (stat(list.c_str(), &status) != 0) {
-        if (errno == ENOENT) return std::monostate();
-        return Failure{{list, ""}, ISCSI::TOOL::EP_ERR_OPEN_FAILED, errno, {}};
-    }
-    if (!S_ISREG(status.st_mode)) return damaged(list, "not a regular file");
-    if (static_cast<std::uint64_t>(status.st_size) > largestList) return damaged(list, "too large");
+std::variant<Collection, Failure> Collection::read(const std::string& folder, const std::string& list) {
+    const auto size = inspection::sizeOf(list);
+    if (!size) return Failure{{list, ""}, ISCSI::TOOL::EP_ERR_OPEN_FAILED, errno, {}};
+    if (*size > largestList) return damaged(list, "too large");
     std::ifstream file(list, std::ios::binary);
     if (!file) return Failure{{list, ""}, ISCSI::TOOL::EP_ERR_OPEN_FAILED, errno, {}};
     const json document = json::parse(file, nullptr, false);
@@ -157,7 +151,7 @@ int Collection::write(const std::string& folder) const {
         separator = ",\n";
     }
     text += "\n]}\n";
-    return writeWhole(listPath(folder), text);
+    return writeWhole(folder + "/" + listName, text);
 }
 
 std::optional<std::uint64_t> Collection::sizeOf(const std::string& hostPath) const {

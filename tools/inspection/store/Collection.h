@@ -32,9 +32,12 @@ public:
     bool complete = false;  ///< whether it came to its end, and everything could be read
     std::vector<CollectedFile> files;
 
-    /// Reads the collection in `folder`: nothing when the folder is none, or why it cannot be read or does not fit its
-    /// files.
-    static std::variant<std::monostate, Collection, Failure> read(const std::string& folder);
+    /// The name of the file in its folder.
+    static constexpr const char* listName = "collection.json";
+
+    /// Reads the collection in `folder` from `list`, the file of that name there. Returns it, or why it cannot be read
+    /// or does not fit its files.
+    static std::variant<Collection, Failure> read(const std::string& folder, const std::string& list);
 
     /// Writes "collection.json" in `folder` anew. Returns 0 or the errno value of what failed.
     int write(const std::string& folder) const;

@@ -102,16 +102,13 @@ bool Collector::writeLuns(const std::vector<Lun>& luns) {
 }
 
 Collector::Outcome Collector::collect(const StoreFile& file) {
-    struct stat status = {};
-    const std::string original = context_.root.hostPath(file.path);
     const std::string copyPath = folder_ + file.path;
-    const bool isLink = lstat(original.c_str(), &status) == 0 && S_ISLNK(status.st_mode);
-    if (file.missing && !isLink) return Outcome::taken;
+    if (file.missing && !file.link) return Outcome::taken;
     const int error = makeFoldersAbove(copyPath);
     if (error != 0) return cannotWrite(copyPath, error);
     if (file.missing) {  // a link that leads nowhere stays one
         std::error_code failure;
-        std::filesystem::create_symlink(std::filesystem::read_symlink(original, failure), copyPath, failure);
+        std::filesystem::create_symlink(*file.link, copyPath, failure);
         return failure ? cannotWrite(copyPath, failure.value()) : Outcome::taken;
     }
     CollectedFile collected;

@@ -16,7 +16,10 @@ namespace tool = ISCSI::TOOL;
 std::error_code Context::setRoot(const std::string& folder) {
     const std::error_code error = root.set(folder);
     if (error) return error;
-    auto found = Collection::read(folder);
+    const Located list = root.locate(std::string("/") + Collection::listName);
+    damagedCollection = list.obstacleToFile(folder + "/" + Collection::listName);
+    if (!list.isThere() || damagedCollection) return {};
+    auto found = Collection::read(folder, list.hostPath);
     if (auto* made = std::get_if<Collection>(&found)) collection = std::move(*made);
     if (auto* failure = std::get_if<Failure>(&found)) damagedCollection = std::move(*failure);
     return {};
@@ -46,31 +49,26 @@ void Context::changed(const std::string& name) {
     remark(name, "has changed while it was read");
 }
 
-std::optional<std::string> Context::openablePath(const std::string& name) {
-    std::string path = root.isFolder() ? root.hostPath(root.targetPath(name)) : name;
-    const char* refusal = root.refusalOfFile(path);
-    if (refusal == nullptr) return path;
-    fail({name, ""}, std::string("cannot be opened: ") + refusal, tool::EP_ERR_OPEN_FAILED);
-    return std::nullopt;
-}
-
-std::optional<std::string> Context::openableFolder(const std::string& path) {
-    std::string folder = root.hostPath(path);
-    const char* refusal = root.refusalOfFolder(folder);
-    if (refusal == nullptr) return folder;
-    fail({path, ""}, std::string("cannot be opened: ") + refusal, tool::EP_ERR_OPEN_FAILED);
+std::optional<std::string> Context::openablePath(const std::string& name, NamedBy by) {
+    Located located = by == NamedBy::user ? root.locateNamed(name) : root.locate(name);
+    const auto obstacle = located.obstacleToFile(name);
+    const bool left = !root.isFolder() && located.error != 0;  // the library meets the same failure, and logs it
+    if (!obstacle || left) return std::move(located.hostPath);
+    failed(*obstacle);
     return std::nullopt;
 }
 
 void Context::prepareLuns() {
-    if (!root.isFolder() || std::exchange(lunsPrepared_, true)) return;
-    std::string list = root.hostPath("/var/db/iscsi/luns.json");
-    if (const char* refusal = root.refusalOfFolder(list)) {
-        remark(list, std::string("not used: ") + refusal);
-        list = "/dev/null";
+    static constexpr const char* variable = "KELPISCSIEP_LUNS";  // of the stand-in for the platform's library
+    static constexpr const char* path = "/var/db/iscsi/luns.json";
+    if (!root.isFolder() || std::exchange(lunsPrepared_, true) || std::getenv(variable) != nullptr) return;
+    Located list = root.locate(path);
+    const auto obstacle = list.obstacle(path);
+    if (obstacle && list.error != EACCES) {  // which the system finds too, and before any link
+        failed(*obstacle);
+        list.hostPath = "/dev/null";
     }
-    // The stand-in for the platform's library reads that list; another choice in the environment wins.
-    setenv("KELPISCSIEP_LUNS", list.c_str(), 0);
+    setenv(variable, list.hostPath.c_str(), 0);
 }
 
 }  // namespace inspection

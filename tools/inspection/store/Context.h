@@ -14,6 +14,9 @@
 
 namespace inspection {
 
+/// Whose word the name of a file is: the user's, as it was typed, or a path of the target.
+enum class NamedBy { user, target };
+
 /// Each program derives one from this. Used by one thread at a time.
 class Context {
 public:
@@ -69,12 +72,9 @@ public:
     /// Reports a failure that the library does not know, under its code that fits.
     void fail(const Subject& subject, std::string_view what, int error);
 
-    /// Where to open the file that the user called `name`; nothing, and a failure, when what lies there must not be
-    /// opened. What is missing is left to the library to find.
-    std::optional<std::string> openablePath(const std::string& name);
-
-    /// The same of a folder at `path` of the target. Whether it can be listed is left to find.
-    std::optional<std::string> openableFolder(const std::string& path);
+    /// Where to open the file that messages call `name`; nothing, and a failure, when what lies there must not be
+    /// opened or, below a root folder, cannot be looked at. What is missing is left to the library to find.
+    std::optional<std::string> openablePath(const std::string& name, NamedBy by);
 
     /// To be called before the first look at a LUN: its list is then looked for below the root folder too.
     void prepareLuns();

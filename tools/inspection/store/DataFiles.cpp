@@ -39,18 +39,15 @@ bool DataFiles::list() {
     const Trial trial(context_);
     if (tool::ISCSIEPFile(path_).getDATFilePath(1, 0, first) != 0) return false;
     const std::string folder = first.substr(0, first.rfind('/') + 1);
-    std::set<std::uint64_t> numbers;
-    const auto error = listFolder(context_, folder, [&numbers](const std::filesystem::directory_entry& entry) {
-        const std::string name = entry.path().filename().string();
+    Listing listing = listFolder(context_, folder);
+    listError_ = std::move(listing.failure);
+    if (listError_) return false;
+    listed_.emplace();
+    for (const std::string& name : listing.names) {
         const auto number = dataFileNumberIn(name);
-        if (number && name == dataFileName(*number)) numbers.insert(*number);
-    });
-    if (error) {
-        listError_ = Failure{{folder, ""}, tool::EP_ERR_OPEN_FAILED, error.value(), {}};
-    } else {
-        listed_ = std::move(numbers);
+        if (number && !isMisnamed(name)) listed_->insert(*number);
     }
-    return !error;
+    return true;
 }
 
 bool DataFiles::isListedMissing(std::uint64_t number) const { return listed_ && listed_->count(number) == 0; }
@@ -65,27 +62,27 @@ DataFile DataFiles::open(std::uint64_t number) {
     };
     const int pathError = tool::ISCSIEPFile(path_).getDATFilePath(1, number * tool::EP_DAT_FILE_SPAN, data.path);
     if (pathError != 0) return failed(pathError, 0);
-    const std::string hostPath = context_.root.hostPath(data.path);
-    const char* refusal = context_.root.refusalOfFile(hostPath);
-    if (refusal != nullptr) {
-        return failed(tool::EP_ERR_OPEN_FAILED, 0, std::string("cannot be opened: ") + refusal);
+    const Located located = context_.root.locate(data.path);
+    if (auto obstacle = located.obstacleToFile(data.path)) {
+        data.failure = std::move(obstacle);
+        return data;
     }
     if (isListedMissing(number)) {
         data.missing = true;
         return failed(tool::EP_ERR_OPEN_FAILED, ENOENT);
     }
-    data.state = stateOf(hostPath);
-    data.file = std::make_unique<tool::ISCSIEPFileDAT>(hostPath);
+    data.state = stateOf(located.hostPath);
+    data.file = std::make_unique<tool::ISCSIEPFileDAT>(located.hostPath);
     // Nothing is read yet: this finds out whether there can be extents at all.
     const int error = data.file->getExtentBytes(0, 1, 0, 0, nullptr);
     const int reason = errno;
     data.missing = error == tool::EP_ERR_OPEN_FAILED && (reason == ENOENT || reason == ENOTDIR);
     if (error != 0) return failed(error, reason);
-    const auto size = context_.sizeOf(hostPath);
+    const auto size = context_.sizeOf(located.hostPath);
     if (!size) return failed(tool::EP_ERR_OPEN_FAILED, errno);
     if (remarks_) remarkOnDataStart(context_, *data.file, data.path);
     data.dataSize = payloadOf(*data.file, *size);
-    data.held = std::min(data.dataSize, payloadOf(*data.file, sizeOf(hostPath).value_or(0)));
+    data.held = std::min(data.dataSize, payloadOf(*data.file, sizeOf(located.hostPath).value_or(0)));
     return data;
 }
 

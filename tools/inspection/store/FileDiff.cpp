@@ -33,13 +33,13 @@ std::vector<StoreFile> filesOf(Store& store) {
 
 }  // namespace
 
-OpenedHeader openHeader(Context& context, const std::string& name) {
-    const std::optional<std::string> path = context.openablePath(name);
+OpenedHeader openHeader(Context& context, const std::string& name, NamedBy by) {
+    const std::optional<std::string> path = context.openablePath(name, by);
     if (!path) return {};
     tool::ISCSIEPFile head(*path);
     if (!context.succeeded(head.parseHead0(), {name, ""})) return {};
     const FileKind* kind = kindByType(head.head0Type);
-    if (kind == nullptr) kind = kindByName(context.root.targetPath(name));
+    if (kind == nullptr) kind = kindByName(by == NamedBy::user ? context.root.targetPath(name) : name);
     if (kind == nullptr) {
         context.remark(name, "kind not known from its name or type, only HEAD[0] is compared");
         kind = &headKind;

@@ -26,9 +26,9 @@ struct OpenedHeader {
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFile> file;  ///< null after a failure
 };
 
-/// Decodes the header block of the file that the user called `name`. Its kind is the one that its type tells, else its
+/// Decodes the header block of the file that messages call `name`. Its kind is the one that its type tells, else its
 /// name; else only HEAD[0] is decoded, which is remarked. Reports failures.
-OpenedHeader openHeader(Context& context, const std::string& name);
+OpenedHeader openHeader(Context& context, const std::string& name, NamedBy by);
 
 /// A field that two header blocks hold different values of.
 using FieldDifference = std::pair<HeaderField, HeaderField>;

@@ -5,7 +5,6 @@
 
 #include <cctype>
 #include <charconv>
-#include <filesystem>
 #include <system_error>
 
 namespace inspection {
@@ -75,7 +74,5 @@ std::uint32_t volumeIn(std::string_view name) {
     const bool plain = !digits.empty() && digits[0] >= '1' && digits[0] <= '9';
     return plain ? static_cast<std::uint32_t>(numberIn<std::int32_t>(digits).value_or(0)) : 0;
 }
-
-std::string plainPath(const std::string& path) { return std::filesystem::path("/" + path).lexically_normal().string(); }
 
 }  // namespace inspection

@@ -37,7 +37,4 @@ std::optional<MapName> mapNameIn(std::string_view fileName);
 /// The number in the name of a volume's folder, 0 when it is not "volume" and a number in plain form.
 std::uint32_t volumeIn(std::string_view name);
 
-/// The path of the target as the folders lead there: absolute, without doubled slashes and dots.
-std::string plainPath(const std::string& path);
-
 }  // namespace inspection

@@ -1,25 +1,25 @@
 // What lies in a folder of the target.
 #pragma once
 
-#include <filesystem>
+#include <optional>
 #include <string>
-#include <system_error>
+#include <vector>
 
 #include "store/Context.h"
 
 namespace inspection {
 
-/// Calls each(entry) for what lies in the folder at `path` of the target, which may be missing. Returns why it could
-/// not be listed to its end; only a link out of the root folder is reported here.
-template <typename Each>
-std::error_code listFolder(Context& context, const std::string& path, Each&& each) {
-    const std::optional<std::string> folder = context.openableFolder(path);
-    std::error_code error;
-    if (!folder) return error;
-    std::filesystem::directory_iterator entry(*folder, error);
-    for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error)) each(*entry);
-    if (error == std::errc::no_such_file_or_directory) error.clear();
-    return error;
-}
+struct Listing {
+    std::vector<std::string> names;  ///< in no order
+    std::optional<Failure> failure;  ///< why there may be more; it names the folder that is closed
+};
+
+/// The names in the folder at `path` of the target, none where no such folder is there. A link that leads nowhere is a
+/// failure.
+Listing listFolder(const Context& context, const std::string& path);
+
+/// The failure to look at what lies at `path` of the target; where a folder on the way may not be looked into, it is
+/// about that folder.
+Failure failureOf(const Located& located, const std::string& path);
 
 }  // namespace inspection

@@ -27,13 +27,6 @@ std::uint64_t nextHole(int file, std::uint64_t position, std::uint64_t end) {
 
 }  // namespace
 
-Descriptor::~Descriptor() { close(); }
-
-int Descriptor::close() {
-    const int number = std::exchange(number_, -1);
-    return number >= 0 && ::close(number) != 0 ? errno : 0;
-}
-
 int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position) {
     while (size > 0) {
         const ssize_t written = pwrite(file, bytes, size, static_cast<off_t>(position));

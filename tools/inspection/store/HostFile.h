@@ -6,25 +6,9 @@
 #include <functional>
 #include <string>
 
+#include "store/Descriptor.h"
+
 namespace inspection {
-
-/// A file descriptor that is closed at its end; -1: none.
-class Descriptor {
-public:
-    explicit Descriptor(int number) : number_(number) {}
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-    ~Descriptor();
-
-    int number() const { return number_; }
-    bool isOpen() const { return number_ >= 0; }
-
-    /// Closes it now. Returns 0 or the errno value.
-    int close();
-
-private:
-    int number_;
-};
 
 /// Writes all of the bytes. Returns 0 or the errno value.
 int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position);

@@ -74,7 +74,7 @@ std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::opti
         context.failed({map.subject(""), tool::EP_ERR_BAD_EXTENT_SIZE, 0, {}});
         return std::nullopt;
     }
-    OpenedMap opened = openMap(context, map.file);
+    OpenedMap opened = openMap(context, map.file, map.lid ? NamedBy::target : NamedBy::user);
     if (opened.file == nullptr) return std::nullopt;
     map.map = std::move(opened.file);
     map.entries = opened.entries;

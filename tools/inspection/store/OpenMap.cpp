@@ -6,8 +6,8 @@ namespace inspection {
 
 namespace tool = ISCSI::TOOL;
 
-OpenedMap openMap(Context& context, const std::string& name) {
-    const std::optional<std::string> path = context.openablePath(name);
+OpenedMap openMap(Context& context, const std::string& name, NamedBy by) {
+    const std::optional<std::string> path = context.openablePath(name, by);
     if (!path) return {};
     const ChangeWatch watch(context, name, *path);
     auto file = std::make_unique<tool::ISCSIEPFileMAP>(*path);

@@ -1,10 +1,8 @@
 #include "store/Store.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <filesystem>
 #include <limits>
-#include <system_error>
 
 #include <etc/ISCSIEPFormat.h>
 
@@ -21,20 +19,21 @@ namespace {
 constexpr std::uint64_t journalPlace = 0;
 constexpr std::uint64_t noVolumePlace = std::numeric_limits<std::uint64_t>::max();
 
-/// Calls each(entry) for what lies in the folder at `path` of the target, which may be missing. Reports failures.
-template <typename Each>
-void visitFolder(Context& context, const std::string& path, Each&& each) {
-    const std::error_code error = listFolder(context, path, each);
-    if (error) context.failed({{path, ""}, tool::EP_ERR_OPEN_FAILED, error.value(), {}});
-}
-
-/// The order of files in a folder: the table first, data files last and by number, the others by name.
+/// The order of files in a folder: the table first, data files last and by number, what is only called like them behind
+/// them, the others by name.
 bool precedes(const std::string& one, const std::string& other) {
     const auto rank = [](const std::string& name) -> std::size_t {
         if (name == tool::EP_TBL_FILE_NAME) return 0;
+        if (isMisnamed(name)) return std::numeric_limits<std::size_t>::max();
         return isDataFileName(name) ? name.size() : 1;
     };
     return std::pair(rank(one), std::string_view(one)) < std::pair(rank(other), std::string_view(other));
+}
+
+/// Whether what lies at `path` counts as a map file by its folder alone.
+bool mayHaveAnyName(const std::string& path) {
+    const FileKind* kind = kindByName(path);
+    return kind != nullptr && kind->type == tool::EP_FILE_TYPE_MAP && !mapNameIn(lastName(path));
 }
 
 }  // namespace
@@ -59,7 +58,7 @@ Store::Store(Context& context, Range lids) : context_(context) {
     folders_[{journalPlace, journalFolder}];
     if (!luns_.empty()) folders_[{journalPlace, journalFolder}].insert(fs::path(journal).filename().string());
     for (const Lun& lun : luns_) {
-        const std::string map = plainPath(lun.mapPath);
+        const std::string map = context.root.plainPath(lun.mapPath);
         lunsByMap_.emplace(map, &lun);
         expect(map);
         const Trial trial(context);
@@ -68,13 +67,12 @@ Store::Store(Context& context, Range lids) : context_(context) {
         if (file.getTBLFilePath(path) == 0) expect(path);
         if (file.getFRIFilePath(path) == 0) expect(path);
     }
-    visitFolder(context, "/", [this](const fs::directory_entry& entry) {
-        const std::string name = entry.path().filename().string();
+    for (const std::string& name : namesIn("/")) {
         const std::uint32_t volume = volumeIn(name);
-        if (volume == 0) return;
+        if (volume == 0) continue;
         folders_[{volume, "/" + name + "/@iSCSI/EP"}];
         folders_[{volume, "/" + name + "/@iSCSI/LUN"}];
-    });
+    }
 }
 
 void Store::expect(const std::string& path) {
@@ -83,48 +81,75 @@ void Store::expect(const std::string& path) {
     folders_[{volume != 0 ? volume : noVolumePlace, path.substr(0, slash)}].insert(path.substr(slash + 1));
 }
 
-std::vector<std::string> Store::namesIn(const std::string& folder, std::set<std::string> names) {
-    visitFolder(context_, folder, [&](const fs::directory_entry& entry) {
-        std::error_code error;
-        std::string name = entry.path().filename().string();
-        const FileKind* kind = kindByName(folder + "/" + name);
-        const bool anyName = kind != nullptr && kind->type == tool::EP_FILE_TYPE_MAP && !mapNameIn(name);
-        if (kind != nullptr && !(anyName && entry.is_directory(error))) names.insert(std::move(name));
-    });
-    std::vector<std::string> sorted(names.begin(), names.end());
+void Store::reportOnce(const Failure& failure) {
+    if (reported_.insert(failure.subject.file).second) context_.failed(failure);
+}
+
+/// What could be listed of a folder.
+std::vector<std::string> Store::namesIn(const std::string& folder) {
+    Listing listing = listFolder(context_, folder);
+    if (listing.failure) reportOnce(*listing.failure);
+    return std::move(listing.names);
+}
+
+std::vector<std::string> Store::storeFilesIn(const std::string& folder, std::set<std::string> expected) {
+    for (std::string& name : namesIn(folder)) {
+        if (kindByName(folder + "/" + name) != nullptr) expected.insert(std::move(name));
+    }
+    std::vector<std::string> sorted(expected.begin(), expected.end());
     std::sort(sorted.begin(), sorted.end(), precedes);
     return sorted;
 }
 
-std::optional<StoreFile> Store::fileAt(const std::string& path) {
-    const std::optional<std::string> hostPath = context_.openablePath(path);
-    if (!hostPath) return std::nullopt;
+/// The file at `path` of the target. Nothing when it may not be opened, which is reported, or when it is a folder that
+/// merely happens to lie there.
+std::optional<StoreFile> Store::fileAt(const std::string& path, bool isExpected) {
+    const Located located = context_.root.locate(path);
+    if (located.isFolder() && !isExpected && mayHaveAnyName(path)) return std::nullopt;
+    if (const auto obstacle = located.obstacleToFile(path)) {
+        reportOnce(located.isThere() ? *obstacle : failureOf(located, path));
+        return std::nullopt;
+    }
     StoreFile file;
-    const auto lun = lunsByMap_.find(path);
-    file.kind = lun != lunsByMap_.end() ? kindByType(tool::EP_FILE_TYPE_MAP) : kindByName(path);
-    file.path = path;
-    file.hostPath = *hostPath;
-    const auto size = context_.sizeOf(file.hostPath);
-    file.missing = !size && (errno == ENOENT || errno == ENOTDIR);
-    if (!size && !file.missing) {
+    file.path = file.targetPath = path;
+    file.hostPath = located.hostPath;
+    file.missing = located.isMissing();
+    const auto size = file.missing ? 0 : context_.sizeOf(file.hostPath);
+    if (!size) {
         context_.succeeded(tool::EP_ERR_OPEN_FAILED, {path, ""});
         return std::nullopt;
     }
-    file.size = size.value_or(0);
-    file.volume = volumeOf(context_, path);
+    file.size = *size;
+    if (!file.missing) {
+        file.identity = located.identity;
+        const auto [first, added] = firstPaths_.try_emplace(located.identity, path);
+        if (!added) file.sameAs = first->second;
+    }
+    describe(file);
+    return file;
+}
+
+/// What the names and the configuration tell of a file.
+void Store::describe(StoreFile& file) {
+    const auto lun = lunsByMap_.find(file.targetPath);
+    file.kind = lun != lunsByMap_.end() ? kindByType(tool::EP_FILE_TYPE_MAP) : kindByName(file.targetPath);
+    file.misnamed = isMisnamed(file.targetPath);
+    file.link = context_.root.linkAt(file.targetPath);
+    file.volume = volumeOf(context_, file.targetPath);
     if (lun == lunsByMap_.end()) {
-        if (file.kind->type == tool::EP_FILE_TYPE_MAP) file.mapName = mapNameIn(fs::path(path).filename().string());
+        if (file.kind->type == tool::EP_FILE_TYPE_MAP) file.mapName = mapNameIn(lastName(file.targetPath));
     } else {
         file.lun = lun->second;
         file.mapName = {file.lun->record.getTypeName(), file.lun->record.uuid, file.lun->record.name};
     }
-    return file;
 }
 
 void Store::forEachFile(const std::function<void(const StoreFile&)>& each) {
+    firstPaths_.clear();
     for (const auto& [place, expected] : folders_) {
-        for (const std::string& name : namesIn(place.second, expected)) {
-            const std::optional<StoreFile> file = fileAt(place.second + "/" + name);
+        const std::string& folder = place.second;
+        for (const std::string& name : storeFilesIn(folder, expected)) {
+            const auto file = fileAt(folder + "/" + name, expected.count(name) > 0);
             if (file) each(*file);
         }
     }

@@ -14,6 +14,7 @@
 
 #include "Range.h"
 #include "store/Context.h"
+#include "store/FileIdentity.h"
 #include "store/FileKind.h"
 #include "store/FileNames.h"
 #include "store/Luns.h"
@@ -28,14 +29,19 @@ void failEmptyStore(Context& context);
 
 /// A file of the store.
 struct StoreFile {
-    const FileKind* kind = nullptr;  ///< what its name tells; never null
-    std::string path;                ///< on the target
+    const FileKind* kind = nullptr;  ///< what its name tells; null where it tells none, as a file named by the user may
+    std::string path;                ///< what messages call it; of a file that was not named by the user on the target
+    std::string targetPath;          ///< on the target, in plain form
     std::string hostPath;            ///< where it is to be opened here
     std::uint64_t size = 0;
-    bool missing = false;            ///< nothing is there, though a LUN should have it or a link leads there
-    std::uint32_t volume = 0;        ///< 0: on no volume
-    const Lun* lun = nullptr;        ///< of a map file, where the configuration knows the LUN
-    std::optional<MapName> mapName;  ///< of a map file, where the parts of its name are known
+    std::optional<FileIdentity> identity;  ///< nothing where it is missing
+    bool missing = false;                  ///< nothing is there, though a LUN should have it or a link leads there
+    std::uint32_t volume = 0;              ///< 0: on no volume
+    bool misnamed = false;                 ///< called like a data file, but not as the target calls one
+    std::optional<std::string> link;       ///< what is stored in the link that lies there, if it is one
+    std::string sameAs;                    ///< the path of an earlier file that is the same one, under another name
+    const Lun* lun = nullptr;              ///< of a map file, where the configuration knows the LUN
+    std::optional<MapName> mapName;        ///< of a map file, where the parts of its name are known
 };
 
 /// The store below the root folder.
@@ -50,7 +56,7 @@ public:
     /// Calls each() for the files, whose bytes are not read: journal, then volume by volume table, free-index, data and
     /// map files, then map files on no volume. Those that a configured LUN should have (its map file, the table and
     /// free-index file of its volume, the journal) are among them when they are missing. What may not be opened or
-    /// cannot be looked at is reported and left out.
+    /// cannot be looked at is reported and left out; a folder that is closed is reported once, whatever lies in it.
     void forEachFile(const std::function<void(const StoreFile&)>& each);
 
 private:
@@ -58,13 +64,18 @@ private:
     using Place = std::pair<std::uint64_t, std::string>;
 
     void expect(const std::string& path);
-    std::vector<std::string> namesIn(const std::string& folder, std::set<std::string> names);
-    std::optional<StoreFile> fileAt(const std::string& path);
+    std::vector<std::string> namesIn(const std::string& folder);
+    std::vector<std::string> storeFilesIn(const std::string& folder, std::set<std::string> expected);
+    std::optional<StoreFile> fileAt(const std::string& path, bool isExpected);
+    void describe(StoreFile& file);
+    void reportOnce(const Failure& failure);
 
     Context& context_;
     std::vector<Lun> luns_;
     std::unordered_map<std::string, const Lun*> lunsByMap_;  ///< by the paths of their map files
     std::map<Place, std::set<std::string>> folders_;         ///< with the names of what should lie there
+    std::set<std::string> reported_;                         ///< what could not be looked at
+    std::map<FileIdentity, std::string> firstPaths_;         ///< of the files that forEachFile() has met
 };
 
 }  // namespace inspection

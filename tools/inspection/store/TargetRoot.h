@@ -5,7 +5,30 @@
 #include <string>
 #include <system_error>
 
+#include "Failure.h"
+#include "store/FileIdentity.h"
+
 namespace inspection {
+
+/// What lies at a path, links followed.
+struct Located {
+    std::string hostPath;        ///< where to open it; below a root folder a path without links
+    int error = 0;               ///< the errno value of the look at it
+    bool leadsOut = false;       ///< a link leads out of the root folder
+    bool dangling = false;       ///< `error` was met on the way of a link; of paths of the target
+    std::string closed;          ///< the folder of the target that may not be looked into; of paths of the target
+    unsigned int mode = 0;       ///< st_mode, 0 after an error
+    FileIdentity identity = {};  ///< set where there is no error
+
+    bool isThere() const { return error == 0 && !leadsOut; }
+    bool isMissing() const;
+    bool isFolder() const;
+
+    /// Why it must not be opened, or could not be looked at; `name` is what messages call it. Nothing when it may be,
+    /// or when nothing is there. A file must be a regular one or a block device.
+    std::optional<Failure> obstacle(const std::string& name) const;
+    std::optional<Failure> obstacleToFile(const std::string& name) const;
+};
 
 class TargetRoot {
 public:
@@ -16,30 +39,34 @@ public:
     std::error_code set(const std::string& folder);
 
     /// Whether a folder stands for /.
-    bool isFolder() const { return !canonical_.empty(); }
+    bool isFolder() const { return identity_.has_value(); }
 
-    /// Where the file that the user called `name` lies on the target, as an absolute path: what lies below the root
-    /// folder, however that is spelt, or a path of the target.
+    /// Where the file that the user called `name` lies on the target, in plain form: what lies below the root folder,
+    /// however that is spelt, or a path of the target.
     std::string targetPath(const std::string& name) const;
 
-    /// Where what lies at `path` of the target is here. Whether it may be opened is another question.
+    /// `path` of the target in plain form: absolute, without doubled slashes and dots. Links stay, but for one before
+    /// `..`, which is followed as the system does; where that is not possible the `..` stays too.
+    std::string plainPath(const std::string& path) const { return plain(path, nullptr); }
+
+    /// What lies at `path` of the target.
+    Located locate(const std::string& path) const;
+
+    /// What lies where the file is that the user called `name`.
+    Located locateNamed(const std::string& name) const;
+
+    /// What is stored in the link that lies at `path` of the target; nothing when that is no link.
+    std::optional<std::string> linkAt(const std::string& path) const;
+
+    /// What is at `path` of the target below the root folder, links aside. May not be opened just so.
     std::string hostPath(const std::string& path) const { return root_ + path; }
 
-    /// Whether something lies at `path` of the target.
-    bool exists(const std::string& path) const;
-
-    /// Why what lies at `hostPath` must not be opened: it is neither a regular file nor a block device, or a link leads
-    /// out of the root folder. Null when it may be, or when nothing is there.
-    const char* refusalOfFile(const std::string& hostPath) const;
-
-    /// The same of a folder, which only a link makes one that must not be opened.
-    const char* refusalOfFolder(const std::string& hostPath) const;
-
 private:
-    bool leadsOut(const std::string& hostPath) const;
+    std::string plain(const std::string& path, bool* climbs) const;
+    const std::string& folder() const;
 
-    std::string root_;       ///< as typed, without a slash at its end; empty: / itself
-    std::string canonical_;  ///< without links; empty: the machine itself
+    std::string root_;                      ///< as typed, without a slash at its end; empty: / itself
+    std::optional<FileIdentity> identity_;  ///< of the root folder; nothing: the machine itself
 };
 
 }  // namespace inspection
