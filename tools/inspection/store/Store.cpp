@@ -51,7 +51,7 @@ void failEmptyStore(Context& context) {
     context.fail({top.empty() ? "/" : top, ""}, "no EP files found", tool::EP_ERR_NO_PATH);
 }
 
-Store::Store(Context& context, Range lids) : context_(context) {
+Store::Store(Context& context, const Lids& lids) : context_(context) {
     forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
@@ -60,7 +60,7 @@ Store::Store(Context& context, Range lids) : context_(context) {
     if (!luns_.empty()) folders_[{journalPlace, journalFolder}].insert(fs::path(journal).filename().string());
     for (const Lun& lun : luns_) {
         const std::string map = plainPath(lun.mapPath);
-        lunsByMap_.emplace(map, &lun);
+        lunsByMap_.add(lun);
         expect(map);
         const Trial trial(context);
         const tool::ISCSIEPFile file(map);
@@ -100,8 +100,8 @@ std::optional<StoreFile> Store::fileAt(const std::string& path) {
     const std::optional<std::string> hostPath = context_.openablePath(path);
     if (!hostPath) return std::nullopt;
     StoreFile file;
-    const auto lun = lunsByMap_.find(path);
-    file.kind = lun != lunsByMap_.end() ? kindByType(tool::EP_FILE_TYPE_MAP) : kindByName(path);
+    file.luns = lunsByMap_.at(path);
+    file.kind = file.lun() != nullptr ? kindByType(tool::EP_FILE_TYPE_MAP) : kindByName(path);
     file.path = path;
     file.hostPath = *hostPath;
     const auto size = context_.sizeOf(file.hostPath);
@@ -112,11 +112,10 @@ std::optional<StoreFile> Store::fileAt(const std::string& path) {
     }
     file.size = size.value_or(0);
     file.volume = volumeOf(context_, path);
-    if (lun == lunsByMap_.end()) {
-        if (file.kind->type == tool::EP_FILE_TYPE_MAP) file.mapName = mapNameIn(fs::path(path).filename().string());
-    } else {
-        file.lun = lun->second;
-        file.mapName = {file.lun->record.getTypeName(), file.lun->record.uuid, file.lun->record.name};
+    if (const Lun* lun = file.lun()) {
+        file.mapName = {lun->record.getTypeName(), lun->record.uuid, lun->record.name};
+    } else if (file.kind->type == tool::EP_FILE_TYPE_MAP) {
+        file.mapName = mapNameIn(fs::path(path).filename().string());
     }
     return file;
 }

@@ -8,7 +8,6 @@
 #include <set>
 #include <string>
 #include <string_view>
-#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -34,15 +33,18 @@ struct StoreFile {
     std::uint64_t size = 0;
     bool missing = false;            ///< nothing is there, though a LUN should have it or a link leads there
     std::uint32_t volume = 0;        ///< 0: on no volume
-    const Lun* lun = nullptr;        ///< of a map file, where the configuration knows the LUN
+    std::vector<const Lun*> luns;    ///< of a map file: those that the configuration tells it is of, lowest id first
     std::optional<MapName> mapName;  ///< of a map file, where the parts of its name are known
+
+    /// The LUN whose map this is: the first where there are several; null where none is known.
+    const Lun* lun() const { return luns.empty() ? nullptr : luns.front(); }
 };
 
 /// The store below the root folder.
 class Store {
 public:
-    /// Loads the LUNs whose ids are in `lids`; failures other than unused ids are reported.
-    Store(Context& context, Range lids);
+    /// Loads the LUNs whose ids are in `lids`, as forEachLun() does.
+    Store(Context& context, const Lids& lids);
 
     /// The LUNs found, lowest id first; none at all where there is no configuration.
     const std::vector<Lun>& luns() const { return luns_; }
@@ -63,8 +65,8 @@ private:
 
     Context& context_;
     std::vector<Lun> luns_;
-    std::unordered_map<std::string, const Lun*> lunsByMap_;  ///< by the paths of their map files
-    std::map<Place, std::set<std::string>> folders_;         ///< with the names of what should lie there
+    LunsByMap lunsByMap_;
+    std::map<Place, std::set<std::string>> folders_;  ///< with the names of what should lie there
 };
 
 }  // namespace inspection
