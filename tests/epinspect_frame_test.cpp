@@ -41,9 +41,8 @@ const Case cases[] = {
      "20' '17592186044416 --extent-size 1M' '2251799813685245 --extent-size 8K'; do epinspect extent data $n; done", 1,
      "", says({"data: extent 2" + holds("0-1"), "data: extent 1" + holds("0"), "data: extent 0" + holds("none"),
            "data: extent 17592186044416" + holds("none"), "data: extent 2251799813685245" + holds("none")})},
-    {"says what is doubtful or wrong about extents", "epinspect extent data 0 --extent-size 0; "
-     "for f in gone EP_TBL late early; do epinspect extent $f 0 --extent-size 8; done", 0, "0000000000000000\n",
-     says({"data: extent 0: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)", "gone: extent 0" + missing,
+    {"says what is doubtful or wrong about extents", "for f in gone EP_TBL late early; do epinspect extent $f 0 --extent-size 8; done", 0, "0000000000000000\n",
+     says({"gone: extent 0" + missing,
            "EP_TBL: extent 0" + wrongType, "late: data start offset 0x6001 lies past the end of the file",
            "late: extent 0" + holds("none"), "early: data start offset 0x5ff8 lies inside the header block"})},
 
@@ -61,9 +60,9 @@ const Case cases[] = {
      R"({"kind":"lun","file":"/volume3/@iSCSI/LUN/…","lid":7,"extentSize":4096,"size":8192,"restoreTime":5,"type":-2,)"
      R"("uuid":"u-7","rootPath":"/volume3","name":"c\u0007\"d","typeName":"…","missing":true})" "\n", ""},
     {"says which LUNs do not exist", "epinspect --root store lun 9 3-5", 1, "",
-     says({"LUN 9" + noSuchLun, "LUN 3-5" + noSuchLun})},
+     says({"LUN 9" + noSuchLun, "LUN 3-5: none is known: No such LUN (code 9001)"})},
     {"says which LUNs of a range are broken", "KELPISCSIEP_LUNS=luns.json epinspect lun 8-10 --json", 1,
-     R"(…,"lid":8,…,"type":0,…}…{"kind":"error","file":null,"error":null,"code":…,"message":"LUN 9: …"})" "\n",
+     R"(…,"lid":8,…,"type":0,…}…{"kind":"error","file":null,"lid":9,"error":null,"code":…,"message":"LUN 9: …"})" "\n",
      says({"LUN 9" + noLun + "The LUN list holds a value of the wrong type,…"})},
 
     {"tells where files lie", "for a in 'tbl /volume1/x' 'fri /volume2/@iSCSI/LUN/x' jnl 'jnl x' 'map 2 --root store' "
@@ -74,18 +73,19 @@ const Case cases[] = {
     {"takes the volume from the path on the target", "epinspect --root store path tbl store/./volume1/x; "
      "epinspect path fri store/volume1/x; epinspect path map 1 --root .", 1, "/volume1/@iSCSI/EP/EP_TBL\n",
      says({"store/volume1/x: path names no volume (EP_ERR_NO_PATH, 18990401)",
-           "LUN 1" + noLun + "The LUN list is missing or cannot be read (code 9002)"})},
-    {"refuses extent addresses without a position", "for a in '9 --extent-size 0' '8796093022207 --extent-size 1M' "
+           "LUN 1" + noLun + "The LUN list is missing or cannot be read: No such file or directory (code 9002)"})},
+    {"refuses extent addresses without a position", "for a in '8796093022207 --extent-size 1M' "
      "'8796093022208 --extent-size 1M' '9223372036854775808 --extent-size 1'; do "
      "epinspect path dat /volume1/x --extent-address $a; done", 1,
-     "/volume1/@iSCSI/EP/EP_DAT_00000\n/volume1/@iSCSI/EP/EP_DAT_2097151\n",
+     "/volume1/@iSCSI/EP/EP_DAT_2097151\n",
      says({"/volume1/x: position out of any file's range (EP_ERR_SEEK_FAILED, 18990041)", "/volume1/x: position…"})},
     {"finds files below root however they are spelt", "for f in /var/db/iscsi/EP_JNL var/db/iscsi/EP_JNL "
      "store/var/db/iscsi/EP_JNL ./store//var/../var/db/iscsi/EP_JNL \"$PWD/store/var/db/iscsi/EP_JNL\"; "
      "do epinspect --root=./store// dump --json \"$f\"; done | grep -c '\"kind\":\"jnl\"'", 0, "5\n", ""},
     {"looks for the LUN list below root only", "mkdir -p r/var/db/iscsi; ln -s ../../../../luns.json r/var/db/iscsi; "
-     "epinspect --root r/ lun 7 8", 1, "", says({"/var/db/iscsi/luns.json" + leadsOut,
-           "LUN 7" + noLun + "The LUN list is missing or cannot be read (code 9002)", "LUN 8…"})},
+     "epinspect --root r/ lun 7 8", 1, "",
+     says({"/var/db/iscsi/luns.json" + leadsOut,
+           "LUN 7" + noLun + "The LUN list is missing or cannot be read: Invalid argument (code 9002)", "LUN 8…"})},
     {"refuses links out of root", "mkdir r; cp data r/EP_DAT_1; ln -s EP_DAT_1 r/EP_DAT_2; ln -s ../data r/out; "
      "ln -s out r/in; cp data r2; ln -s ../r2 r/beside; epinspect --root r dump --json EP_DAT_1 EP_DAT_2 out in beside",
      1, "{\"kind\":\"dat\",…\n{\"kind\":\"dat\",…\n{\"kind\":\"error\",…{\"kind\":\"error\",…{\"kind\":\"error\",…\n",
@@ -106,6 +106,9 @@ const Case cases[] = {
     usage("entry x -1", "INDEX: '-1': not a number, nor FIRST-LAST", " entry"),
     usage("lun 9-8", "LID: '9-8': range runs backwards", " lun"),
     usage("locate 1 5X", "OFFSET: '5X': not a size; K, M, G, T, KiB, MiB, GiB or TiB may follow a number", " locate"),
+    usage("path dat /volume1/x --extent-address 9 --extent-size 0", "--extent-size: '0': must not be 0", " path dat"),
+    usage("extent data 0 --extent-size 0", "--extent-size: '0': must not be 0", " extent"),
+    usage("read 1 --extent-size 0", "--extent-size: '0': must not be 0", " read"),
     usage("--root EP_TBL dump x", "--root: 'EP_TBL': not a folder", ""),
     {"takes options anywhere and repeatedly", "epinspect -vv entry --json --json -- gone 0", 1, "{\"kind\":\"error\",…",
      says({"iSCSI:ISCSIEPFile.cpp:37:readHeader Failed to open file. path: gone",
@@ -113,7 +116,7 @@ const Case cases[] = {
     {"helps", "for c in '' map path 'path jnl' 'path dat'; do epinspect $c --help --nonsense; done | grep -A5 Usage; "
      "epinspect read -h | grep -A1 -e '--[ac]'; epinspect help path | sed -n 6p; epinspect help path jnl; "
      "epinspect -V --nonsense", 0, "Usage: epinspect SUBCOMMAND ... [-V, --version]\n…"
-     "Usage: epinspect map MAPFILE [--first N] [--count N] [--chart] [--json]\n…"
+     "Usage: epinspect map MAP [--first N] [--count N] [--chart] [--json]\n…"
      "Usage: epinspect path SUBCOMMAND ...\n…Usage: epinspect path dat EPFILE --extent-size SIZE --extent-address N\n"
      "…       [--json] [--extent-size SIZE] [--address-bits 48|52]\n       [--count-from file|volume]\n\n--\n"
      "  --address-bits 48|52  How many bits of an entry are its extent address;\n"

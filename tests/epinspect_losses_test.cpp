@@ -34,9 +34,9 @@ const Case cases[] = {
      gone1 + "entries 3584-3839: extent 4197888" + no1 + "9 files, 4352 entries, 3 findings: 3 missing-data-file\n", ""},
     {"all there is", "epinspect check --root none; mkdir none; epinspect check --root none", 1,
      "0 files, 0 entries, 0 findings\n"
-     "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN is known, ids 0 to 255 were tried\n",
+     "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",
      "epinspect: --root: 'none': No such file or directory. Try …\n"
-     "epinspect: none: no EP files found (EP_ERR_NO_PATH, 18990401)\n"},
+     "epinspect: LUN 0-255: none is known: …\nepinspect: none: no EP files found (EP_ERR_NO_PATH, 18990401)\n"},
     {"the table of a map that is named, which another file replaces or which is gone",
      "cd own; E=volume2/@iSCSI/EP M=volume2/@iSCSI/LUN; cp $M/* $E/EP_TBL;"
      "epinspect --root . check $E/EP_TBL $M/* | head -n 1; rm $E/EP_TBL; epinspect --root . check $M/* | head -n 1; "

@@ -11,6 +11,7 @@
 
 #include "InProcess.h"
 #include "ProgramTest.h"
+#include "commands/MapArguments.h"
 #include "frame/CommandLine.h"
 #include "frame/Numbers.h"
 #include "frame/Output.h"
@@ -64,7 +65,7 @@ TEST(Numbers, AreReadWholeOrRefused) {
     expect(last, {{"5", 5}, {"5-5", 5}, {"5-0x9", 9}, {"5-18446744073709551615", UINT64_MAX}},
            "6-5", "5-", "-5", "1-2-3", "-", "0-18446744073709551616");
     expect(parseNumber32, {{"4294967295", UINT32_MAX}}, "4294967296");
-    expect(parseSize32, {{"4194303K", 4294966272U}}, "4194304K");
+    expect(parseExtentSize, {{"4194303K", 4294966272U}}, "4194304K", "0");
     expect(last32, {{"0-4294967295", UINT32_MAX}}, "0-4294967296");
 }
 // clang-format on

@@ -96,8 +96,8 @@ const Case cases[] = {
      "fri       missing  /volume91/@iSCSI/EP/EP_FRI\ndat       3694592  " + ep + "0\ndat 4398047059968  " + ep + "1\n"
      "map         24616  LUN 5  5 entries\n      THIN " + uuid + " five\n      " + lun5 + "\n"
      "map       missing  LUN 6  THIN " + uuid + "\n      /other/@iSCSI/LUN/THIN" + uuid + "_00000\n" + file +
-     "/other/@iSCSI/LUN/THIN" + uuid + R"(_00000","fileKind":"map","size":null,"missing":true,"typeName":"THIN",)"
-     R"("uuid":")" + uuid + R"(","name":"","lid":6})" "\n", ""},
+     "/other/@iSCSI/LUN/THIN" + uuid + R"(_00000","lid":6,"fileKind":"map","size":null,"missing":true,)"
+     R"("typeName":"THIN","uuid":")" + uuid + R"(","name":""})" "\n", ""},
     {"list needs no LUN list", "cd far/volume91/@iSCSI; mv EP/*0 EP/EP_DAT_99999; >EP/EP_DAT_100000; "
      "rm -r ../../var EP/*1; for n in " + no + " a-b; do cp LUN/*five* LUN/$n; done; "
      "epinspect --root ../.. list --json", 0,
@@ -105,12 +105,12 @@ const Case cases[] = {
      file + ep.substr(0, ep.size() - 4) + R"(100000","fileKind":"dat","size":0,"missing":false})" "\n" +
      file + lun5 + R"(","fileKind":"map","size":24616,"missing":false,"entries":5,"typeName":"THIN","uuid":")" + uuid +
      R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-b" + same + "\n",
-     "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read (code 9002)\n"},
+     "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read: No such file or directory (code 9002)\n"},
     {"list says what may not be opened", "rm far/var/db/iscsi/*; cd far/volume91/@iSCSI; mv EP LUN/folder; "
      "ln -s ../../../usr EP; rm LUN/THIN*; mkfifo LUN/pipe; ln -s none LUN/link; ln -s self LUN/self; "
      "epinspect --root ../.. list --luns 7; epinspect --root LUN/folder list", 1,
      "map       missing  " + maps + "link  link to none\n",
-     "epinspect: LUN 7: configuration cannot be loaded: The LUN list is missing or cannot be read (code 9002)\n"
+     "epinspect: LUN 7: configuration cannot be loaded: The LUN list is missing or cannot be read: No such file or directory (code 9002)\n"
      "epinspect: /volume91/@iSCSI/EP: cannot be opened: a link leads out of the folder of --root" + openFailed +
      "epinspect: " + maps + "pipe: cannot be opened: neither a regular file nor a block device (…)\n"
      "epinspect: " + maps + "self: cannot be opened: Too many levels of symbolic links (…)\n…LUN/folder: no EP files found (…"},
@@ -166,9 +166,10 @@ const Case cases[] = {
      "cp far" + lun5 + " m; epinspect read m --extent-size 1M --length 1 | od -An -tx1", 0, "1\n1\n1\n1\n 00\n",
      "…byte 6291456: past the end, the LUN has 6291456 bytes (…: LUN 6: extent size cannot be used (…"
      "No such LUN…epinspect: m: byte 0: path names no volume (…1 of 1 bytes…"},
-    {"wrong usage is named", "for a in 'read none' 'read 0X1FFFFFFFF' 'locate 5 1x' 'locate 5 1 --address-bits 50'; "
+    {"wrong usage is named", "for a in 'read none' 'read 4294967296' 'locate 5 1x' 'locate 5 1 --address-bits 50'; "
      "do epinspect $a; done; epinspect read 5 --count-from LUN", 2, "",
-     "epinspect: --extent-size is missing: a map file does not hold it…LUN: '0X1FFFFFFFF'…"
+     "epinspect: none: extent size not known, give --extent-size: no LUN with an id from 0 to 255 has this map file (…"
+     "MAP: '4294967296'…"
      "OFFSET: '1x'…--address-bits: '50': not 48 or 52…--count-from: 'LUN': not file or volume…"},
 };
 // clang-format on

@@ -368,16 +368,33 @@ Result findLun(std::uint32_t lid, void* record) {
     return goThrough(known, bytes, *file, lid, record);
 }
 
+/// Makes errno tell why the list is of no use, and 0 where it is: nothing else stands for a list that is there and says
+/// nothing of the LUN.
+void setReason(Result result) {
+    if (result == LIST_MALFORMED) {
+        errno = EBADMSG;
+    } else if (result != LIST_UNREADABLE) {
+        errno = 0;
+    } else if (errno == 0) {  // no call has failed: it is no regular file
+        errno = EINVAL;
+    }
+}
+
 }  // namespace
 
 extern "C" {
 
 __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsigned int lid, int /*reserved*/, void* record) {
     try {
-        return findLun(lid, record);
-    } catch (...) {  // no memory, or the list cannot be read to its end
-        return LIST_UNREADABLE;
+        const Result result = findLun(lid, record);
+        setReason(result);
+        return result;
+    } catch (const std::system_error& error) {  // the list cannot be read to its end
+        errno = error.code().value();
+    } catch (...) {
+        errno = ENOMEM;
     }
+    return LIST_UNREADABLE;
 }
 
 __attribute__((visibility("default"))) const char* KELPiSCSIStrError(int code) {

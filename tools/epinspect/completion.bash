@@ -52,7 +52,7 @@ _epinspect() {
         collect) options+=' --luns' ;;
         entry | lun) options+=' --json' ;;
         diff) options+=' --headers --entries --json' ;;
-        find) options+=' --extent --pool --json' ;;
+        find) options+=' --extent --pool --luns --json' ;;
         locate) options+=' --extent-size --address-bits --count-from --json' ;;
         read) options+=' --offset --length --extent-size --address-bits --count-from' ;;
         map) options+=' --first --count --chart --json' ;;

@@ -39,7 +39,7 @@ std::string whatFailed(const Failure& failure) {
     if (!failure.what.empty()) return failure.what + why;
     if (tool::GetErrorName(failure.error) == nullptr) {
         const std::string text = tool::ISCSILUNConfInfo::getErrorText(failure.error);
-        return "configuration cannot be loaded" + (text.empty() ? text : ": " + text);
+        return "configuration cannot be loaded" + (text.empty() ? text : ": " + text) + why;
     }
     if (failure.reason != 0) return meaningOf(failure.error) + why;
     return failure.error == tool::EP_ERR_READ_FAILED ? "ends too early" : meaningOf(failure.error);
@@ -52,12 +52,14 @@ std::string textOf(const Subject& subject) {
     return subject.file + (subject.file.empty() || subject.part.empty() ? "" : ": ") + subject.part;
 }
 
-std::string messageOf(const Failure& failure) {
-    const std::string text = textOf(failure.subject) + ": " + whatFailed(failure);
-    if (failure.error == 0) return text;
+std::string whatOf(const Failure& failure) {
+    const std::string what = whatFailed(failure);
+    if (failure.error == 0) return what;
     const char* name = tool::GetErrorName(failure.error);
-    return text + " (" + (name != nullptr ? name + std::string(", ") : "code ") + std::to_string(failure.error) + ")";
+    return what + " (" + (name != nullptr ? name + std::string(", ") : "code ") + std::to_string(failure.error) + ")";
 }
+
+std::string messageOf(const Failure& failure) { return textOf(failure.subject) + ": " + whatOf(failure); }
 
 Failure pastEnd(const std::string& file, const std::string& place, unsigned long long count) {
     std::string what = "past the end, the file holds ";

@@ -6,8 +6,8 @@
 #include <memory>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
 #include "frame/Interruption.h"
-#include "frame/Numbers.h"
 #include "frame/Output.h"
 #include "store/Collector.h"
 #include "store/Luns.h"
@@ -20,7 +20,7 @@ namespace {
 
 struct CollectOptions {
     std::string folder;
-    Range lids = usualLids;
+    Lids lids = usualLids;
 };
 
 /// Whether `folder` lies inside the store that is collected.
@@ -77,10 +77,10 @@ void run(const CollectOptions& options, Session& session) {
 
 void addCollect(Command& parent, Session& session) {
     const auto options = std::make_shared<CollectOptions>();
-    parent.add("collect", "Copy all but the data into a folder, to look at the store elsewhere")
-        .argument("FOLDER", "New or empty folder; what is collected there is a store for --root", options->folder)
-        .option("--luns", "FIRST-LAST", "LUN ids to look for (default: 0-255)", options->lids, parseRange32)
-        .action([options, &session] { run(*options, session); });
+    Command& command = parent.add("collect", "Copy all but the data into a folder, to look at the store elsewhere");
+    command.argument("FOLDER", "New or empty folder; what is collected there is a store for --root", options->folder);
+    addLunsOption(command, options->lids);
+    command.action([options, &session] { run(*options, session); });
 }
 
 }  // namespace epinspect

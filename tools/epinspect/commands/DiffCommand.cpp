@@ -4,6 +4,7 @@
 
 #include "commands/Commands.h"
 #include "commands/DiffOutput.h"
+#include "commands/MapArguments.h"
 #include "store/FileDiff.h"
 #include "store/Store.h"
 
@@ -12,7 +13,7 @@ namespace epinspect {
 namespace {
 
 struct DiffOptions {
-    std::string a, b;
+    LunName a, b;
     bool headersOnly = false;
     bool entriesOnly = false;
 };
@@ -43,6 +44,7 @@ public:
 
     void trying(bool begins) override { session_.trying(begins); }
     void changed(const std::string& name) override { session_.changed(folder_ + name); }
+    std::vector<std::string> takeTrialLog() override { return session_.takeTrialLog(); }
 
 private:
     Session& session_;
@@ -105,14 +107,17 @@ private:
 };
 
 void compareFiles(const DiffOptions& options, DiffScope scope, Session& session) {
+    const std::optional<NamedMap> a = findMap(session, options.a);
+    const std::optional<NamedMap> b = findMap(session, options.b);
+    if (!a || !b) return;
+    const DiffName names[] = {{a->file, a->lids()}, {b->file, b->lids()}};
     DiffTotals totals;
-    DiffOutput output(session, options.a, options.b, "");
+    DiffOutput output(session, names[0], names[1], "");
     bool areMaps = false;
-    const DiffSide a = {session, options.a, NamedBy::user};
-    const DiffSide b = {session, options.b, NamedBy::user};
-    if (!FilesDiff(scope, totals).compare(a, b, output, areMaps)) return;
+    const DiffSide sides[] = {{session, a->file, a->by}, {session, b->file, b->by}};
+    if (!FilesDiff(scope, totals).compare(sides[0], sides[1], output, areMaps)) return;
     scope.entries = areMaps;
-    printSummary(session, options.a, options.b, totals, scope);
+    printSummary(session, names[0], names[1], totals, scope);
 }
 
 /// Data files are compared by header and size; so are all others but maps, whose entries are compared.
@@ -125,7 +130,7 @@ void compareSizes(const FilePair& pair, DiffOutput& output, DiffTotals& totals) 
 
 void compareStores(const DiffOptions& options, DiffScope scope, Session& session) {
     scope.stores = true;
-    SideOfDiff sides[] = {{session, options.a}, {session, options.b}};
+    SideOfDiff sides[] = {{session, options.a.file}, {session, options.b.file}};
     DiffTotals totals;
     FilesDiff files(scope, totals);
     Store stores[] = {Store(sides[0], usualLids), Store(sides[1], usualLids)};
@@ -137,14 +142,14 @@ void compareStores(const DiffOptions& options, DiffScope scope, Session& session
             continue;
         }
         const std::string& path = pair.a->path;
-        DiffOutput output(session, path, path, path);
+        DiffOutput output(session, {path, lidsOf(pair.a->luns)}, {path, lidsOf(pair.b->luns)}, path);
         if (scope.headers) compareSizes(pair, output, totals);
         bool isMap = pair.a->kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
         const DiffSide a = {sides[0], path, NamedBy::target};
         const DiffSide b = {sides[1], path, NamedBy::target};
         if (scope.headers || isMap) files.compare(a, b, output, isMap);
     }
-    printSummary(session, options.a, options.b, totals, scope);
+    printSummary(session, {options.a.file}, {options.b.file}, totals, scope);
 }
 
 void run(const DiffOptions& options, Session& session) {
@@ -152,8 +157,8 @@ void run(const DiffOptions& options, Session& session) {
     scope.headers = !options.entriesOnly;
     scope.entries = !options.headersOnly;
     std::error_code error;
-    const bool folders[] = {std::filesystem::is_directory(options.a, error),
-                            std::filesystem::is_directory(options.b, error)};
+    const bool folders[] = {std::filesystem::is_directory(options.a.file, error),
+                            std::filesystem::is_directory(options.b.file, error)};
     if (folders[0] != folders[1]) throw UsageError{"A and B must both be files, or both be folders"};
     if (!folders[0]) return compareFiles(options, scope, session);
     if (session.root.isFolder()) throw UsageError{"--root: not with two folders, each of which is a root itself"};
@@ -165,8 +170,8 @@ void run(const DiffOptions& options, Session& session) {
 void addDiff(Command& parent, Session& session) {
     const auto options = std::make_shared<DiffOptions>();
     parent.add("diff", "Show what differs between two files, or between two stores")
-        .argument("A", "An EP file, or the folder of a store", options->a)
-        .argument("B", "What to compare it with: a file of the same kind, or another folder", options->b)
+        .argument("A", "An EP file, a LUN id for its map, or the folder of a store", options->a, parseMap)
+        .argument("B", "What to compare it with: a file of the same kind, or another folder", options->b, parseMap)
         .flag("--headers", "Compare the fields of header blocks alone", options->headersOnly)
         .flag("--entries", "Compare the entries of maps alone", options->entriesOnly)
         .flag("--json", "One JSON object per difference, then a summary", session.json)

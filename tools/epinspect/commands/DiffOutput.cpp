@@ -45,6 +45,11 @@ void writeSide(Json& json, const char (&name)[keySize], const DiffRun::Side& sid
     json.endObject();
 }
 
+Json& writeOther(Json& json, const DiffName& other) {
+    json.path("otherFile", other.file);
+    return other.lids.empty() ? json : json.number("otherLid", other.lids.front());
+}
+
 /// The lines of a field: of a list one for each element that differs.
 std::string linesOf(const FieldDifference& difference, const std::string& prefix) {
     const auto& [a, b] = difference;
@@ -75,13 +80,16 @@ std::string entriesText(const DiffSummary& summary) {
 
 }  // namespace
 
-DiffOutput::DiffOutput(Session& session, const std::string& file, const std::string& otherFile, const std::string& path)
-    : session_(session), otherFile_(otherFile), prefix_(path.empty() ? path : forReader(path) + ": "), json_(file) {}
+DiffOutput::DiffOutput(Session& session, const DiffName& file, DiffName otherFile, const std::string& path)
+    : session_(session),
+      otherFile_(std::move(otherFile)),
+      prefix_(path.empty() ? path : forReader(path) + ": "),
+      json_(file.file, file.lids) {}
 
 void DiffOutput::print(const FieldDifference& difference) {
     session_.differences = true;
     if (!session_.json) return epinspect::print(linesOf(difference, prefix_));
-    json_.begin("field").path("otherFile", otherFile_).text("field", difference.first.name);
+    writeOther(json_.begin("field"), otherFile_).text("field", difference.first.name);
     writeValue(json_, "a", difference.first);
     writeValue(json_, "b", difference.second);
     json_.end();
@@ -100,7 +108,7 @@ void DiffOutput::print(const DiffRun& run) {
 }
 
 void DiffOutput::printAsJson(const DiffRun& run) {
-    json_.begin("difference").path("otherFile", otherFile_).number("first", run.first).number("count", run.count);
+    writeOther(json_.begin("difference"), otherFile_).number("first", run.first).number("count", run.count);
     json_.text("difference", nameOf(run.difference).json);
     writeSide(json_, "a", run.a);
     writeSide(json_, "b", run.b);
@@ -116,16 +124,16 @@ void printOnlyInOne(Session& session, const FilePair& pair) {
               counted(file.size, "byte", "bytes") + "\n");
         return;
     }
-    Json json(file.path);
+    Json json(file.path, lidsOf(file.luns));
     json.begin("storeDifference").null("otherFile");
     json.text("difference", name.json).text("fileKind", file.kind->name).number("size", file.size).end();
 }
 
-void printSummary(const Session& session, const std::string& file, const std::string& otherFile,
-                  const DiffTotals& totals, const DiffScope& scope) {
+void printSummary(const Session& session, const DiffName& file, const DiffName& otherFile, const DiffTotals& totals,
+                  const DiffScope& scope) {
     if (session.json) {
-        Json json(file);
-        json.begin("summary").path("otherFile", otherFile).boolean("summary", true);
+        Json json(file.file, file.lids);
+        writeOther(json.begin("summary"), otherFile).boolean("summary", true);
         if (scope.stores) json.number("files", totals.files);
         json.number("fields", totals.fields)
             .number("same", totals.entries.same())

@@ -1,7 +1,9 @@
 // How differences of files are worded: a line each, or an object.
 #pragma once
 
+#include <cstdint>
 #include <string>
+#include <vector>
 
 #include "frame/Json.h"
 #include "frame/Session.h"
@@ -17,11 +19,17 @@ struct DiffTotals {
     DiffSummary entries;
 };
 
+/// A file, or the folder of a store, as the user called it; of a map the LUNs that it is known to be of.
+struct DiffName {
+    std::string file;
+    std::vector<std::uint32_t> lids = {};
+};
+
 /// Writes what differs between two files. Throws OutputFailure.
 class DiffOutput {
 public:
     /// `path` starts each line of text, where several files are compared.
-    DiffOutput(Session& session, const std::string& file, const std::string& otherFile, const std::string& path);
+    DiffOutput(Session& session, const DiffName& file, DiffName otherFile, const std::string& path);
 
     void print(const FieldDifference& difference);
     void print(const DiffRun& run);
@@ -30,7 +38,7 @@ private:
     void printAsJson(const DiffRun& run);
 
     Session& session_;
-    const std::string& otherFile_;
+    DiffName otherFile_;
     std::string prefix_;
     Json json_;
     LineBuffer line_;
@@ -46,7 +54,7 @@ struct DiffScope {
     bool stores = false;
 };
 
-void printSummary(const Session& session, const std::string& file, const std::string& otherFile,
-                  const DiffTotals& totals, const DiffScope& scope);
+void printSummary(const Session& session, const DiffName& file, const DiffName& otherFile, const DiffTotals& totals,
+                  const DiffScope& scope);
 
 }  // namespace epinspect

@@ -3,6 +3,7 @@
 #include <memory>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
 #include "commands/MapOutput.h"
 #include "frame/Json.h"
 #include "frame/Numbers.h"
@@ -17,7 +18,7 @@ namespace tool = ISCSI::TOOL;
 namespace {
 
 struct EntryOptions {
-    std::string file;
+    LunName map;
     std::vector<Range> ranges;
 };
 
@@ -31,39 +32,64 @@ void printEntry(Json* json, const tool::ISCSIEPFileMAP& file, std::uint64_t inde
     json->end();
 }
 
+/// The map, and how far its entries have come.
+struct Work {
+    const std::string& name;
+    tool::ISCSIEPFileMAP& file;
+    std::uint64_t done = 0;
+    std::uint64_t total = 0;  ///< entries that will come
+};
+
+/// How many entries will come. How many the file holds is looked up only where a range may reach past them.
+bool countEntries(const EntryOptions& options, Session& session, Work& work) {
+    std::optional<unsigned long long> held;
+    for (const Range range : options.ranges) {
+        if (range.first == range.last) {
+            ++work.total;
+            continue;
+        }
+        if (!held && !session.succeeded(work.file.getEntryCount(held.emplace()), {work.name, ""})) return false;
+        if (range.first < *held) work.total += std::min<std::uint64_t>(range.last, *held - 1) - range.first + 1;
+    }
+    return true;
+}
+
 /// The entries of a range up to the first one that is not there.
-void printRange(const EntryOptions& options, Session& session, Json* json, tool::ISCSIEPFileMAP& file, Range range) {
-    unsigned long long count = 0;
-    if (range.first < range.last && !session.succeeded(file.getEntryCount(count), {options.file, ""})) return;
-    const std::uint64_t end = std::clamp<std::uint64_t>(count, range.first, range.last);
-    const WalkEnd walk = walkMap(file, range, [&](std::uint64_t index, const auto& entries) {
-        for (const MapEntry& entry : entries) printEntry(json, file, index++, entry);
-        session.progress("entries", index - range.first, end - range.first + 1);
+void printRange(Session& session, Json* json, Work& work, Range range) {
+    const WalkEnd walk = walkMap(work.file, range, [&](std::uint64_t index, const auto& entries) {
+        for (const MapEntry& entry : entries) printEntry(json, work.file, index++, entry);
+        work.done += entries.size();
+        session.progress("entries", work.done, work.total);
     });
     const std::uint64_t next = range.first + walk.met;
     const std::string place = "entry " + std::to_string(next);
-    if (walk.error != 0) return session.failed({{options.file, place}, walk.error, walk.reason, {}});
+    if (walk.error != 0) return session.failed({{work.name, place}, walk.error, walk.reason, {}});
     if (next - 1 == range.last) return;
-    if (!session.succeeded(file.getEntryCount(count), {options.file, place})) return;
-    session.failed(pastEnd(options.file, place, count));
+    unsigned long long count = 0;
+    if (!session.succeeded(work.file.getEntryCount(count), {work.name, place})) return;
+    session.failed(pastEnd(work.name, place, count));
 }
 
 void run(const EntryOptions& options, Session& session) {
-    const std::optional<std::string> path = session.openablePath(options.file, NamedBy::user);
+    const std::optional<NamedMap> named = findMap(session, options.map);
+    const std::optional<std::string> path = named ? session.openablePath(named->file, named->by) : std::nullopt;
     if (!path) return;
     tool::ISCSIEPFileMAP file(*path);
-    if (!session.succeeded(file.parseHead0(), {options.file, ""})) return;
-    remarkOnDataStart(session, file, options.file);
-    Json json(options.file);
-    for (const Range range : options.ranges) printRange(options, session, session.json ? &json : nullptr, file, range);
+    if (!session.succeeded(file.parseHead0(), {named->file, ""})) return;
+    remarkOnDataStart(session, file, named->file);
+    Json json(named->file, named->lids());
+    Work work = {named->file, file};
+    if (!countEntries(options, session, work)) return;
+    for (const Range range : options.ranges) printRange(session, session.json ? &json : nullptr, work, range);
 }
 
 }  // namespace
 
 void addEntry(Command& parent, Session& session) {
     const auto options = std::make_shared<EntryOptions>();
-    parent.add("entry", "Show entries of a map file")
-        .argument("MAPFILE", "Map file of a LUN", options->file)
+    Command& command = parent.add("entry", "Show entries of a map");
+    addMapArgument(command, options->map);
+    command
         .arguments("INDEX", "Index of an entry, from 0; FIRST-LAST for all from FIRST to LAST", options->ranges,
                    parseRange)
         .flag("--json", "One JSON object per entry", session.json)

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
 #include "frame/Numbers.h"
 #include "frame/Output.h"
 #include "store/Doubts.h"
@@ -91,7 +92,7 @@ void addExtent(Command& parent, Session& session) {
         .argument("DATFILE", "Data file of a volume", options->file)
         .argument("INDEX", "Number of the extent in the file, from 0", options->index, parseNumber)
         .option("--extent-size", "SIZE", "Bytes of an extent; K, M, G or KiB, MiB, GiB may follow", options->extentSize,
-                parseSize32, Command::Need::one)
+                parseExtentSize, Command::Need::one)
         .flag("--raw", "The bytes themselves", options->raw)
         .action([options, &session] { run(*options, session); });
 }

@@ -2,6 +2,7 @@
 #include <memory>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
 #include "commands/MapOutput.h"
 #include "frame/Json.h"
 #include "frame/Numbers.h"
@@ -17,7 +18,8 @@ namespace epinspect {
 namespace {
 
 struct FindOptions {
-    std::vector<std::string> files;
+    std::vector<LunName> maps;
+    Lids lids = usualLids;
     RunSearch search;
 };
 
@@ -28,7 +30,7 @@ struct FindSummary {
 /// The map that is searched, and how its matches are written.
 struct SearchedMap {
     const std::string& name;
-    const Lun* lun;
+    std::vector<std::uint32_t> lids;
     const ISCSI::TOOL::ISCSIEPFileMAP& file;
     Json json;
     LineBuffer line;
@@ -38,7 +40,7 @@ void printMatch(SearchedMap& map, const RunMatch& match) {
     LineBuffer& line = map.line;
     line.clear();
     line.add(forReader(map.name), ": ");
-    if (map.lun != nullptr) line.add("LUN ").decimal(map.lun->record.lid).add(": ");
+    if (!map.lids.empty()) line.add(lunsText(map.lids), ": ");
     writeRange(line, match.run.first, match.run.count);
     writeEntries(line.add(": "), match.run.entry, match.run.count);
     if (match.lowAddress) {
@@ -52,17 +54,16 @@ void printMatch(SearchedMap& map, const RunMatch& match) {
 void printMatchAsJson(SearchedMap& map, const RunMatch& match) {
     Json& json = map.json;
     writeRun(json.begin("match"), match.run, entryOffset(map.file, match.run.first));
-    if (map.lun != nullptr) json.number("lid", map.lun->record.lid);
     if (match.lowAddress) json.number("addressBits", 48);
     json.end();
 }
 
 void searchMap(const FindOptions& options, Session& session, const StoreFile& file, FindSummary& summary) {
-    const NamedBy by = options.files.empty() ? NamedBy::target : NamedBy::user;
-    const OpenedMap map = openMap(session, file.path, by);
+    const OpenedMap map = openMap(session, file.path, file.by);
     if (!map.file) return;
     ++summary.files;
-    SearchedMap searched = {file.path, file.lun, *map.file, Json(file.path), LineBuffer()};
+    const std::vector<std::uint32_t> lids = lidsOf(file.luns);
+    SearchedMap searched = {file.path, lids, *map.file, Json(file.path, lids), LineBuffer()};
     const auto each = [&](const MapRun& run) {
         summary.entries += run.count;
         options.search.in(run, [&](const RunMatch& match) {
@@ -103,9 +104,9 @@ void printSummaryAsJson(const FindSummary& summary, const std::vector<std::strin
 void run(const FindOptions& options, Session& session) {
     if (!options.search.extents && !options.search.pool) throw UsageError{"--extent or --pool is missing"};
     FindSummary summary;
-    ChosenFiles(session, options.files, usualLids).forEach([&](const StoreFile& file) {
+    ChosenFiles(session, options.maps, options.lids).forEach([&](const StoreFile& file) {
         const bool isMap = file.kind != nullptr && file.kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
-        if (options.files.empty() && (!isMap || file.missing)) return;
+        if (options.maps.empty() && (!isMap || file.missing)) return;
         searchMap(options, session, file, summary);
     });
     if (session.json) {
@@ -119,14 +120,17 @@ void run(const FindOptions& options, Session& session) {
 
 void addFind(Command& parent, Session& session) {
     const auto options = std::make_shared<FindOptions>();
-    parent.add("find", "Show which map entries point at given extents or at a pool")
-        .arguments("MAPFILE", "Map files to search (default: all of the store)", options->files,
-                   Command::Need::severalOrNone)
+    Command& command = parent.add("find", "Show which map entries point at given extents or at a pool");
+    command
+        .arguments("MAP", "Maps to search: LUN ids, or paths of map files (default: all of the store)", options->maps,
+                   parseMap, Command::Need::severalOrNone)
         .option("--extent", "N", "Extent address; FIRST-LAST for all from FIRST to LAST", options->search.extents,
                 parseRange)
-        .option("--pool", "N", "Pool number; with --extent, both must fit", options->search.pool, parseNumber32)
-        .flag("--json", "One JSON object per match, then a summary", session.json)
-        .action([options, &session] { run(*options, session); });
+        .option("--pool", "N", "Pool number; with --extent, both must fit", options->search.pool, parseNumber32);
+    addLunsOption(command, options->lids);
+    command.flag("--json", "One JSON object per match, then a summary", session.json).action([options, &session] {
+        run(*options, session);
+    });
 }
 
 }  // namespace epinspect

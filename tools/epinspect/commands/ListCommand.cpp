@@ -5,8 +5,9 @@
 #include <memory>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
+#include "commands/MapOutput.h"
 #include "frame/Json.h"
-#include "frame/Numbers.h"
 #include "frame/Output.h"
 #include "store/Doubts.h"
 #include "store/Store.h"
@@ -39,7 +40,7 @@ void printFile(const StoreFile& file, const std::optional<std::uint64_t>& entrie
     std::vector<std::string> pieces = {file.kind->name +
                                        std::string(sizeColumns - std::min(sizeColumns - 1, size.size()), ' ') + size};
     if (file.misnamed) pieces.emplace_back("no data file of the target");
-    if (file.lun != nullptr) pieces.push_back("LUN " + std::to_string(file.lun->record.lid));
+    if (!file.luns.empty()) pieces.push_back(lunsText(lidsOf(file.luns)));
     if (entries) pieces.push_back(counted(*entries, "entry", "entries"));
     if (file.mapName) {
         const std::string& name = file.mapName->name;
@@ -53,7 +54,7 @@ void printFile(const StoreFile& file, const std::optional<std::uint64_t>& entrie
 }
 
 void writeFile(const StoreFile& file, const std::optional<std::uint64_t>& entries) {
-    Json json(file.path);
+    Json json(file.path, lidsOf(file.luns));
     json.begin("file").text("fileKind", file.kind->name);
     if (file.missing) {
         json.null("size");
@@ -65,30 +66,15 @@ void writeFile(const StoreFile& file, const std::optional<std::uint64_t>& entrie
     if (file.mapName) {
         json.text("typeName", file.mapName->typeName).text("uuid", file.mapName->uuid).text("name", file.mapName->name);
     }
-    if (file.lun != nullptr) json.number("lid", file.lun->record.lid);
     if (file.misnamed) json.boolean("misnamed", true);
     if (file.link) json.path("link", *file.link);
     if (!file.sameAs.empty()) json.path("sameAs", file.sameAs);
     json.end();
 }
 
-/// Says why no LUN of `lids` is known: a failure when the user asked for these.
-void sayNoLuns(Session& session, Range lids, bool askedFor) {
-    const Trial trial(session);
-    Lun lun;
-    const int error = loadLun(session, static_cast<std::uint32_t>(lids.first), lun);
-    if (askedFor) {
-        session.succeeded(error, subjectOf(lids));
-    } else {
-        complain(subjectOf(lids).part + ": none is known: " + tool::ISCSILUNConfInfo::getErrorText(error) + " (code " +
-                 std::to_string(error) + ")");
-    }
-}
-
-void run(Session& session, const std::optional<Range>& lids) {
+void run(Session& session, const Lids& lids) {
     session.remarkOnCollection();
-    Store store(session, lids.value_or(usualLids));
-    if (store.luns().empty()) sayNoLuns(session, lids.value_or(usualLids), lids.has_value());
+    Store store(session, lids);
     bool any = false;
     store.forEachFile([&](const StoreFile& file) {
         any = true;
@@ -105,12 +91,10 @@ void run(Session& session, const std::optional<Range>& lids) {
 }  // namespace
 
 void addList(Command& parent, Session& session) {
-    const auto lids = std::make_shared<std::optional<Range>>();
-    parent.add("list", "Show the files of the store, and which files of LUNs are missing")
-        .option("--luns", "FIRST-LAST", "LUN ids to look for in the configuration (default: 0-255)", *lids,
-                parseRange32)
-        .flag("--json", "One JSON object per file", session.json)
-        .action([lids, &session] { run(session, *lids); });
+    const auto lids = std::make_shared<Lids>(usualLids);
+    Command& command = parent.add("list", "Show the files of the store, and which files of LUNs are missing");
+    addLunsOption(command, *lids);
+    command.flag("--json", "One JSON object per file", session.json).action([lids, &session] { run(session, *lids); });
 }
 
 }  // namespace epinspect

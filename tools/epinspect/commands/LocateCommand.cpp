@@ -3,6 +3,7 @@
 #include <vector>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
 #include "commands/MapOutput.h"
 #include "commands/PlaceOptions.h"
 #include "frame/Json.h"
@@ -105,10 +106,9 @@ void findCandidates(const PlaceChoice& choice, Session& session, const LunMap& l
 }
 
 void writePlace(const LunMap& lun, const Byte& byte) {
-    Json json(lun.file);
-    json.begin("place");
-    if (lun.lid) json.number("lid", *lun.lid);
-    json.number("lunOffset", byte.offset)
+    Json json(lun.file, lun.lids);
+    json.begin("place")
+        .number("lunOffset", byte.offset)
         .number("index", byte.index)
         .number("remainder", byte.remainder)
         .number("entryOffset", entryOffset(*lun.map, byte.index));
@@ -188,7 +188,7 @@ void locate(const PlaceChoice& choice, Session& session, const LunMap& lun, Data
 }
 
 void run(const LocateOptions& options, Session& session) {
-    const std::optional<LunMap> lun = openLun(session, options.place);
+    const std::optional<LunMap> lun = openLunMap(session, options.place.map, options.place.extentSize);
     if (!lun) return;
     DataFiles files(session, lun->targetPath, true);
     for (const std::uint64_t offset : options.offsets) locate(options.place.choice, session, *lun, files, offset);
@@ -199,7 +199,7 @@ void run(const LocateOptions& options, Session& session) {
 void addLocate(Command& parent, Session& session) {
     const auto options = std::make_shared<LocateOptions>();
     Command& command = parent.add("locate", "Show where bytes of a LUN lie");
-    addLunArgument(command, options->place);
+    addMapArgument(command, options->place.map);
     command.arguments("OFFSET", "Offset of a byte in the LUN; K, M, G, T or KiB, MiB, GiB, TiB may follow",
                       options->offsets, parseSize);
     addPlaceOptions(command, options->place);

@@ -37,14 +37,12 @@ void printLun(Session& session, const Lun& lun) {
     object.end();
 }
 
-void printLuns(Session& session, Range range) {
+void printLuns(Session& session, Range lids) {
     const auto print = [&session](const Lun& lun) { printLun(session, lun); };
-    if (range.first < range.last && forEachLun(session, range, print)) return;
-    std::optional<Trial> trial;
-    if (range.first < range.last) trial.emplace(session);
-    // A single id; or none of the range exists, and the first one tells why.
+    if (lids.first < lids.last) return forEachLun(session, {lids.first, lids.last}, print);
     Lun lun;
-    if (session.succeeded(loadLun(session, static_cast<std::uint32_t>(range.first), lun), subjectOf(range))) print(lun);
+    const auto lid = static_cast<std::uint32_t>(lids.first);
+    if (session.succeeded(loadLun(session, lid, lun), subjectOf({lid, lid}))) print(lun);
 }
 
 }  // namespace

@@ -91,10 +91,12 @@ void LunCopy::reportMissing() {
     const Failure failure = bytes_.failureOf(part);
     session_.complainOf(failure);
     if (!session_.json) return;
-    Json object(lun_.file);
-    object.begin("missing");
-    if (lun_.lid) object.number("lid", *lun_.lid);
-    object.number("lunOffset", part.offset).number("length", part.length).text("message", messageOf(failure)).end();
+    Json object(lun_.file, lun_.lids);
+    object.begin("missing")
+        .number("lunOffset", part.offset)
+        .number("length", part.length)
+        .text("message", messageOf(failure))
+        .end();
 }
 
 void LunCopy::advance() {

@@ -3,6 +3,7 @@
 #include <memory>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
 #include "commands/MapChart.h"
 #include "commands/MapOutput.h"
 #include "frame/Json.h"
@@ -18,17 +19,18 @@ namespace tool = ISCSI::TOOL;
 namespace {
 
 struct MapOptions {
-    std::string file;
+    LunName map;
     std::uint64_t first = 0;
     std::uint64_t count = std::numeric_limits<std::uint64_t>::max();
     bool chart = false;
 };
 
-std::string textOf(const MapSummary& summary) {
-    return counted(summary.entries, "entry", "entries") + " in " + counted(summary.runs, "run", "runs") + ": " +
-           std::to_string(summary.mapped) + " mapped, " + std::to_string(summary.unmapped) + " unmapped, " +
-           counted(summary.holes, "hole", "holes") + "; " + std::to_string(summary.vpushed) + " vpushed, " +
-           std::to_string(summary.vpulled) + " vpulled, " + std::to_string(summary.synced) + " synced";
+std::string textOf(const NamedMap& map, const MapSummary& summary) {
+    return (map.luns.empty() ? "" : lunsText(map.lids()) + ": ") + counted(summary.entries, "entry", "entries") +
+           " in " + counted(summary.runs, "run", "runs") + ": " + std::to_string(summary.mapped) + " mapped, " +
+           std::to_string(summary.unmapped) + " unmapped, " + counted(summary.holes, "hole", "holes") + "; " +
+           std::to_string(summary.vpushed) + " vpushed, " + std::to_string(summary.vpulled) + " vpulled, " +
+           std::to_string(summary.synced) + " synced";
 }
 
 void printSummary(Json& json, const MapSummary& summary, const std::vector<std::string>& changed) {
@@ -47,18 +49,20 @@ void printSummary(Json& json, const MapSummary& summary, const std::vector<std::
 }
 
 void run(const MapOptions& options, Session& session) {
-    const OpenedMap map = openMap(session, options.file, NamedBy::user);
+    const std::optional<NamedMap> named = findMap(session, options.map);
+    if (!named) return;
+    const OpenedMap map = openMap(session, named->file, named->by);
     if (!map.file) return;
     tool::ISCSIEPFileMAP& file = *map.file;
     const std::uint64_t total = map.entries;
     if (options.first > 0 && options.first >= total) {
-        session.failed(pastEnd(options.file, "entry " + std::to_string(options.first), total));
+        session.failed(pastEnd(named->file, "entry " + std::to_string(options.first), total));
         return;
     }
     const std::uint64_t count = std::min(options.count, total - options.first);
     MapChart chart(options.first, count, outputWidth());
     MapSummary summary;
-    Json json(options.file);
+    Json json(named->file, named->lids());
     LineBuffer line;
     const auto each = [&](const MapRun& run) {
         summary.add(run);
@@ -76,16 +80,16 @@ void run(const MapOptions& options, Session& session) {
     session.listing = !options.chart;
     const Range range = {options.first, options.first + count - 1};
     const auto progress = [&](std::uint64_t done) { session.progress("entries", done, count); };
-    const auto failure = count > 0 ? walkRuns(options.file, file, range, progress, each) : std::nullopt;
+    const auto failure = count > 0 ? walkRuns(named->file, file, range, progress, each) : std::nullopt;
     if (failure) session.failed(*failure);
     map.watch->noticeChange();
     if (failure) return;
     if (session.json) {
         printSummary(json, summary, session.changedFiles());
     } else if (options.chart) {
-        print(chart.draw(outputIsUnicode()) + wrapped(textOf(summary), outputWidth(), 0));
+        print(chart.draw(outputIsUnicode()) + wrapped(textOf(*named, summary), outputWidth(), 0));
     } else {
-        print(textOf(summary) + "\n");
+        print(textOf(*named, summary) + "\n");
     }
 }
 
@@ -93,9 +97,9 @@ void run(const MapOptions& options, Session& session) {
 
 void addMap(Command& parent, Session& session) {
     const auto options = std::make_shared<MapOptions>();
-    parent.add("map", "Show all entries of a map file, merged into runs")
-        .argument("MAPFILE", "Map file of a LUN", options->file)
-        .option("--first", "N", "Index to start at (default: 0)", options->first, parseNumber)
+    Command& command = parent.add("map", "Show all entries of a map, merged into runs");
+    addMapArgument(command, options->map);
+    command.option("--first", "N", "Index to start at (default: 0)", options->first, parseNumber)
         .option("--count", "N", "Entries to show at most (default: all to the end of the file)", options->count,
                 parseNumber)
         .flag("--chart", "A picture instead of the runs", options->chart)

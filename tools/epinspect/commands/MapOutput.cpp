@@ -19,6 +19,16 @@ std::array<std::string, 16> flagMembers() {
 
 }  // namespace
 
+std::string lunsText(const std::vector<std::uint32_t>& lids) {
+    std::string text = lids.size() == 1 ? "LUN" : "LUNs";
+    const char* separator = " ";
+    for (const std::uint32_t lid : lids) {
+        text += separator + std::to_string(lid);
+        separator = ", ";
+    }
+    return text;
+}
+
 void writeRange(LineBuffer& text, std::uint64_t first, std::uint64_t count) {
     text.decimal(first);
     if (count > 1) text.add("-").decimal(first + count - 1);

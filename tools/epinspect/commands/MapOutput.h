@@ -1,12 +1,19 @@
 // How entries and runs are written.
 #pragma once
 
+#include <cstdint>
+#include <string>
+#include <vector>
+
 #include "frame/Inspection.h"
 #include "frame/Json.h"
 #include "frame/LineBuffer.h"
 #include "map/MapRuns.h"
 
 namespace epinspect {
+
+/// How the LUNs of a map are named: "LUN 1", or "LUNs 1, 4" where they have one map file.
+std::string lunsText(const std::vector<std::uint32_t>& lids);
 
 /// Appends "FIRST-LAST", or the one number when both are the same.
 void writeRange(LineBuffer& text, std::uint64_t first, std::uint64_t count);

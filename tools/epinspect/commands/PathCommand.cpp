@@ -6,6 +6,7 @@
 #include <memory>
 
 #include "commands/Commands.h"
+#include "commands/MapArguments.h"
 #include "frame/Numbers.h"
 #include "frame/Output.h"
 #include "store/Luns.h"
@@ -63,14 +64,14 @@ void addPath(Command& parent, Session& session) {
     addKind(path, session, options, "dat", "The data file that holds an extent address",
             [options](const ISCSIEPFile& file, std::string& result) {
                 constexpr auto limit = static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max());
-                if (options->extentSize > 0 && options->extentAddress > limit / options->extentSize) {
+                if (options->extentAddress > limit / options->extentSize) {
                     errno = 0;
                     return ISCSI::TOOL::EP_ERR_SEEK_FAILED;
                 }
                 return file.getDATFilePath(options->extentSize, options->extentAddress, result);
             })
         .option("--extent-size", "SIZE", "Bytes of an extent; K, M, G or KiB, MiB, GiB may follow", options->extentSize,
-                parseSize32, Command::Need::one)
+                parseExtentSize, Command::Need::one)
         .option("--extent-address", "N", "Extent address, as a map entry holds it", options->extentAddress, parseNumber,
                 Command::Need::one);
 }

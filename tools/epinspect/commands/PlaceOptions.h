@@ -1,4 +1,4 @@
-// What locate and read have in common: the LUN, and the options that settle how its bytes are placed.
+// What locate and read have in common: the map of a LUN, and the options that settle how its bytes are placed.
 #pragma once
 
 #include <cstdint>
@@ -12,15 +12,11 @@
 namespace epinspect {
 
 struct PlaceOptions {
-    LunName lun;
+    LunName map;
     std::optional<std::uint32_t> extentSize;
     PlaceChoice choice;
 };
 
-/// Opens the map of the LUN; reports what fails. Throws UsageError.
-std::optional<LunMap> openLun(Session& session, const PlaceOptions& options);
-
-void addLunArgument(Command& command, PlaceOptions& options);
 void addPlaceOptions(Command& command, PlaceOptions& options);
 
 }  // namespace epinspect

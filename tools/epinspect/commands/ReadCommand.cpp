@@ -10,6 +10,7 @@
 
 #include "commands/Commands.h"
 #include "commands/LunCopy.h"
+#include "commands/MapArguments.h"
 #include "commands/PlaceOptions.h"
 #include "frame/Interruption.h"
 #include "frame/Json.h"
@@ -95,10 +96,10 @@ void printSummary(const Session& session, const std::string& path, const LunMap&
               " data, " + std::to_string(totals.holes) + " holes, " + std::to_string(totals.missing) + " missing\n");
         return;
     }
-    Json json(lun.file);
-    json.begin("summary").boolean("summary", true);
-    if (lun.lid) json.number("lid", *lun.lid);
-    json.path("output", path)
+    Json json(lun.file, lun.lids);
+    json.begin("summary")
+        .boolean("summary", true)
+        .path("output", path)
         .number("bytes", totals.all())
         .number("data", totals.data)
         .number("holes", totals.holes)
@@ -151,7 +152,7 @@ void writeOutput(const ReadOptions& options, Session& session, const LunMap& lun
 void run(const ReadOptions& options, Session& session) {
     if (session.json && !options.output) throw UsageError{"--json needs --output"};
     if (!options.output && outputIsTerminal()) throw UsageError{"standard output is a terminal, not a file or a pipe"};
-    const std::optional<LunMap> lun = openLun(session, options.place);
+    const std::optional<LunMap> lun = openLunMap(session, options.place.map, options.place.extentSize);
     if (!lun) return;
     const std::uint64_t there = lun->size - std::min(lun->size, options.offset);
     if (there == 0 && (options.offset > 0 || options.length > 0U)) {
@@ -172,7 +173,7 @@ void run(const ReadOptions& options, Session& session) {
 void addRead(Command& parent, Session& session) {
     const auto options = std::make_shared<ReadOptions>();
     Command& command = parent.add("read", "Write a LUN's bytes; bytes that cannot be read become zeros");
-    addLunArgument(command, options->place);
+    addMapArgument(command, options->place.map);
     command
         .option("--offset", "SIZE", "Byte to start at (default: 0); K, M, G, T or KiB, MiB, GiB, TiB may follow",
                 options->offset, parseSize)

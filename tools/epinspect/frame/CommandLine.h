@@ -76,7 +76,7 @@ private:
     using Take = std::function<void(const std::string&)>;
 
     struct Parameter {
-        const char* name;   ///< "MAPFILE", "--first", "-v, --verbose"
+        const char* name;   ///< "MAP", "--first", "-v, --verbose"
         const char* value;  ///< "N"; "" for an argument or a flag
         const char* about;
         Take take;

@@ -34,7 +34,11 @@ std::string pathMembers(const std::string& name, const std::string& path) {
 
 }  // namespace
 
-Json::Json(const std::string& file) : file_(file.empty() ? R"("file":null)" : pathMembers("file", file)) {}
+Json::Json(const std::string& file, const std::vector<std::uint32_t>& lids)
+    : file_(file.empty() ? R"("file":null)" : pathMembers("file", file)) {
+    if (!lids.empty()) file_ += ",\"lid\":" + std::to_string(lids.front());
+    if (lids.size() > 1) file_ += ",\"lids\":" + nlohmann::json(lids).dump();
+}
 
 Json& Json::begin(const char* kind) {
     line_.clear();

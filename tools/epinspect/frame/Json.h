@@ -2,6 +2,7 @@
 // shows in hexadecimal is a "0x" text, every other number a number.
 #pragma once
 
+#include <cstdint>
 #include <string>
 #include <string_view>
 #include <type_traits>
@@ -14,8 +15,9 @@ namespace epinspect {
 /// Writes objects about one file. Each kind of value has a name of its own, so that none is taken for another.
 class Json {
 public:
-    /// `file` goes into every object; empty: what the objects are about is no file.
-    explicit Json(const std::string& file);
+    /// `file` goes into every object; empty: what the objects are about is no file. Of a map file so do the ids of the
+    /// LUNs that it is known to be of: "lid" the first, "lids" all where they are several.
+    explicit Json(const std::string& file, const std::vector<std::uint32_t>& lids = {});
 
     /// Starts an object: "kind" and "file".
     Json& begin(const char* kind);
@@ -89,7 +91,7 @@ private:
 
     void anyKey(std::string_view name);
 
-    std::string file_;  ///< the member "file" ready to be written, "fileHex" too where it is needed
+    std::string file_;  ///< the members that tell the file, ready to be written
     LineBuffer line_;
     bool inner_ = false;  ///< something precedes what comes next
 };

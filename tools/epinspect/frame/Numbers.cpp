@@ -10,10 +10,6 @@ std::uint32_t parseNumber32(const std::string& text) {
 
 std::uint64_t parseSize(const std::string& text) { return meant(sizeIn(text, most64Bits)); }
 
-std::uint32_t parseSize32(const std::string& text) {
-    return static_cast<std::uint32_t>(meant(sizeIn(text, most32Bits)));
-}
-
 Range parseRange(const std::string& text) { return meant(rangeIn(text, most64Bits)); }
 
 Range parseRange32(const std::string& text) { return meant(rangeIn(text, most32Bits)); }

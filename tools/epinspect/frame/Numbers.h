@@ -26,9 +26,6 @@ std::uint32_t parseNumber32(const std::string& text);
 /// A number of bytes of 64 bits.
 std::uint64_t parseSize(const std::string& text);
 
-/// A number of bytes of 32 bits.
-std::uint32_t parseSize32(const std::string& text);
-
 /// "NUMBER" or "FIRST-LAST", of 64 bits.
 Range parseRange(const std::string& text);
 

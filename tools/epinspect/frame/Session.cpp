@@ -10,6 +10,15 @@
 
 namespace epinspect {
 
+namespace {
+
+std::vector<std::uint32_t> lidsOf(const Subject& subject) {
+    if (!subject.lid) return {};
+    return {*subject.lid};
+}
+
+}  // namespace
+
 void Session::setRoot(const std::string& folder) {
     const std::error_code error = Context::setRoot(folder);
     if (error == std::errc::not_a_directory) throw UsageError{"not a folder"};
@@ -28,7 +37,8 @@ void Session::remarkOnCollection() {
 
 void Session::failed(const Failure& failure) {
     if (json) {
-        Json object(failure.subject.file);
+        const Subject& subject = failure.subject;
+        Json object(subject.file.empty() ? subject.map : subject.file, lidsOf(subject));
         object.begin("error");
         if (const char* name = ISCSI::TOOL::GetErrorName(failure.error)) {
             object.text("error", name);
@@ -42,6 +52,7 @@ void Session::failed(const Failure& failure) {
 
 void Session::complainOf(const Failure& failure) {
     failed_ = true;
+    for (const std::string& line : failure.log) complain(line);
     complain(messageOf(failure));
 }
 
@@ -59,9 +70,9 @@ void Session::progress(const char* things, std::uint64_t done, std::uint64_t tot
 void Session::trying(bool begins) {
     trials_ += begins ? 1U : -1U;
     if (trials_ == 0) {
-        quietTrials_.reset();
-    } else if (!quietTrials_) {
-        quietTrials_.emplace();
+        trialLog_.reset();
+    } else if (!trialLog_) {
+        trialLog_.emplace();
     }
 }
 

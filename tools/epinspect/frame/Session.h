@@ -3,6 +3,7 @@
 
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "frame/Inspection.h"
 #include "frame/Progress.h"
@@ -34,6 +35,7 @@ public:
     void progress(const char* things, std::uint64_t done, std::uint64_t total) override;
     void trying(bool begins) override;
     bool interrupted() override;
+    std::vector<std::string> takeTrialLog() override { return takeHeldLines(); }
 
     /// Takes the line that shows the progress away, for good.
     void endProgress() { progress_.reset(); }
@@ -45,7 +47,7 @@ private:
     bool failed_ = false;
     std::optional<QuietLog> quiet_;
     unsigned int trials_ = 0;
-    std::optional<QuietLog> quietTrials_;
+    std::optional<HeldLog> trialLog_;
     std::optional<Progress> progress_;
 };
 

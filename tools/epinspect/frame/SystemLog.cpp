@@ -7,6 +7,9 @@
 
 #include <cstdarg>
 #include <cstdio>
+#include <string>
+#include <utility>
+#include <vector>
 
 #include "frame/Output.h"
 
@@ -14,13 +17,19 @@ namespace {
 
 bool shown = false;
 unsigned int quiet = 0;
+bool holding = false;
+std::vector<std::string> held;
 
 constexpr std::size_t lineSize = 9216;  // the longest line holds a LUN record's texts
 
-/// Throws nothing: the caller is the library, which does not expect it.
-void show(const char* line) noexcept {
+/// Shows the line or holds it back. Throws nothing: the caller is the library, which does not expect it.
+void take(const char* line) noexcept {
     try {
-        epinspect::complain(line);
+        if (holding) {
+            held.emplace_back(line);
+        } else {
+            epinspect::complain(line);
+        }
     } catch (...) {
         epinspect::complainPlainly({"out of memory for a log line"});
     }
@@ -35,6 +44,15 @@ void showLogLines() { shown = true; }
 QuietLog::QuietLog() { ++quiet; }
 QuietLog::~QuietLog() { --quiet; }
 
+HeldLog::HeldLog() { holding = true; }
+
+HeldLog::~HeldLog() {
+    holding = false;
+    held.clear();
+}
+
+std::vector<std::string> takeHeldLines() { return std::exchange(held, {}); }
+
 }  // namespace epinspect
 
 extern "C" __attribute__((visibility("default"), format(printf, 2, 3))) void syslog(int priority, const char* format,
@@ -44,7 +62,7 @@ extern "C" __attribute__((visibility("default"), format(printf, 2, 3))) void sys
     va_start(arguments, format);
     std::vsnprintf(line, sizeof line, format, arguments);
     va_end(arguments);
-    if (shown) show(line);
+    if (shown) take(line);
     if (quiet > 0) return;
     va_start(arguments, format);
     vsyslog(priority, format, arguments);

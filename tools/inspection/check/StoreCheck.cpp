@@ -20,21 +20,24 @@ namespace tool = ISCSI::TOOL;
 
 namespace {
 
-std::string lidsText(Range lids) { return std::to_string(lids.first) + " to " + std::to_string(lids.last); }
-
 /// Whether a link lies at `hostPath`, wherever it leads.
 bool isLink(const std::string& hostPath) {
     std::error_code error;
     return std::filesystem::is_symlink(std::filesystem::symlink_status(hostPath, error));
 }
 
+/// The path of the table file of the volume on which the file at `path` of the target lies. False when it names none.
+bool findTable(Context& context, const std::string& path, std::string& table) {
+    const Trial trial(context);
+    return tool::ISCSIEPFile(path).getTBLFilePath(table) == 0;
+}
+
 }  // namespace
 
 void StoreCheck::run() {
-    for (const Lun& lun : files_.luns()) lunsByMap_[context_.root.plainPath(lun.mapPath)].push_back(&lun);
-    if (!files_.areNamed() && lunsByMap_.empty()) {
-        report_.notCompared("lun-size, extent-size, missing-map, missing-file: no LUN is known, ids " +
-                            lidsText(options_.lids) + " were tried");
+    if (!files_.areNamed() && files_.luns().empty()) {
+        report_.notCompared("lun-size, extent-size, missing-map, missing-file: no LUN with " + idsText(options_.lids) +
+                            " is known");
     }
     files_.forEach([this](const StoreFile& file) {
         checkFile(file);
@@ -52,7 +55,8 @@ void StoreCheck::run() {
 void StoreCheck::checkFile(const StoreFile& file) {
     checked_.insert(file.targetPath);
     const ChangeWatch watch(context_, file.path, file.hostPath);
-    report_.beginFile(file.path, file.lun != nullptr ? std::optional(file.lun->record.lid) : std::nullopt, watch);
+    report_.beginFile(file.path, file.lun() != nullptr ? std::optional(file.lun()->record.lid) : std::nullopt, watch);
+    if (file.luns.size() > 1) sameMaps_.push_back(file);
     if (file.missing) return checkMissing(file);
     anyFile_ = true;
     const FileKind* kind = file.kind != nullptr ? file.kind : &headKind;
@@ -74,7 +78,7 @@ void StoreCheck::checkFile(const StoreFile& file) {
 
 void StoreCheck::checkMissing(const StoreFile& file) {
     const MissingFile missing = missingAt(file.path, file.hostPath);
-    if (file.lun != nullptr) {
+    if (file.lun() != nullptr) {
         checkMissingMap(missing, report_);
     } else if (file.kind->type == tool::EP_FILE_TYPE_DAT) {
         checkMissingDataFile(missing, report_);
@@ -118,13 +122,10 @@ void StoreCheck::checkContent(const StoreFile& file, const FileKind& kind, tool:
 }
 
 void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) {
-    const auto luns = lunsByMap_.find(context_.root.targetPath(file.path));
-    if (luns != lunsByMap_.end()) {
-        for (const Lun* lun : luns->second) checkLunSize(file, content, *lun, report_);
-    } else if (files_.areNamed() || !lunsByMap_.empty()) {
-        report_.notCompared(
-            "lun-size, extent-size: no LUN with an id from " + lidsText(options_.lids) + " is known for this map",
-            file.path);
+    for (const Lun* lun : file.luns) checkLunSize(file, content, *lun, report_);
+    if (file.luns.empty() && (files_.areNamed() || !files_.luns().empty())) {
+        report_.notCompared("lun-size, extent-size: no LUN with " + idsText(options_.lids) + " is known for this map",
+                            file.path);
     }
     unsigned long long entries = 0;
     if (!context_.succeeded(content.getEntryCount(entries), {file.path, ""})) return;
@@ -161,7 +162,7 @@ void StoreCheck::useDataFiles(const StoreFile& file, MapRules& rules) {
     const auto giveUp = [&](const char* why) {
         report_.notCompared(std::string("missing-data-file, beyond-data-file: ") + why, file.path);
     };
-    const auto extentSize = file.lun != nullptr ? std::optional(file.lun->record.extentSize) : options_.extentSize;
+    const auto extentSize = file.lun() != nullptr ? std::optional(file.lun()->record.extentSize) : options_.extentSize;
     if (!extentSize) return giveUp("the extent size is not known, give --extent-size");
     if (*extentSize == 0) return giveUp("the extent size is 0");
     if (file.volume == 0) return giveUp("the path names no volume");
@@ -182,16 +183,13 @@ void StoreCheck::checkKinds() {
 }
 
 void StoreCheck::checkSameMaps() {
-    for (const auto& [map, luns] : lunsByMap_) {
-        if (!files_.areNamed() || checked_.count(map) > 0) checkSameMap(map, luns, report_);
-    }
+    for (const StoreFile& map : sameMaps_) checkSameMap(map.path, map.luns, report_);
 }
 
 void StoreCheck::checkExtentSizes() {
-    const Trial trial(context_);
     for (const Lun& lun : files_.luns()) {
         std::string table;
-        const bool onVolume = tool::ISCSIEPFile(lun.mapPath).getTBLFilePath(table) == 0;
+        const bool onVolume = findTable(context_, lun.mapPath, table);
         if (files_.areNamed() && checked_.count(context_.root.plainPath(lun.mapPath)) == 0 &&
             checked_.count(table) == 0)
             continue;

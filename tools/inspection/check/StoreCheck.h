@@ -23,8 +23,8 @@
 namespace inspection {
 
 struct CheckOptions {
-    std::vector<std::string> files;  ///< none: all of the store
-    Range lids = usualLids;
+    std::vector<LunName> files;  ///< none: all of the store
+    Lids lids = usualLids;
     std::optional<std::uint32_t> extentSize;  ///< of maps whose LUN is not known
 };
 
@@ -54,8 +54,8 @@ private:
     const CheckOptions& options_;
     ChosenFiles files_;
     Report& report_;
-    std::map<std::string, std::vector<const Lun*>> lunsByMap_;  ///< by path on the target
-    bool anyFile_ = false;                                      ///< something lies there
+    std::vector<StoreFile> sameMaps_;  ///< maps that several LUNs have
+    bool anyFile_ = false;             ///< something lies there
     CommonValues commonValues_;
     KindTypes kindTypes_;
     SharedExtents sharedExtents_;

@@ -48,7 +48,7 @@ Collector::Collector(Context& context, std::string folder, std::string program, 
     collection_.time = time;
 }
 
-void Collector::run(Range lids) {
+void Collector::run(const Lids& lids) {
     if (!writeList()) return;
     Store store(context_, lids);
     if (!writeLuns(store.luns())) return;

@@ -20,7 +20,7 @@ public:
 
     /// Once. Reports what cannot be read or written. After an interruption or a failure to write the collection stays
     /// as far as it came. Until finish() it says that it is incomplete.
-    void run(Range lids);
+    void run(const Lids& lids);
 
     /// Once, after run(): says whether the collection is complete. False when that cannot be written, which is
     /// reported.

@@ -53,7 +53,8 @@ public:
     /// Whether a long work is to end early, because the user wants so.
     virtual bool interrupted() { return false; }
 
-    /// Until the call with false, the log lines of the library are about what is only tried out. May be nested.
+    /// Until the call with false, the log lines of the library are about what is only tried out: nobody needs to see
+    /// them. May be nested.
     virtual void trying(bool begins) = 0;
 
     /// The file that the user called `name` has changed while it was read. Remarks on it, once a file.
@@ -64,6 +65,9 @@ public:
 
     /// These files, in the order in which that was noticed.
     const std::vector<std::string>& changedFiles() const { return changedFiles_; }
+
+    /// The log lines since a trial began, or since the last call. A failure that comes of the trial takes them along.
+    virtual std::vector<std::string> takeTrialLog() { return {}; }
 
     /// Reports the failure of a call of the library, right after it (the system's reason is still in errno), when
     /// `error` is not 0. Returns whether it is 0.

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <utility>
 
-#include "store/Luns.h"
 #include "store/OpenMap.h"
 
 namespace inspection {
@@ -14,20 +13,23 @@ namespace {
 
 constexpr std::uint64_t sizeLimit = std::uint64_t{1} << 63U;
 
-/// Finds out which map file is meant, and what the configuration tells of the LUN. Returns false after a failure.
-bool findMap(Context& context, const LunName& lun, LunMap& map) {
-    map.lid = lun.lid;
-    if (!lun.lid) {
-        map.file = lun.file;
-        map.targetPath = context.root.targetPath(lun.file);
-        return true;
+/// The extent size of the first LUN, with a remark where the others have another one.
+std::uint32_t extentSizeOf(Context& context, const NamedMap& map) {
+    const std::uint32_t extentSize = map.luns.front().record.extentSize;
+    for (const Lun& lun : map.luns) {
+        if (lun.record.extentSize == extentSize) continue;
+        const std::string other = std::to_string(lun.record.lid);
+        context.remark(map.file, "LUN " + other + " has this map file too, with another extent size");
     }
-    Lun known;
-    if (!context.succeeded(loadLun(context, *map.lid, known), map.subject(""))) return false;
-    map.file = map.targetPath = known.mapPath;
-    map.extentSize = known.record.extentSize;
-    map.size = std::min<std::uint64_t>(known.record.size, sizeLimit);
-    return true;
+    return extentSize;
+}
+
+/// Says why nothing is known of the LUN whose map this is.
+void reportUnknown(Context& context, const NamedMap& map) {
+    for (const Failure& failure : map.failures) context.failed(failure);
+    context.fail({map.file, ""},
+                 "extent size not known, give --extent-size: no LUN with " + idsText(usualLids) + " has this map file",
+                 tool::EP_ERR_BAD_EXTENT_SIZE);
 }
 
 }  // namespace
@@ -37,12 +39,12 @@ std::uint64_t LunMap::mappableSize() const {
 }
 
 LunMap LunMap::copy() const {
-    return {lid, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, entries, size};
+    return {lids, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, entries, size};
 }
 
 Subject LunMap::subject(const std::string& part) const {
-    if (!lid) return {file, part};
-    return {"", "LUN " + std::to_string(*lid) + (part.empty() ? "" : " ") + part};
+    if (lids.empty()) return {file, part};
+    return {"", "LUN " + std::to_string(lids.front()) + (part.empty() ? "" : " ") + part, lids.front(), file};
 }
 
 Failure LunMap::pastEnd(const std::string& part) const {
@@ -50,35 +52,34 @@ Failure LunMap::pastEnd(const std::string& part) const {
 }
 
 Failure LunMap::pastMap(const std::string& part) const {
-    return {{file, subject(part).part},
+    return {{file, subject(part).part, subject(part).lid},
             tool::EP_ERR_READ_FAILED,
             0,
             "past the end, the map's entries stand for " + std::to_string(mappableSize()) + " bytes"};
 }
 
-Typed<LunName> lunNameIn(const std::string& text) {
-    const std::string prefix = text.substr(0, 2);
-    const bool number = prefix == "0x" || prefix == "0X" ||
-                        (!text.empty() && text.find_first_not_of("0123456789") == std::string::npos);
-    if (!number) return LunName{std::nullopt, text};
-    const auto lid = numberIn(text, most32Bits);
-    if (lid.fault != nullptr) return lid.fault;
-    return LunName{static_cast<std::uint32_t>(lid.value), ""};
-}
-
 std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::optional<std::uint32_t> extentSize) {
+    const std::optional<NamedMap> named = findMap(context, lun);
+    if (!named) return std::nullopt;
+    const bool known = !named->luns.empty();
+    if (!known && !extentSize) {
+        reportUnknown(context, *named);
+        return std::nullopt;
+    }
     LunMap map;
-    if (!findMap(context, lun, map)) return std::nullopt;
-    map.extentSize = extentSize.value_or(map.extentSize);
+    map.lids = named->lids();
+    map.file = named->file;
+    map.targetPath = named->targetPath;
+    map.extentSize = extentSize ? *extentSize : extentSizeOf(context, *named);
     if (map.extentSize == 0) {
         context.failed({map.subject(""), tool::EP_ERR_BAD_EXTENT_SIZE, 0, {}});
         return std::nullopt;
     }
-    OpenedMap opened = openMap(context, map.file, map.lid ? NamedBy::target : NamedBy::user);
+    OpenedMap opened = openMap(context, map.file, named->by);
     if (opened.file == nullptr) return std::nullopt;
     map.map = std::move(opened.file);
     map.entries = opened.entries;
-    if (!map.lid) map.size = map.mappableSize();
+    map.size = known ? std::min<std::uint64_t>(named->luns.front().record.size, sizeLimit) : map.mappableSize();
     return map;
 }
 

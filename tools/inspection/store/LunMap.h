@@ -7,16 +7,17 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <vector>
 
-#include "Typed.h"
 #include "store/Context.h"
+#include "store/NamedMap.h"
 
 namespace inspection {
 
 struct LunMap {
-    std::optional<std::uint32_t> lid;  ///< when the user named the LUN by its id
-    std::string file;                  ///< the map file as the user typed it, or as the configuration tells it
-    std::string targetPath;            ///< the same on the target
+    std::vector<std::uint32_t> lids;  ///< of the LUNs whose map it is, as far as they are known
+    std::string file;                 ///< the map file as the user typed it, or as the configuration tells it
+    std::string targetPath;           ///< the same on the target
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFileMAP> map;  ///< its HEAD[0] is decoded
     std::uint32_t extentSize = 0;                      ///< never 0
     std::uint64_t entries = 0;
@@ -28,7 +29,7 @@ struct LunMap {
     /// The same LUN, for another thread.
     LunMap copy() const;
 
-    /// How messages name a part of the LUN, "byte 5".
+    /// How messages name a part of the LUN, "byte 5": with the first id where one is known, else with the file.
     Subject subject(const std::string& part) const;
 
     /// The failure of `part`, which lies past the end of the LUN, and past the last entry of the map.
@@ -36,17 +37,8 @@ struct LunMap {
     Failure pastMap(const std::string& part) const;
 };
 
-/// The name of a LUN as it is typed: its id, or the path of its map file.
-struct LunName {
-    std::optional<std::uint32_t> lid;
-    std::string file;
-};
-
-/// What is typed as such.
-Typed<LunName> lunNameIn(const std::string& text);
-
-/// Opens the map of a LUN. The extent size is that of the configuration unless one is given, which it must be for a LUN
-/// named by its map file. Reports what fails.
+/// Opens the map of a LUN. The extent size is that of the configuration unless one is given, which it must be for a map
+/// whose LUN is not known. Reports what fails.
 std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::optional<std::uint32_t> extentSize);
 
 }  // namespace inspection

@@ -50,7 +50,7 @@ void failEmptyStore(Context& context) {
     context.fail({top.empty() ? "/" : top, ""}, "no EP files found", tool::EP_ERR_NO_PATH);
 }
 
-Store::Store(Context& context, Range lids) : context_(context) {
+Store::Store(Context& context, const Lids& lids) : context_(context) {
     forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
@@ -59,7 +59,7 @@ Store::Store(Context& context, Range lids) : context_(context) {
     if (!luns_.empty()) folders_[{journalPlace, journalFolder}].insert(fs::path(journal).filename().string());
     for (const Lun& lun : luns_) {
         const std::string map = context.root.plainPath(lun.mapPath);
-        lunsByMap_.emplace(map, &lun);
+        lunsByMap_.add(map, lun);
         expect(map);
         const Trial trial(context);
         const tool::ISCSIEPFile file(map);
@@ -131,16 +131,16 @@ std::optional<StoreFile> Store::fileAt(const std::string& path, bool isExpected)
 
 /// What the names and the configuration tell of a file.
 void Store::describe(StoreFile& file) {
-    const auto lun = lunsByMap_.find(file.targetPath);
-    file.kind = lun != lunsByMap_.end() ? kindByType(tool::EP_FILE_TYPE_MAP) : kindByName(file.targetPath);
+    file.luns = lunsByMap_.at(file.targetPath);
+    const Lun* lun = file.lun();
+    file.kind = lun != nullptr ? kindByType(tool::EP_FILE_TYPE_MAP) : kindByName(file.targetPath);
     file.misnamed = isMisnamed(file.targetPath);
     file.link = context_.root.linkAt(file.targetPath);
     file.volume = volumeOf(context_, file.targetPath);
-    if (lun == lunsByMap_.end()) {
+    if (lun == nullptr) {
         if (file.kind->type == tool::EP_FILE_TYPE_MAP) file.mapName = mapNameIn(lastName(file.targetPath));
     } else {
-        file.lun = lun->second;
-        file.mapName = {file.lun->record.getTypeName(), file.lun->record.uuid, file.lun->record.name};
+        file.mapName = {lun->record.getTypeName(), lun->record.uuid, lun->record.name};
     }
 }
 

@@ -8,7 +8,6 @@
 #include <set>
 #include <string>
 #include <string_view>
-#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -31,6 +30,7 @@ void failEmptyStore(Context& context);
 struct StoreFile {
     const FileKind* kind = nullptr;  ///< what its name tells; null where it tells none, as a file named by the user may
     std::string path;                ///< what messages call it; of a file that was not named by the user on the target
+    NamedBy by = NamedBy::target;    ///< whose name `path` is
     std::string targetPath;          ///< on the target, in plain form
     std::string hostPath;            ///< where it is to be opened here
     std::uint64_t size = 0;
@@ -40,15 +40,18 @@ struct StoreFile {
     bool misnamed = false;                 ///< called like a data file, but not as the target calls one
     std::optional<std::string> link;       ///< what is stored in the link that lies there, if it is one
     std::string sameAs;                    ///< the path of an earlier file that is the same one, under another name
-    const Lun* lun = nullptr;              ///< of a map file, where the configuration knows the LUN
+    std::vector<const Lun*> luns;          ///< of a map file: whose it is by the configuration, lowest id first
     std::optional<MapName> mapName;        ///< of a map file, where the parts of its name are known
+
+    /// The LUN whose map this is: the first where there are several; null where none is known.
+    const Lun* lun() const { return luns.empty() ? nullptr : luns.front(); }
 };
 
 /// The store below the root folder.
 class Store {
 public:
-    /// Loads the LUNs whose ids are in `lids`; failures other than unused ids are reported.
-    Store(Context& context, Range lids);
+    /// Loads the LUNs whose ids are in `lids`, as forEachLun() does.
+    Store(Context& context, const Lids& lids);
 
     /// The LUNs found, lowest id first; none at all where there is no configuration.
     const std::vector<Lun>& luns() const { return luns_; }
@@ -72,10 +75,10 @@ private:
 
     Context& context_;
     std::vector<Lun> luns_;
-    std::unordered_map<std::string, const Lun*> lunsByMap_;  ///< by the paths of their map files
-    std::map<Place, std::set<std::string>> folders_;         ///< with the names of what should lie there
-    std::set<std::string> reported_;                         ///< what could not be looked at
-    std::map<FileIdentity, std::string> firstPaths_;         ///< of the files that forEachFile() has met
+    LunsByMap lunsByMap_;
+    std::map<Place, std::set<std::string>> folders_;  ///< with the names of what should lie there
+    std::set<std::string> reported_;                  ///< what could not be looked at
+    std::map<FileIdentity, std::string> firstPaths_;  ///< of the files that forEachFile() has met
 };
 
 }  // namespace inspection
