@@ -37,7 +37,7 @@ std::uint64_t LunMap::mappableSize() const {
 }
 
 LunMap LunMap::copy() const {
-    return {lid, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, entries, size};
+    return {lid, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, {}, entries, size};
 }
 
 Subject LunMap::subject(const std::string& part) const {
@@ -77,6 +77,7 @@ std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::opti
     OpenedMap opened = openMap(context, map.file);
     if (opened.file == nullptr) return std::nullopt;
     map.map = std::move(opened.file);
+    map.watch = opened.watch;
     map.entries = opened.entries;
     if (!map.lid) map.size = map.mappableSize();
     return map;
