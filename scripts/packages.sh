@@ -8,6 +8,7 @@ need "${build_packages[@]}" dpkg-dev debhelper
 
 own=$(dpkg --print-architecture)
 architecture=${1:-$own} folder=${2:-build/packages/${1:-$own}}
+[ "$architecture" != "$own" ] || need "${plugin_packages[@]}"
 [ "$architecture" = "$own" ] || need "g++-$(dpkg-architecture -a "$architecture" -qDEB_HOST_MULTIARCH 2>/dev/null)"
 
 # Built in a copy, so that nothing is left among the sources.

@@ -150,8 +150,8 @@ const Case cases[] = {
     {"read gets all that can be had", "epinspect --root far read 5 >image; echo $?; wc -c <image; "
      "grep -abo '[a-z][a-z]*' image; epinspect --root far read 5 --count-from file --address-bits 48 2>/dev/null | "
      "grep -abo '[a-z][a-z]*'", 0, "1\n6291456\n4194304:three\n1048576:here\n2097152:two\n4194304:three\n",
-     "epinspect: " + ep + "0: LUN 5 bytes 0-1048575: " + beyond0 + "epinspect: " + ep + "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and "
-     "both places lie inside the file; --count-from decides …\nepinspect: LUN 5 bytes 2097152-3145727: " + open2 +
+     "epinspect: " + ep + "0: LUN 5 bytes 0-1048575: " + beyond0 + "epinspect: " + ep +
+     "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and both places lie inside the file; --count-from decides …\nepinspect: LUN 5 bytes 2097152-3145727: " + open2 +
      "epinspect: " + ep + "2: LUN 5 bytes 3145728-4194303: " + notFound + "epinspect: " + ep + "0: LUN 5 bytes "
      "4718592-5242879: " + beyond0 + "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: past the end, …\n"
      "epinspect: LUN 5: 5242880 of 6291456 bytes could not be read, zeros stand in their place\n"},
@@ -179,15 +179,17 @@ const Case cases[] = {
 TEST_F(Store, ReadLosesNoMoreThanWhatCannotBeRead) {
     EPFileBuilder data = EPFileBuilder::data().bytes(24576 + 3 * MiB, std::string(700000, 'x'));
     write("far" + ep + "0", data.resize(24576 + 4 * MiB));
-    const auto expectRead = [this](int result, std::int64_t bad, const std::string& read, const std::string& lost) {
+    std::vector<const char*> words = {"read", "5", "--offset=4194404", "--length=600000"};
+    const auto expectRead = [&](int result, std::int64_t bad, const std::string& read, const std::string& lost) {
         EXPECT_EQ(1, run([&] {
                       std::tie(badResult, badPosition) = std::pair(result, bad);
                       const std::string root = path("far");
-                      _exit(runHere({"", "--root", root.c_str(), "read", "5", "--offset=4194404", "--length=600000"}));
+                      words.insert(words.begin(), {"", "--root", root.c_str()});
+                      _exit(runHere(words));
                   }));
         EXPECT_TRUE(fits(content(".out"), read));
-        EXPECT_TRUE(fits(content(".err"),
-                         "epinspect: " + lost + " of 600000 bytes could not be read, zeros stand in their place\n"));
+        EXPECT_TRUE(
+            fits(content(".err"), "epinspect: " + lost + " bytes could not be read, zeros stand in their place\n"));
     };
     // Of the extent's blocks of 4096 bytes number 72; the bytes asked for start at byte 100 of the extent. Then the
     // map.
@@ -195,9 +197,17 @@ TEST_F(Store, ReadLosesNoMoreThanWhatCannotBeRead) {
     const std::string reason = "cannot be read: Input/output error (EP_ERR_READ_FAILED, 18990039)";
     expectRead(-1, 24576 + 3 * MiB + 298000,
                std::string(294812, 'x') + std::string(4096, '\0') + std::string(301092, 'x'),
-               ep + "0: LUN 5 bytes 4489216-4493311: " + reason + "…LUN 5: 4096");
-    expectRead(-1, 24576 + 32, zeros, all + reason + "…LUN 5: 600000");
-    expectRead(0, 24576 + 32, zeros, all + "the file has become shorter while it was read (…LUN 5: 600000");
+               ep + "0: LUN 5 bytes 4489216-4493311: " + reason + "…LUN 5: 4096 of 600000");
+    expectRead(-1, 24576 + 32, zeros, all + reason + "…LUN 5: 600000 of 600000");
+    expectRead(0, 24576 + 32, zeros, all + "the file has become shorter while it was read (…LUN 5: 600000 of 600000");
+    // A block of a map is 512 entries.
+    std::string entries;
+    for (std::uint64_t i = 0; i < 6144; ++i) entries += epbuilder::littleEndian(mapped | (3072 + i % 1024), 8);
+    write("far" + lun5, EPFileBuilder::map().bytes(24576, entries));
+    words = {"read", "5", "--extent-size=1K", "--length=1200000"};
+    const std::string before(524288, 'x'), after(151424, 'x');
+    expectRead(-1, 24576 + 4096 + 32, before + std::string(524288, '\0') + after,
+               lun5 + ": LUN 5 bytes 524288-1048575: " + reason + "…LUN 5: 524288 of 1200000");
 }
 
 TEST_P(Store, DoesAsPromised) { expect(GetParam()); }

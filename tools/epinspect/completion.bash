@@ -29,7 +29,7 @@ _epinspect() {
     for ((index = 1; index < ${#typed[@]} - 1; index++)); do
         case ${typed[index]} in
             --root) root=${typed[++index]} ;;
-            --as | --first | --count | --luns | --extent | --pool | --offset | --length) ((++index)) ;;
+            --as | --first | --count | --luns | --extent | --pool | --offset | --length | --output) ((++index)) ;;
             --extent-size | --extent-address | --address-bits | --count-from) ((++index)) ;;
             -*) ;;
             *)
@@ -54,7 +54,7 @@ _epinspect() {
         diff) options+=' --headers --entries --json' ;;
         find) options+=' --extent --pool --luns --json' ;;
         locate) options+=' --extent-size --address-bits --count-from --json' ;;
-        read) options+=' --offset --length --extent-size --address-bits --count-from' ;;
+        read) options+=' --offset --length --output --json --extent-size --address-bits --count-from' ;;
         map) options+=' --first --count --chart --json' ;;
         extent) options+=' --extent-size --raw' ;;
         path)
@@ -65,6 +65,7 @@ _epinspect() {
     case $before in
         --as) options='tbl map dat fri jnl head' ;;
         --root) files=-d ;;
+        --output) files=-f root='' ;;
         --address-bits) options='48 52' ;;
         --count-from) options='file volume' ;;
         --first | --count | --luns | --extent | --pool | --offset | --length | --extent-size | --extent-address) return ;;

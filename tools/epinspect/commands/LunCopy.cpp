@@ -11,7 +11,7 @@ namespace epinspect {
 
 namespace {
 
-constexpr std::uint64_t pieceSize = 1U << 20U;  ///< of a read
+constexpr std::uint64_t pieceSize = 2U << 20U;  ///< of a read
 
 /// The system copies fastest to where a page starts.
 struct alignas(4096) Page {
@@ -42,6 +42,7 @@ void LunCopy::run(std::uint64_t offset, std::uint64_t length) {
         throw;
     }
     reportMissing();
+    bytes_.noticeChanges();
 }
 
 void LunCopy::copyData(const LunPart& part) {

@@ -104,6 +104,7 @@ void printSummary(const Session& session, const std::string& path, const LunMap&
         .number("data", totals.data)
         .number("holes", totals.holes)
         .number("missing", totals.missing)
+        .texts("changed", session.changedFiles())
         .end();
 }
 

@@ -51,9 +51,10 @@ void eraseStatusLine() noexcept {
 int writeAll(int stream, std::string_view text) noexcept {
     while (!text.empty()) {
         const ssize_t written = write(stream, text.data(), text.size());
-        if (written < 0 && errno == EINTR && interruption() == 0) continue;
+        if (written < 0 && errno == EINTR && !isInterrupted()) continue;
         if (written < 0) return errno;
         text.remove_prefix(static_cast<std::size_t>(written));
+        if (!text.empty() && isInterrupted()) return EINTR;
     }
     return 0;
 }

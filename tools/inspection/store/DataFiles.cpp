@@ -24,8 +24,18 @@ const DataFile& DataFiles::at(std::uint64_t number) {
         known->second.looks = looks_;
         return known->second;
     }
-    if (known == files_.end() && files_.size() >= mostFiles) files_.clear();
+    if (known == files_.end() && files_.size() >= mostFiles) {
+        noticeChanges();
+        files_.clear();
+    }
+    if (known != files_.end() && known->second.watch) known->second.watch->noticeChange();
     return files_[number] = open(number);
+}
+
+void DataFiles::noticeChanges() const {
+    for (const auto& file : files_) {
+        if (file.second.watch) file.second.watch->noticeChange();
+    }
 }
 
 bool DataFiles::isAsOpened(const DataFile& data) const {
@@ -71,6 +81,7 @@ DataFile DataFiles::open(std::uint64_t number) {
         data.missing = true;
         return failed(tool::EP_ERR_OPEN_FAILED, ENOENT);
     }
+    if (remarks_) data.watch.emplace(context_, data.path, located.hostPath);
     data.state = stateOf(located.hostPath);
     data.file = std::make_unique<tool::ISCSIEPFileDAT>(located.hostPath);
     // Nothing is read yet: this finds out whether there can be extents at all.

@@ -251,6 +251,11 @@ bool LunBytes::read(std::uint64_t offset, std::uint64_t length, unsigned char* b
     return goOn;
 }
 
+void LunBytes::noticeChanges() const {
+    if (lun_.watch) lun_.watch->noticeChange();
+    files_.noticeChanges();
+}
+
 Failure LunBytes::failureOf(const LunPart& part) const {
     Failure failure = part.failure;
     const Subject subject = lun_.subject(bytesText(part.offset, part.end()));

@@ -63,6 +63,9 @@ public:
     /// holes, and for what is unreadable, for which missing() is called. Returns false when missing() did.
     bool read(std::uint64_t offset, std::uint64_t length, unsigned char* bytes, const Each& missing);
 
+    /// Tells the context which files have changed since they were opened.
+    void noticeChanges() const;
+
     /// The failure of a part that is unreadable, as messages say it.
     Failure failureOf(const LunPart& part) const;
 

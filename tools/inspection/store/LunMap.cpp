@@ -39,7 +39,7 @@ std::uint64_t LunMap::mappableSize() const {
 }
 
 LunMap LunMap::copy() const {
-    return {lids, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, entries, size};
+    return {lids, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, {}, entries, size};
 }
 
 Subject LunMap::subject(const std::string& part) const {
@@ -78,6 +78,7 @@ std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::opti
     OpenedMap opened = openMap(context, map.file, named->by);
     if (opened.file == nullptr) return std::nullopt;
     map.map = std::move(opened.file);
+    map.watch = opened.watch;
     map.entries = opened.entries;
     map.size = known ? std::min<std::uint64_t>(named->luns.front().record.size, sizeLimit) : map.mappableSize();
     return map;

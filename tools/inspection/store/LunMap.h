@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include "store/ChangeWatch.h"
 #include "store/Context.h"
 #include "store/NamedMap.h"
 
@@ -20,6 +21,7 @@ struct LunMap {
     std::string targetPath;           ///< the same on the target
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFileMAP> map;  ///< its HEAD[0] is decoded
     std::uint32_t extentSize = 0;                      ///< never 0
+    std::optional<ChangeWatch> watch;                  ///< of the map file, from before it was opened
     std::uint64_t entries = 0;
     std::uint64_t size = 0;  ///< bytes of the LUN, at most 2^63: as configured, else what the entries hold
 
