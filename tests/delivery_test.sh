@@ -20,7 +20,9 @@ symbols=$(nm -DC --defined-only "$build/lib/libiscsieptool.so.1" | cut -d' ' -f3
 cmake --install "$build" --prefix "$scratch/first" >/dev/null
 mv "$scratch/first" "$scratch/moved"
 # With the programs come their manual pages, and every document that these name.
-for document in $(grep -ohE '[a-z-]+\.md$' "$scratch"/moved/share/man/man1/*.1 | sort -u); do
+mapfile -t documents < <(grep -ohE '[a-z-]+\.md$' "$scratch"/moved/share/man/man1/*.1 | sort -u)
+[ "${#documents[@]}" -gt 0 ] || fail "the manual names no document"
+for document in "${documents[@]}"; do
   [ -s "$scratch/moved/share/doc/epinspect/$document" ] || fail "the manual names $document, which is not installed"
 done
 [ -s "$scratch/moved/share/man/man1/epsample.1" ] || fail "no manual page"

@@ -31,7 +31,8 @@ const Case cases[] = {
      gone1 + "768 entries in 3 runs, first entries 512-767: extent 4194816" + no1 +
      "9 files, 4352 entries, 1 finding: 1 missing-data-file\n" +
      gone1 + "entries 512-767: extent 4194816" + no1 + gone1 + "entries 1536-1791: extent 4195840" + no1 +
-     gone1 + "entries 3584-3839: extent 4197888" + no1 + "9 files, 4352 entries, 3 findings: 3 missing-data-file\n", ""},
+     gone1 + "entries 3584-3839: extent 4197888" + no1 + "9 files, 4352 entries, 3 findings: 3 missing-data-file\n",
+     ""},
     {"all there is", "epinspect check --root none; mkdir none; epinspect check --root none", 1,
      "0 files, 0 entries, 0 findings\n"
      "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",
@@ -51,7 +52,8 @@ const Case cases[] = {
     {"one of two kinds with one type",
      "cd own; rm -r volume2; sed -i '/lid.: 2/,$d; s/},$/}]/' var/db/iscsi/luns.json; "
      "cp volume1/@iSCSI/EP/EP_FRI var/db/iscsi/EP_JNL; epinspect --root . check", 3,
-     journal + ": kind: type 2, which the free-index file " + volume1 + "EP/EP_FRI has too, but named like a journal\n" +
+     journal + ": kind: type 2, which the free-index file " + volume1 + "EP/EP_FRI has too, but named like a "
+     "journal\n" +
      volume1 + "EP/EP_FRI: kind: type 2, which the journal " + journal + " has too, but named like a free-index file\n"
      "6 files, 4096 entries, 2 findings: 2 kind\n", ""},
     {"a table with a type of its own, beside two that agree",

@@ -80,7 +80,8 @@ const Case cases[] = {
     {"refuses what is no map", "epinspect map data; epinspect entry data 0", 1, "",
      says({"data" + wrongType, "data: entry 0" + wrongType})},
     {"says where a map became unreadable", meanwhile("epinspect map many", "rm many"), 1,
-     "4095: unmapped, pool 2615, extent 2029926973911601\n", says({"many: entry 4096" + missing, "many: has changed while it was read"})},
+     "4095: unmapped, pool 2615, extent 2029926973911601\n", says({"many: entry 4096" +
+     missing, "many: has changed while it was read"})},
     {"says where entries became unreadable", meanwhile("epinspect entry many 1-9999", "rm many"), 1,
      "4096: pool number: 2615 ,…\n", says({"many: entry 4097" + missing})},
     {"says when a map became shorter", meanwhile("epinspect map many --json", "truncate -s 57344 many"), 1,
