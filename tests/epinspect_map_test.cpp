@@ -68,10 +68,10 @@ const Case cases[] = {
     {"writes entries as JSON", "epinspect entry --json seven 2-2", 0,
      R"({"kind":"entry","file":"seven","index":2,"entryOffset":24592,"extentAddress":7,"poolNumber":16,"mapped":true,)"
      R"("vpushed":false,"vpulled":true,"synced":false})" "\n", ""},
-    {"refuses entries behind the end and goes on", "epinspect entry seven 6-9 18446744073709551615 2305843009213690880 "
+    {"refuses entries past the end and goes on", "epinspect entry seven 6-9 18446744073709551615 2305843009213690880 "
      "6", 1, "6: pool number: 0 ,…\n6: pool number: 0 ,…\n", says({"seven: entry 7" + holds("0-6"),
      "seven: entry 18446744073709551615" + holds("0-6"), "seven: entry 2305843009213690880" + holds("0-6")})},
-    {"refuses to start behind the end", "for n in 7 18446744073709551615; do epinspect map seven --first $n; done; "
+    {"refuses to start past the end", "for n in 7 18446744073709551615; do epinspect map seven --first $n; done; "
      "epinspect map none --first 1", 1, "", says({"seven: entry 7" + holds("0-6"),
      "seven: entry 18446744073709551615" + holds("0-6"), "none: entry 1" + holds("none")})},
     {"says what is doubtful", "printf x >>none; epinspect map none; epinspect map far; epinspect entry far 0", 1,

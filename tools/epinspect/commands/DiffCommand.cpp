@@ -18,7 +18,7 @@ struct DiffOptions {
     bool entriesOnly = false;
 };
 
-/// One of two stores, below a folder of its own. What failed there is said with that folder.
+/// One of two stores, below a folder of its own. Failures there are reported with that folder.
 class SideOfDiff : public Context {
 public:
     SideOfDiff(Session& session, const std::string& folder) : session_(session), folder_(folder) {

@@ -100,7 +100,7 @@ std::string sharedText(const Finding& finding) {
            extentsText(entries.entry.extentAddress, entries.count) + ", used by " + partnerText(finding) + " too";
 }
 
-/// What a finding says of its entries.
+/// The part of a message that describes the entries.
 std::string entriesMessage(const Finding& finding) {
     const Finding::Entries& entries = *finding.entries;
     const std::string stored = shown(finding.stored);
