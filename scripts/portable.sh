@@ -16,7 +16,7 @@ case $architecture in # the oldest processor that Debian's programs for it run o
   *) echo "scripts/portable.sh: unknown architecture '$architecture', known: armel armhf amd64" >&2 && exit 2 ;;
 esac
 need "${build_packages[@]}" binutils jq "$compiler" ${processor:+qemu-user-static}
-setup=(-DISCSIEPTOOL_STATIC=ON -DBUILD_TESTING=OFF -DISCSIEPTOOL_BUILD_BENCH=OFF
+setup=(-DISCSIEPTOOL_STATIC=ON -DBUILD_TESTING=OFF -DISCSIEPTOOL_BUILD_BENCH=OFF -DCMAKE_UNITY_BUILD=ON
   -DCMAKE_BUILD_TYPE=Release "-DCMAKE_CXX_FLAGS_RELEASE=-O2 -DNDEBUG")
 if [ "$processor" ]; then
   setup+=("-DCMAKE_TOOLCHAIN_FILE=$PWD/cmake/$architecture.cmake")

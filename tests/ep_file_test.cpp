@@ -12,7 +12,7 @@
 #include <locale>
 #include <map>
 #include <new>
-#include <regex>
+#include <sstream>
 
 #include "Dumps.h"
 #include "Support.h"
@@ -24,15 +24,25 @@ namespace head0 = epbuilder::head0;
 namespace {
 
 /// The dump of a new object, made from the one of a file: values are 0, in 1970 or empty, and there are no pools.
-std::string emptied(std::string dump) {
-    const std::string epoch = "\tThu Jan 01 00:00:00 UTC 1970";
-    const std::map<std::string, std::string> values = {{"\t0x[0-9a-f]+", "\t0x0"},
-                                                       {"\t[0-9]+\n", "\t0\n"},
-                                                       {"\t[0-9a-f]{8}-.*", "\t"},
-                                                       {"\t[^\t]* UTC .*", epoch},
-                                                       {"pool #.*\n", ""}};
-    for (const auto& [value, none] : values) dump = std::regex_replace(dump, std::regex(value), none);
-    return dump;
+std::string emptied(const std::string& dump) {
+    std::string text;
+    std::istringstream lines(dump);
+    for (std::string line; std::getline(lines, line);) {
+        if (line.rfind("pool #", 0) == 0) continue;
+        const std::size_t start = line[0] == '=' ? line.size() : line.rfind('\t') + 1;
+        std::string value = line.substr(start);
+        if (value.rfind("0x", 0) == 0) {
+            value = "0x0";
+        } else if (value.find(" UTC ") != std::string::npos) {
+            value = "Thu Jan 01 00:00:00 UTC 1970";
+        } else if (value.find('-') != std::string::npos) {
+            value.clear();
+        } else if (!value.empty()) {
+            value = "0";
+        }
+        text += line.substr(0, start) + value + "\n";
+    }
+    return text;
 }
 
 /// What a new object shows, made where memory holds something else.

@@ -1,35 +1,21 @@
 #include "frame/Json.h"
 
-#include <etc/ISCSIQuorinStringTool.h>
-
-#include <nlohmann/json.hpp>
-
+#include "JsonText.h"
 #include "frame/Output.h"
 
 namespace epinspect {
 
+using inspection::hexOf;
+using inspection::isUTF8;
+using inspection::jsonText;
+
 namespace {
-
-std::string escaped(std::string_view text) {
-    return nlohmann::json(text).dump(-1, ' ', true, nlohmann::json::error_handler_t::replace);
-}
-
-bool isUTF8(const std::string& text) {
-    try {
-        static_cast<void>(nlohmann::json(text).dump());
-        return true;
-    } catch (const nlohmann::json::type_error&) {
-        return false;
-    }
-}
 
 /// The members that tell a path: "NAME", and "NAMEHex" where it is not UTF-8.
 std::string pathMembers(const std::string& name, const std::string& path) {
-    std::string members = "\"" + name + "\":" + escaped(path);
+    std::string members = "\"" + name + "\":" + jsonText(path);
     if (isUTF8(path)) return members;
-    std::string digits(2 * path.size(), '\0');
-    ISCSI::TOOL::PutHexDigits(reinterpret_cast<const unsigned char*>(path.data()), path.size(), digits.data());
-    return members.append(",\"").append(name).append("Hex\":\"").append(digits).append("\"");
+    return members.append(",\"").append(name).append("Hex\":\"").append(hexOf(path)).append("\"");
 }
 
 }  // namespace
@@ -37,7 +23,10 @@ std::string pathMembers(const std::string& name, const std::string& path) {
 Json::Json(const std::string& file, const std::vector<std::uint32_t>& lids)
     : file_(file.empty() ? R"("file":null)" : pathMembers("file", file)) {
     if (!lids.empty()) file_ += ",\"lid\":" + std::to_string(lids.front());
-    if (lids.size() > 1) file_ += ",\"lids\":" + nlohmann::json(lids).dump();
+    if (lids.size() < 2) return;
+    file_ += ",\"lids\":[" + std::to_string(lids[0]);
+    for (std::size_t i = 1; i < lids.size(); ++i) file_ += "," + std::to_string(lids[i]);
+    file_ += "]";
 }
 
 Json& Json::begin(const char* kind) {
@@ -66,7 +55,7 @@ Json& Json::hexadecimal(std::string_view name, std::uint64_t value) {
 
 Json& Json::text(std::string_view name, std::string_view value) {
     anyKey(name);
-    line_.add(escaped(value));
+    line_.add(jsonText(value));
     return *this;
 }
 
@@ -76,7 +65,7 @@ Json& Json::texts(std::string_view name, const std::vector<std::string>& values)
     beginList(name);
     for (const std::string& value : values) {
         anyKey({});
-        line_.add(escaped(value));
+        line_.add(jsonText(value));
     }
     return endList();
 }

@@ -73,7 +73,7 @@ void MapRules::end(Stretch& stretch) {
 
 void MapRules::addFinding(Rule rule, const Stretch& stretch, const Value& stored, const Value& found) const {
     Finding finding = {file_.path, rule, stored, found};
-    finding.entries = Finding::Entries(stretch.run.first, stretch.run.count, stretch.run.entry);
+    finding.entries.emplace(stretch.run.first, stretch.run.count, stretch.run.entry);
     finding.dataFile = stretch.dataFile;
     report_.add(std::move(finding));
 }

@@ -1,17 +1,16 @@
 #include "store/Collection.h"
 
 #include <ISCSIEPFile.h>
-#include <etc/ISCSIQuorinStringTool.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
-#include <fstream>
 #include <limits>
 #include <nlohmann/json.hpp>
 #include <set>
 
+#include "JsonText.h"
 #include "store/FileSize.h"
 #include "store/HostFile.h"
 
@@ -24,14 +23,6 @@ using nlohmann::json;
 constexpr std::uint64_t largestList = std::uint64_t{64} << 20U;  ///< bytes; a file takes about 100
 constexpr auto positionLimit = static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max());
 
-/// The bytes of a path, which JSON cannot hold where they are not UTF-8.
-std::string hexOf(const std::string& path) {
-    std::string digits;
-    ISCSI::TOOL::GetHexInString(reinterpret_cast<const unsigned char*>(path.data()),
-                                static_cast<unsigned int>(path.size()), digits);
-    return digits;
-}
-
 std::optional<std::string> bytesOf(const std::string& digits) {
     std::string bytes;
     for (std::size_t i = 0; i + 1 < digits.size(); i += 2) {
@@ -43,17 +34,12 @@ std::optional<std::string> bytesOf(const std::string& digits) {
     return bytes;
 }
 
-template <typename Value>
-std::string dumped(const Value& value) {
-    return json(value).dump(-1, ' ', true, json::error_handler_t::replace);
-}
-
 /// The line of a file: its path's bytes too where it is not UTF-8.
 std::string lineOf(const CollectedFile& file) {
-    nlohmann::ordered_json object = {
-        {"path", file.path}, {"size", file.size}, {"taken", file.taken}, {"changed", file.changed}};
-    if (json::parse(dumped(file.path)) != json(file.path)) object["pathHex"] = hexOf(file.path);
-    return object.dump(-1, ' ', true, json::error_handler_t::replace);
+    std::string line = R"({"path":)" + jsonText(file.path) + ",\"size\":" + std::to_string(file.size) +
+                       ",\"taken\":" + std::to_string(file.taken) + ",\"changed\":" + (file.changed ? "true" : "false");
+    if (!isUTF8(file.path)) line += R"(,"pathHex":")" + hexOf(file.path) + "\"";
+    return line + "}";
 }
 
 /// The number `key` of `object`; nothing when it is none that a position in a file can be.
@@ -110,12 +96,11 @@ Failure damaged(const std::string& list, const std::string& how) {
 }  // namespace
 
 std::variant<Collection, Failure> Collection::read(const std::string& folder, const std::string& list) {
-    const auto size = inspection::sizeOf(list);
-    if (!size) return Failure{{list, ""}, ISCSI::TOOL::EP_ERR_OPEN_FAILED, errno, {}};
-    if (*size > largestList) return damaged(list, "too large");
-    std::ifstream file(list, std::ios::binary);
-    if (!file) return Failure{{list, ""}, ISCSI::TOOL::EP_ERR_OPEN_FAILED, errno, {}};
-    const json document = json::parse(file, nullptr, false);
+    std::string text;
+    const int error = readWhole(list, largestList, text);
+    if (error == EFBIG) return damaged(list, "too large");
+    if (error != 0) return Failure{{list, ""}, ISCSI::TOOL::EP_ERR_OPEN_FAILED, error, {}};
+    const json document = json::parse(text, nullptr, false);
     if (document.is_discarded()) return damaged(list, "not JSON");
     auto collection = collectionIn(document);
     if (!collection) return damaged(list, "not what a collection has there");
@@ -143,7 +128,7 @@ std::string Collection::damageIn(const std::string& folder) {
 }
 
 int Collection::write(const std::string& folder) const {
-    std::string text = "{\n\"time\": " + std::to_string(time) + ", \"program\": " + dumped(program) +
+    std::string text = "{\n\"time\": " + std::to_string(time) + ", \"program\": " + jsonText(program) +
                        ", \"complete\": " + (complete ? "true" : "false") + ",\n\"files\": [";
     const char* separator = "\n";
     for (const CollectedFile& file : files) {

@@ -7,9 +7,9 @@
 #include <algorithm>
 #include <cerrno>
 #include <filesystem>
-#include <nlohmann/json.hpp>
 #include <tuple>
 
+#include "JsonText.h"
 #include "store/FileSize.h"
 #include "store/HostFile.h"
 
@@ -31,13 +31,13 @@ int makeFoldersAbove(const std::string& path) {
     return error.value();
 }
 
-bool isUTF8(const std::string& text) {
-    try {
-        static_cast<void>(nlohmann::json(text).dump());
-        return true;
-    } catch (const nlohmann::json::type_error&) {
-        return false;
-    }
+/// A LUN as the stand-in for the platform's library reads it.
+std::string listed(const tool::ISCSILUNConfInfo& record) {
+    return "{\"lid\":" + std::to_string(record.lid) + ",\"extentSize\":" + std::to_string(record.extentSize) +
+           ",\"size\":" + std::to_string(record.size) +
+           ",\"restoreTime\":" + std::to_string(static_cast<std::int32_t>(record.restoreTime)) +
+           ",\"type\":" + std::to_string(record.type) + ",\"uuid\":" + jsonText(record.uuid) +
+           ",\"rootPath\":" + jsonText(record.rootPath) + ",\"name\":" + jsonText(record.name) + "}";
 }
 
 }  // namespace
@@ -87,12 +87,7 @@ bool Collector::writeLuns(const std::vector<Lun>& luns) {
                              "cannot be written to the LUN list: its name or root path is not UTF-8"});
             continue;
         }
-        const nlohmann::ordered_json object = {
-            {"lid", record.lid},           {"extentSize", record.extentSize},
-            {"size", record.size},         {"restoreTime", static_cast<std::int32_t>(record.restoreTime)},
-            {"type", record.type},         {"uuid", record.uuid},
-            {"rootPath", record.rootPath}, {"name", record.name}};
-        text += (text.empty() ? "[\n" : ",\n") + object.dump();
+        text += (text.empty() ? "[\n" : ",\n") + listed(record);
         ++luns_;
     }
     const std::string path = folder_ + "/var/db/iscsi/luns.json";

@@ -39,6 +39,20 @@ int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t positio
     return 0;
 }
 
+int readWhole(const std::string& path, std::size_t most, std::string& text) {
+    const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    if (!file.isOpen()) return errno;
+    std::vector<char> block(std::size_t{64} << 10U);
+    while (true) {
+        const ssize_t got = read(file.number(), block.data(), block.size());
+        if (got < 0 && errno == EINTR) continue;
+        if (got < 0) return errno;
+        if (got == 0) return 0;
+        if (static_cast<std::size_t>(got) > most - text.size()) return EFBIG;
+        text.append(block.data(), static_cast<std::size_t>(got));
+    }
+}
+
 int writeWhole(const std::string& path, const std::string& text) {
     const std::string fresh = path + ".new";
     Descriptor file(open(fresh.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666));

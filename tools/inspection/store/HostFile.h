@@ -1,4 +1,4 @@
-// Files that are written here, never those of a store.
+// Files that belong to this machine: what is written here, never to those of a store.
 #pragma once
 
 #include <cstddef>
@@ -12,6 +12,10 @@ namespace inspection {
 
 /// Writes all of the bytes. Returns 0 or the errno value.
 int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position);
+
+/// Puts all of the file at `path` into `text`. Returns 0 or the errno value of what failed, EFBIG when it holds more than
+/// `most` bytes; `text` may then hold a part.
+int readWhole(const std::string& path, std::size_t most, std::string& text);
 
 /// Replaces the file at `path` by one that holds `text`, in one step. Returns 0 or the errno value of what failed.
 int writeWhole(const std::string& path, const std::string& text);
