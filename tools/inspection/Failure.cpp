@@ -53,7 +53,7 @@ std::string textOf(const Subject& subject) {
 }
 
 std::string whatOf(const Failure& failure) {
-    const std::string what = whatFailed(failure);
+    std::string what = whatFailed(failure);
     if (failure.error == 0) return what;
     const char* name = tool::GetErrorName(failure.error);
     return what + " (" + (name != nullptr ? name + std::string(", ") : "code ") + std::to_string(failure.error) + ")";

@@ -39,7 +39,8 @@ std::uint64_t LunMap::mappableSize() const {
 }
 
 LunMap LunMap::copy() const {
-    return {lids, file, targetPath, std::make_unique<tool::ISCSIEPFileMAP>(map->path), extentSize, {}, entries, size};
+    auto own = std::make_unique<tool::ISCSIEPFileMAP>(map->path);
+    return {lids, file, targetPath, std::move(own), extentSize, {}, entries, size};
 }
 
 Subject LunMap::subject(const std::string& part) const {
