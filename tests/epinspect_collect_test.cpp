@@ -120,6 +120,10 @@ const Case cases[] = {
      R"({"kind":"field","file":")" + data2 + R"(","otherFile":")" + data2 + R"(","field":"size","a":16801792,"b":99999}
 {"kind":"summary","file":"own","otherFile":"b","summary":true,"files":11,"fields":2,"same":4352,…})" "\n",
      "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"},
+    {"diff knows the LUNs of both stores", "large cp -a own b; sed -i 's/\"lid\": 2/\"lid\": 31/' "
+     "b/var/db/iscsi/luns.json; printf '\\377' | dd of=b" + map2 + " bs=1 seek=44 conv=notrunc status=none; "
+     "epinspect diff own b --json | head -n 1", 0,
+     R"({"kind":"field","file":")" + map2 + R"(","lid":2,"otherFile":")" + map2 + R"(","otherLid":31,"field":…)" "\n", ""},
 };
 // clang-format on
 

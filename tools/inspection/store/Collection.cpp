@@ -11,6 +11,7 @@
 #include <set>
 
 #include "JsonText.h"
+#include "store/FileNames.h"
 #include "store/FileSize.h"
 #include "store/HostFile.h"
 
@@ -136,7 +137,7 @@ int Collection::write(const std::string& folder) const {
         separator = ",\n";
     }
     text += "\n]}\n";
-    return writeWhole(folder + "/" + listName, text);
+    return writeWhole(pathIn(folder, listName), text);
 }
 
 std::optional<std::uint64_t> Collection::sizeOf(const std::string& hostPath) const {

@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <utility>
 
+#include "store/FileNames.h"
 #include "store/FileSize.h"
 
 namespace inspection {
@@ -17,7 +18,7 @@ std::error_code Context::setRoot(const std::string& folder) {
     const std::error_code error = root.set(folder);
     if (error) return error;
     const Located list = root.locate(std::string("/") + Collection::listName);
-    damagedCollection = list.obstacleToFile(folder + "/" + Collection::listName);
+    damagedCollection = list.obstacleToFile(pathIn(folder, Collection::listName));
     if (!list.isThere() || damagedCollection) return {};
     auto found = Collection::read(folder, list.hostPath);
     if (auto* made = std::get_if<Collection>(&found)) collection = std::move(*made);
@@ -61,14 +62,21 @@ std::optional<std::string> Context::openablePath(const std::string& name, NamedB
 void Context::prepareLuns() {
     static constexpr const char* variable = "KELPISCSIEP_LUNS";  // of the stand-in for the platform's library
     static constexpr const char* path = "/var/db/iscsi/luns.json";
-    if (!root.isFolder() || std::exchange(lunsPrepared_, true) || std::getenv(variable) != nullptr) return;
-    Located list = root.locate(path);
-    const auto obstacle = list.obstacle(path);
-    if (obstacle && list.error != EACCES) {  // which the system finds too, and before any link
-        failed(*obstacle);
-        list.hostPath = "/dev/null";
+    static std::string ours;  // what another store has set is no choice of the user's
+    if (!root.isFolder()) return;
+    const char* set = std::getenv(variable);
+    if (set != nullptr && set != ours) return;
+    if (!lunList_) {
+        Located list = root.locate(path);
+        const auto obstacle = list.obstacle(path);
+        if (obstacle && list.error != EACCES) {  // which the system finds too, and before any link
+            failed(*obstacle);
+            list.hostPath = "/dev/null";
+        }
+        lunList_ = std::move(list.hostPath);
     }
-    setenv(variable, list.hostPath.c_str(), 0);
+    if (set == nullptr || *lunList_ != set) setenv(variable, lunList_->c_str(), 1);
+    ours = *lunList_;
 }
 
 }  // namespace inspection

@@ -80,11 +80,12 @@ public:
     /// opened or, below a root folder, cannot be looked at. What is missing is left to the library to find.
     std::optional<std::string> openablePath(const std::string& name, NamedBy by);
 
-    /// To be called before the first look at a LUN: its list is then looked for below the root folder too.
+    /// To be called before every look at a LUN: its list is then that of the store below the root folder, unless the
+    /// environment names one.
     void prepareLuns();
 
 private:
-    bool lunsPrepared_ = false;
+    std::optional<std::string> lunList_;  ///< where the list below the root folder lies
     std::vector<std::string> changedFiles_;
 };
 

@@ -11,6 +11,11 @@ namespace inspection {
 /// The last part of a path.
 inline std::string_view lastName(std::string_view path) { return path.substr(path.rfind('/') + 1); }
 
+/// The path of what is called `name` in `folder`.
+inline std::string pathIn(const std::string& folder, std::string_view name) {
+    return std::string(folder).append("/").append(name);
+}
+
 /// Whether a path ends in the name of a data file, whatever follows its prefix.
 bool isDataFileName(std::string_view path);
 

@@ -6,6 +6,7 @@
 
 #include <etc/ISCSIEPFormat.h>
 
+#include "store/FileNames.h"
 #include "store/FileSize.h"
 #include "store/Folder.h"
 
@@ -94,7 +95,7 @@ std::vector<std::string> Store::namesIn(const std::string& folder) {
 
 std::vector<std::string> Store::storeFilesIn(const std::string& folder, std::set<std::string> expected) {
     for (std::string& name : namesIn(folder)) {
-        if (kindByName(folder + "/" + name) != nullptr) expected.insert(std::move(name));
+        if (kindByName(pathIn(folder, name)) != nullptr) expected.insert(std::move(name));
     }
     std::vector<std::string> sorted(expected.begin(), expected.end());
     std::sort(sorted.begin(), sorted.end(), precedes);
@@ -149,7 +150,7 @@ void Store::forEachFile(const std::function<void(const StoreFile&)>& each) {
     for (const auto& [place, expected] : folders_) {
         const std::string& folder = place.second;
         for (const std::string& name : storeFilesIn(folder, expected)) {
-            const auto file = fileAt(folder + "/" + name, expected.count(name) > 0);
+            const auto file = fileAt(pathIn(folder, name), expected.count(name) > 0);
             if (file) each(*file);
         }
     }
