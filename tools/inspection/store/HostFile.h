@@ -13,8 +13,8 @@ namespace inspection {
 /// Writes all of the bytes. Returns 0 or the errno value.
 int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position);
 
-/// Puts all of the file at `path` into `text`. Returns 0 or the errno value of what failed, EFBIG when it holds more than
-/// `most` bytes; `text` may then hold a part.
+/// Puts all of the file at `path` into `text`. Returns 0 or the errno value of what failed, EFBIG when it holds more
+/// than `most` bytes; `text` may then hold a part.
 int readWhole(const std::string& path, std::size_t most, std::string& text);
 
 /// Replaces the file at `path` by one that holds `text`, in one step. Returns 0 or the errno value of what failed.
