@@ -63,21 +63,21 @@ std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::opti
     const std::optional<NamedMap> named = findMap(context, lun);
     if (!named) return std::nullopt;
     const bool known = !named->luns.empty();
-    if (!known && !extentSize) {
-        reportUnknown(context, *named);
-        return std::nullopt;
-    }
     LunMap map;
     map.lids = named->lids();
     map.file = named->file;
     map.targetPath = named->targetPath;
-    map.extentSize = extentSize ? *extentSize : extentSizeOf(context, *named);
-    if (map.extentSize == 0) {
+    if (extentSize || known) map.extentSize = extentSize ? *extentSize : extentSizeOf(context, *named);
+    if (known && map.extentSize == 0) {
         context.failed({map.subject(""), tool::EP_ERR_BAD_EXTENT_SIZE, 0, {}});
         return std::nullopt;
     }
     OpenedMap opened = openMap(context, map.file, named->by);
     if (opened.file == nullptr) return std::nullopt;
+    if (map.extentSize == 0) {
+        reportUnknown(context, *named);
+        return std::nullopt;
+    }
     map.map = std::move(opened.file);
     map.watch = opened.watch;
     map.entries = opened.entries;
