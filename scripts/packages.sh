@@ -16,7 +16,8 @@ rm -rf "$folder"
 mkdir -p "$folder/source"
 tar -c --exclude=./.git --exclude=./build --exclude='./build-*' . | tar -x -C "$folder/source"
 cd "$folder/source"
-DEB_BUILD_OPTIONS="nocheck noautodbgsym terse parallel=$(nproc)" dpkg-buildpackage \
+# Nobody gets what would be built for debuggers.
+DEB_CXXFLAGS_STRIP=-g DEB_BUILD_OPTIONS="nocheck noautodbgsym terse parallel=$(nproc)" dpkg-buildpackage \
   --host-arch "$architecture" --build=binary --unsigned-changes --no-check-builddeps --build-profiles=nocheck
 cd ..
 rm -rf source

@@ -29,7 +29,7 @@ run_leg() {
   need "${test_packages[@]}" $(packages_of "$1")
   if [ "$1" = hardened ]; then
     export DEB_BUILD_MAINT_OPTIONS=hardening=+all
-    options=("-DCMAKE_CXX_FLAGS=$(dpkg-buildflags --get CPPFLAGS) $(dpkg-buildflags --get CXXFLAGS)"
+    options=("-DCMAKE_CXX_FLAGS=$(dpkg-buildflags --get CPPFLAGS) $(DEB_CXXFLAGS_STRIP=-g dpkg-buildflags --get CXXFLAGS)"
       "-DCMAKE_SHARED_LINKER_FLAGS=$(dpkg-buildflags --get LDFLAGS)"
       "-DCMAKE_EXE_LINKER_FLAGS=$(dpkg-buildflags --get LDFLAGS)")
   fi

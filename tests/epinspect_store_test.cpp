@@ -168,7 +168,7 @@ const Case cases[] = {
      "No such LUN…epinspect: m: byte 0: path names no volume (…1 of 1 bytes…"},
     {"wrong usage is named", "for a in 'read none' 'read 4294967296' 'locate 5 1x' 'locate 5 1 --address-bits 50'; "
      "do epinspect $a; done; epinspect read 5 --count-from LUN", 2, "",
-     "epinspect: none: extent size not known, give --extent-size: no LUN with an id from 0 to 255 has this map file (…"
+     "epinspect: none: cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)\n…"
      "MAP: '4294967296'…"
      "OFFSET: '1x'…--address-bits: '50': not 48 or 52…--count-from: 'LUN': not file or volume…"},
 };
