@@ -85,6 +85,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
     run({"epinspect", root, "locate", "1", small, offset});
     run({"epinspect", root, "locate", other, offset, "--extent-size", sizeOfExtents, "--address-bits", "48"});
     run({"epinspect", root, "read", "1", "--offset", small, "--length", length, "--count-from", "file"});
+    const std::string image = store.root + "/image";
+    run({"epinspect", root, "read", "1", "--output", image, "--offset", small, "--json"});
+    fs::remove(image);
     run({"epinspect", root, "extent", "/" + names[2], small, "--extent-size", length});
     return 0;
 }
