@@ -153,13 +153,15 @@ TEST_F(Disk, AnyRangeIsReadAsTheStoreIsNow) {
     const auto check = [&](const std::string& failure) {
         std::uint64_t lost = 0;
         for (int i = 0; i < 200; ++i) {
-            const std::uint64_t offset = random() % image_.size();
-            const std::uint64_t length = std::min<std::uint64_t>(random() % 300000, image_.size() - offset);
+            const std::size_t offset = random() % image_.size();
+            const std::size_t length = std::min<std::size_t>(random() % 300000, image_.size() - offset);
             std::string expected = image_.substr(offset, length);
             std::string got(length, '?');
             bytes.read(offset, length, reinterpret_cast<unsigned char*>(got.data()), [&](const LunPart& part) {
                 lost += part.length;
-                expected.replace(part.offset - offset, part.length, part.length, '\0');
+                const auto at = static_cast<std::size_t>(part.offset - offset);
+                const auto count = static_cast<std::size_t>(part.length);
+                expected.replace(at, count, count, '\0');
                 EXPECT_NE(std::string::npos, messageOf(bytes.failureOf(part)).find(failure));
                 return true;
             });
