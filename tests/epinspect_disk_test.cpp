@@ -149,7 +149,7 @@ TEST_F(Disk, AnyRangeIsReadAsTheStoreIsNow) {
     EXPECT_EQ("1 1 262143 0 0\n0 262144 262144 0 1835008\n0 524288 262144 1 1572864\n", parts);
 
     /// The bytes of random ranges are the image's or are missing; returns the sum of the lengths that are.
-    std::mt19937_64 random(4);
+    std::mt19937 random(4);
     const auto check = [&](const std::string& failure) {
         std::uint64_t lost = 0;
         for (int i = 0; i < 200; ++i) {
