@@ -72,6 +72,9 @@ public:
     /// The same of a path, whose bytes "NAMEHex" tells where they are not UTF-8.
     Json& path(const std::string& name, const std::string& value);
 
+    /// "lid" the first, "lids" all where they are several; nothing where there is none.
+    Json& lids(const std::vector<std::uint32_t>& lids);
+
     Json& texts(std::string_view name, const std::vector<std::string>& values);
 
     /// Members that are JSON already: "name":value, and so on.

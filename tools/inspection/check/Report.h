@@ -38,6 +38,9 @@ public:
     /// `watch` knows whether it changes.
     void beginFile(const std::string& path, std::optional<std::uint32_t> lid, const ChangeWatch& watch);
 
+    /// Whether the file `path`, about which findings may come, has changed since beginFile(); tells the context.
+    bool hasChanged(const std::string& path) const;
+
     void add(Finding finding);
 
     /// Hands out what was added.
