@@ -36,10 +36,14 @@ inline constexpr char EP_FRI_FILE_NAME[] = "EP_FRI";
 inline constexpr char EP_DAT_FILE_PREFIX[] = "EP_DAT_";
 inline constexpr unsigned int EP_DAT_NUMBER_DIGITS = 5;
 
+/// The name of a LUN's map file is the LUN's type name, UUID and name, and ends in this.
+inline constexpr char EP_MAP_NAME_END[] = "_00000";
+
 /// Their folders, each with the slashes around it.
 inline constexpr char EP_JNL_FOLDER[] = "/var/db/iscsi/";  ///< the machine's journal
 inline constexpr char EP_VOLUME_PREFIX[] = "/volume";      ///< a volume, its number follows
 inline constexpr char EP_VOLUME_FOLDER[] = "/@iSCSI/EP/";  ///< on a volume: table, free-index and data files
 inline constexpr char EP_MAP_FOLDER[] = "/@iSCSI/LUN/";    ///< below a LUN's root path: its map file
+inline constexpr char EP_ISCSI_FOLDER[] = "/@iSCSI/";      ///< the folder above the last two
 
 }  // namespace ISCSI::TOOL

@@ -61,14 +61,13 @@ std::optional<std::string> Context::openablePath(const std::string& name, NamedB
 
 void Context::prepareLuns() {
     static constexpr const char* variable = "KELPISCSIEP_LUNS";  // of the stand-in for the platform's library
-    static constexpr const char* path = "/var/db/iscsi/luns.json";
     static std::string ours;  // what another store has set is no choice of the user's
     if (!root.isFolder()) return;
     const char* set = std::getenv(variable);
     if (set != nullptr && set != ours) return;
     if (!lunList_) {
-        Located list = root.locate(path);
-        const auto obstacle = list.obstacle(path);
+        Located list = root.locate(lunListPath);
+        const auto obstacle = list.obstacle(lunListPath);
         if (obstacle && list.error != EACCES) {  // which the system finds too, and before any link
             failed(*obstacle);
             list.hostPath = "/dev/null";

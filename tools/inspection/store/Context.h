@@ -17,6 +17,9 @@ namespace inspection {
 /// Whose word the name of a file is: the user's, as it was typed, or a path of the target.
 enum class NamedBy { user, target };
 
+/// Where the stand-in for the platform's library looks for its list of LUNs.
+inline constexpr const char* lunListPath = "/var/db/iscsi/luns.json";
+
 /// Each program derives one from this. Used by one thread at a time.
 class Context {
 public:

@@ -71,8 +71,9 @@ Store::Store(Context& context, const Lids& lids) : context_(context) {
     for (const std::string& name : namesIn("/")) {
         const std::uint32_t volume = volumeIn(name);
         if (volume == 0) continue;
-        folders_[{volume, "/" + name + "/@iSCSI/EP"}];
-        folders_[{volume, "/" + name + "/@iSCSI/LUN"}];
+        for (const std::string_view folder : {tool::EP_VOLUME_FOLDER, tool::EP_MAP_FOLDER}) {
+            folders_[{volume, "/" + name + std::string(folder.substr(0, folder.size() - 1))}];
+        }
     }
 }
 
