@@ -9,7 +9,7 @@
 #include <string_view>
 #include <vector>
 
-/// `expected` with what stands in `text` in place of each "…"; from where that does not fit on, it is as it was.
+/// `expected`, each "…" in it replaced by what `text` has there. From the place on where the two differ nothing is.
 inline std::string filled(std::string_view expected, std::string_view text) {
     constexpr std::string_view gap = "…";
     constexpr auto none = std::string_view::npos;
@@ -54,7 +54,7 @@ inline std::string partOf(std::string_view line, std::size_t from) {
     return text + (line.size() > from + 300 ? "[...]\n" : "\n");
 }
 
-/// Whether `text` is `expected`, in which "…" stands for anything; if not, tells the lines that differ.
+/// Whether `text` is `expected`, in which "…" stands for anything; if not, shows the lines that differ.
 inline testing::AssertionResult fits(std::string_view text, std::string_view expected) {
     const std::string whole = filled(expected, text);
     if (whole == text) return testing::AssertionSuccess();

@@ -175,12 +175,12 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
      "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"check says what named files lack", "cd p; >volume1/@iSCSI/EP; epinspect check --root . EP_DAT_7x x volume1/@iSCSI/LUN/* --extent-size 1M", 1,
      "volume1/@iSCSI/LUN/t: kind: type 1, but named like a map file\nEP_DAT_7x: magic: 0x9, most files have 0x1122334455667788\n"
-     "4 files, 2 entries, 2 findings: 1 kind, 1 magic\nNot compared: kind: the file's name does not say which: x\n"
+     "4 files, 2 entries, 2 findings: 1 kind, 1 magic\n"
+     "Not compared: all other rules for a map file: the type is another: volume1/@iSCSI/LUN/t\nNot compared: kind: the file's name does not say which: x\n"
      "Not compared: lun-size, extent-size: no LUN with an id from 0 to 255 is known for this map: x and 1 more\n"
      "Not compared: missing-data-file, beyond-data-file: the data files of the volume cannot be listed: volume1/@iSCSI/LUN/m\n"
      "Not compared: missing-data-file, beyond-data-file: the path names no volume: x\n"
-     "Not compared: serial-number: not a name that the target gives to a data file: EP_DAT_7x\nNot compared: version: no value that most files have\n"
-     "Not compared: what else concerns a map file: the type is another: volume1/@iSCSI/LUN/t\n",
+     "Not compared: serial-number: not a name that the target gives to a data file: EP_DAT_7x\nNot compared: version: no value that most files have\n",
      "epinspect: /volume1/@iSCSI/EP/: cannot be opened: Not a directory (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"diff and find say that a map became shorter",
      "for what in 'diff --entries s none' 'find s --pool 0'; do cp scattered s; { epinspect $what; echo $?; } |"

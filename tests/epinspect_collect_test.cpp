@@ -35,7 +35,7 @@ protected:
     }
 };
 
-/// What a collection.json is damaged by, and what is said of it.
+/// A damage to collection.json, and the message about it.
 Case damaged(const std::string& how, const std::string& edit, const std::string& said) {
     return {"refuses a collection " + how,
             "epinspect --root own collect c >/dev/null; cd c; " + edit + "; epinspect --root . list --json", 1,

@@ -26,10 +26,10 @@ static_assert((EP_MAP_ENTRY_ADDRESS_MASK | EP_MAP_ENTRY_POOL_MASK) == EP_MAP_ENT
 /// How many pool UUIDs a map file holds at most.
 inline constexpr unsigned int EP_POOL_COUNT_MAX = 1024;
 
-/// Bytes of its volume that a data file stands for: data file number N holds those from N times as many on.
+/// How many bytes of its volume a data file stands for: data file N for those from N * EP_DAT_FILE_SPAN on.
 inline constexpr unsigned long long EP_DAT_FILE_SPAN = 1ULL << 42;
 
-/// The names of the files. The number of a data file follows in decimal, of at least five digits.
+/// The names of the files. A data file's name ends in its number, in decimal and with at least five digits.
 inline constexpr char EP_JNL_FILE_NAME[] = "EP_JNL";
 inline constexpr char EP_TBL_FILE_NAME[] = "EP_TBL";
 inline constexpr char EP_FRI_FILE_NAME[] = "EP_FRI";

@@ -41,7 +41,7 @@ private:
         return *this;
     }
 
-    /// There must be room for it.
+    /// Needs room for it.
     void append(std::string_view view) {
         std::memcpy(end(), view.data(), view.size());
         size_ += view.size();

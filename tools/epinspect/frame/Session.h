@@ -22,13 +22,13 @@ public:
     /// cannot.
     void setRoot(const std::string& folder);
 
-    /// Says on standard error when what is looked at is a collection, and of when.
+    /// Where the root is a collection: says so on standard error, and when it was made.
     void remarkOnCollection();
 
     /// Prints the message, as an object too with --json. The exit status is 1 from then on. Throws OutputFailure.
     void failed(const Failure& failure) override;
 
-    /// The same without the object, for which the caller has one that says more.
+    /// The same without the object: the caller prints one that says more.
     void complainOf(const Failure& failure);
 
     void remark(const std::string& subject, const std::string& text) override;
@@ -37,7 +37,7 @@ public:
     bool interrupted() override;
     std::vector<std::string> takeTrialLog() override { return takeHeldLines(); }
 
-    /// Takes the line that shows the progress away, for good.
+    /// Erases the line that shows the progress, for good.
     void endProgress() { progress_.reset(); }
 
     /// The exit status that the run so far amounts to.

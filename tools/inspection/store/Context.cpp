@@ -61,14 +61,14 @@ std::optional<std::string> Context::openablePath(const std::string& name, NamedB
 
 void Context::prepareLuns() {
     static constexpr const char* variable = "KELPISCSIEP_LUNS";  // of the stand-in for the platform's library
-    static std::string ours;  // what another store has set is no choice of the user's
+    static std::string ours;  // a value set here for another store is not the user's choice
     if (!root.isFolder()) return;
     const char* set = std::getenv(variable);
     if (set != nullptr && set != ours) return;
     if (!lunList_) {
         Located list = root.locate(lunListPath);
         const auto obstacle = list.obstacle(lunListPath);
-        if (obstacle && list.error != EACCES) {  // which the system finds too, and before any link
+        if (obstacle && list.error != EACCES) {  // the stand-in meets that too, and before any link
             failed(*obstacle);
             list.hostPath = "/dev/null";
         }
