@@ -142,51 +142,71 @@ R"("rule":"kind","stored":3,"found":"fri","message":"EP_FRI: kind: type 3, a dat
     {"check compares maps that are named with their LUNs and tables", "epsample --broken broken; "
      "epinspect check --root broken broken/volume2/*/LUN/*lun-size* broken/volume3/@iSCSI/LUN/*", 3,
      "broken/…lun-size_00000: LUN 11: lun-size: 16 entries of 65536 bytes are 1048576 bytes, the LUN has 1114112\n"
-     "/volume3/@iSCSI/EP/EP_TBL: LUN 13: extent-size: 131072 stored, the LUN has 65536\n2 files, 32 entries, 2 findings: 1 lun-size, 1 extent-size\n", ""},
+     "/volume3/@iSCSI/EP/EP_TBL: LUN 13: extent-size: 131072 stored, the LUN has 65536\n"
+     "2 files, 32 entries, 2 findings: 1 lun-size, 1 extent-size\n", ""},
     {"check finds extents that are shared", "epinspect check late y x ./x other/x large", 3,
      "late: data-start: 0x6001, past the end of the file, which has 24576 bytes\n"
      "x: unmapped-bits: entry 6: unmapped, but holds 0x100000000000c\n"
-     "x: address-bits: entry 6: 0x100000000000c, of which bits 48 to 51 are 0x1: they count in extent address and pool number\n"
+     "x: address-bits: entry 6: 0x100000000000c, of which bits 48 to 51 are 0x1: they count in extent address and pool "
+     "number\n"
      "y: shared-extents: entries 0-1: pool 0, extents 12-13, used by entries 2-3 of x too\n"
      "x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too\n"
-     "5 files, 20012 entries, 5 findings: 1 data-start, 1 unmapped-bits, 1 address-bits, 2 shared-extents\nNot compared: …the extent size is not known, give --extent-size: …shared-extents: maps in different folders whose paths name no volume\n", ""},
-    {"check joins what two maps share", "epinspect check there back --json | sed -n '1s/.*\"entries/\"entries/p'; epinspect check there back --each | grep -c ' too$'", 0,
+     "5 files, 20012 entries, 5 findings: 1 data-start, 1 unmapped-bits, 1 address-bits, 2 shared-extents\n"
+     "Not compared: …the extent size is not known, give --extent-size: …shared-extents: maps in different folders "
+     "whose paths name no volume\n", ""},
+    {"check joins what two maps share", "epinspect check there back --json | sed -n '1s/.*\"entries/\"entries/p';"
+     " epinspect check there back --each | grep -c ' too$'", 0,
      R"("entries":3,"runs":2,"first":0,"count":1,"otherFile":"there","otherFirst":2,"message":"back: shared-extents: )"
      "3 entries in 2 runs, first entry 0: pool 0, extent 30, used by entry 2 of there too\"}\n2\n", ""},
     {"check looks into data files", "epinspect check --root . --extent-size 1M", 3,
-     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, past the end of EP_DAT_00000, which holds 4194303 extents\n"
+     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 1: extent 4194303, past the end of EP_DAT_00000, which holds "
+     "4194303 extents\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 5: extent 8388608, but there is no EP_DAT_00002\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 6: extent 8796093022207, but there is no EP_DAT_2097151\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 7: extent 8796093022208, but there is no data file\n"
-     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, past the end of EP_DAT_00001, which holds 2 extents\n"
-     "3 files, 8 entries, 5 findings: 3 missing-data-file, 2 beyond-data-file\nNot compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",
+     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, past the end of EP_DAT_00001, which holds 2 "
+     "extents\n"
+     "3 files, 8 entries, 5 findings: 3 missing-data-file, 2 beyond-data-file\n"
+     "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",
      "…LUN 0-255: none is known: The LUN list is missing or cannot be read: No such file or directory (code 9002)\n"},
     {"check writes findings as JSON", "epinspect check x y --json | sed -n 3p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","entries":1,"runs":1,"first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
 )", ""},
-    {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,; s/lun1/new/' var/db/iscsi/luns.json;"
-     "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; truncate -s 99 volume1/*/EP/EP_DAT_00001; mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,
-     "/volume1/@iSCSI/EP/EP_TBL: LUN 1: missing-file: no file, but this LUN needs it\n/volume1/@iSCSI/LUN/BLUN…new_00000: LUN 1: missing-map: no file, but this LUN needs it\n"
+    {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,;"
+     " s/lun1/new/' var/db/iscsi/luns.json;"
+     "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; truncate -s 99 volume1/*/EP/EP_DAT_00001;"
+     " mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,
+     "/volume1/@iSCSI/EP/EP_TBL: LUN 1: missing-file: no file, but this LUN needs it\n"
+     "/volume1/@iSCSI/LUN/BLUN…new_00000: LUN 1: missing-map: no file, but this LUN needs it\n"
      "/share/@iSCSI/LUN/THIN…lun2_00000: LUN 2: missing-map: no file, but this LUN needs it\n"
-     "7 files, 4352 entries, 3 findings: 2 missing-map, 1 missing-file\nNot compared: beyond-data-file: a data file cannot be read: /volume1/… and 1 more\n"
+     "7 files, 4352 entries, 3 findings: 2 missing-map, 1 missing-file\n"
+     "Not compared: beyond-data-file: a data file cannot be read: /volume1/… and 1 more\n"
      "Not compared: extent-size: no table file that can be compared: /volume1/@iSCSI/EP/EP_TBL\n"
      "Not compared: extent-size: the path of the LUN's map file names no volume: /share/…\n"
-     "Not compared: lun-size, extent-size: no LUN with an id from 0 to 255 is known for this map: /volume1/… and 1 more\n",
+     "Not compared: lun-size, extent-size: no LUN with an id from 0 to 255 is known for this map: /volume1/… and 1 "
+     "more\n",
      "epinspect: /volume1/@iSCSI/EP/EP_DAT_00001: ends too early (EP_ERR_READ_FAILED, 18990039)\n"
-     "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)\n"},
-    {"check says what named files lack", "cd p; >volume1/@iSCSI/EP; epinspect check --root . EP_DAT_7x x volume1/@iSCSI/LUN/* --extent-size 1M", 1,
-     "volume1/@iSCSI/LUN/t: kind: type 1, but named like a map file\nEP_DAT_7x: magic: 0x9, most files have 0x1122334455667788\n"
+     "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000: cannot be opened: neither a regular file nor a block device "
+     "(EP_ERR_OPEN_FAILED, 18990038)\n"},
+    {"check says what named files lack", "cd p; >volume1/@iSCSI/EP; epinspect check --root . EP_DAT_7x x "
+     "volume1/@iSCSI/LUN/* --extent-size 1M", 1,
+     "volume1/@iSCSI/LUN/t: kind: type 1, but named like a map file\n"
+     "EP_DAT_7x: magic: 0x9, most files have 0x1122334455667788\n"
      "4 files, 2 entries, 2 findings: 1 kind, 1 magic\n"
-     "Not compared: all other rules for a map file: the type is another: volume1/@iSCSI/LUN/t\nNot compared: kind: the file's name does not say which: x\n"
+     "Not compared: all other rules for a map file: the type is another: volume1/@iSCSI/LUN/t\n"
+     "Not compared: kind: the file's name does not say which: x\n"
      "Not compared: lun-size, extent-size: no LUN with an id from 0 to 255 is known for this map: x and 1 more\n"
-     "Not compared: missing-data-file, beyond-data-file: the data files of the volume cannot be listed: volume1/@iSCSI/LUN/m\n"
+     "Not compared: missing-data-file, beyond-data-file: the data files of the volume cannot be listed: "
+     "volume1/@iSCSI/LUN/m\n"
      "Not compared: missing-data-file, beyond-data-file: the path names no volume: x\n"
-     "Not compared: serial-number: not a name that the target gives to a data file: EP_DAT_7x\nNot compared: version: no value that most files have\n",
+     "Not compared: serial-number: not a name that the target gives to a data file: EP_DAT_7x\n"
+     "Not compared: version: no value that most files have\n",
      "epinspect: /volume1/@iSCSI/EP/: cannot be opened: Not a directory (EP_ERR_OPEN_FAILED, 18990038)\n"},
     {"diff and find say that a map became shorter",
      "for what in 'diff --entries s none' 'find s --pool 0'; do cp scattered s; { epinspect $what; echo $?; } |"
      " { read first; truncate -s 90000 s; tail -n 1; }; done", 0, "1\n1\n", shorter + shorter},
     {"diff and find and check name what is wrong",
-     "epinspect diff gone other; epinspect diff gone one; epinspect diff a; epinspect find a; epinspect check --extent-size 0", 2, "",
+     "epinspect diff gone other; epinspect diff gone one; epinspect diff a; epinspect find a;"
+     " epinspect check --extent-size 0", 2, "",
      "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"
      "epinspect: gone: cannot be opened: No such…epinspect: B is missing. Try 'epinspect diff --help'.\n"
      "epinspect: --extent or --pool is missing. Try…"

@@ -123,7 +123,8 @@ const Case cases[] = {
     {"diff knows the LUNs of both stores", "large cp -a own b; sed -i 's/\"lid\": 2/\"lid\": 31/' "
      "b/var/db/iscsi/luns.json; printf '\\377' | dd of=b" + map2 + " bs=1 seek=44 conv=notrunc status=none; "
      "epinspect diff own b --json | head -n 1", 0,
-     R"({"kind":"field","file":")" + map2 + R"(","lid":2,"otherFile":")" + map2 + R"(","otherLid":31,"field":…)" "\n", ""},
+     R"({"kind":"field","file":")" + map2 + R"(","lid":2,"otherFile":")" + map2 + R"(","otherLid":31,"field":…)" "\n",
+     ""},
 };
 // clang-format on
 

@@ -60,7 +60,8 @@ const Case cases[] = {
      " r/file; ln -s file r/chain; ln -s ../../out r/volume1/up; mkdir -p r/volume2 r/var; "
      "ln -s ../../out/volume1/@iSCSI r/volume2/@iSCSI; ln -s ../../out/volume1 r/var/db; ln -s gone r/volume3; "
      "t folder" + table + " file chain volume1/up" + table + " r/folder/../r" + table + "; "
-     "T='epinspect --root r'; $T extent --raw file 0 --extent-size 1; $T list --luns 3; ln -s ../map r/collection.json; "
+     "T='epinspect --root r'; $T extent --raw file 0 --extent-size 1; $T list --luns 3; "
+     "ln -s ../map r/collection.json; "
      "$T lun 3; epinspect diff r r >r/none", 1,
      refused + refused + refused + refused + refused + listed,
      says({"folder" + table + leadsOut, "file" + leadsOut, "chain" + leadsOut, "volume1/up" + table + leadsOut,
