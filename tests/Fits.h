@@ -24,11 +24,13 @@ inline std::string filled(std::string_view expected, std::string_view text) {
             done = at + piece.size();
             continue;
         }
-        at = done;  // or where at least its first lines stand
-        for (auto line = piece.find('\n'); line != none; line = piece.find('\n', line + 1)) {
+        at = done;  // or where at least its first lines stand: one, two, four, so that a long text takes no longer
+        std::size_t step = 1;
+        for (auto line = piece.find('\n'); line != none; step *= 2) {
             const auto found = text.find(piece.substr(0, line + 1), at);
             if (found == none) break;
             at = found;
+            for (auto more = step; more > 0 && line != none; --more) line = piece.find('\n', line + 1);
         }
         return std::string(text.substr(0, at)).append(at == done ? gap : "").append(expected);
     }
