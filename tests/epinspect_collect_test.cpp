@@ -85,9 +85,9 @@ const Case cases[] = {
      "epinspect: c: a collection of …; it is incomplete\n…epinspect: " + table2 + ": cannot be opened: neither …)\n" +
      incomplete + "epinspect: c: a collection of …; it is incomplete\n…"},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
-    damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not the list of a collection"),
-    damaged("that took more than there was", "sed -i s/6442475520/24575/ collection.json", "not the list of a collection"),
-    damaged("with a path from nowhere", "sed -i 's,\"/var,\"var,' collection.json", "not the list of a collection"),
+    damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not a collection's list"),
+    damaged("that took more than there was", "sed -i s/6442475520/24575/ collection.json", "not a collection's list"),
+    damaged("with a path from nowhere", "sed -i 's,\"/var,\"var,' collection.json", "not a collection's list"),
     damaged("whose list does not fit a file", "truncate -s 9 var/db/iscsi/EP_JNL",
             "24576 bytes of /var/db/iscsi/EP_JNL were taken, but the file has 9"),
 
