@@ -1,7 +1,5 @@
 #include "store/Context.h"
 
-#include <etc/ISCSIEPDiagnostics.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <cstdlib>
@@ -11,8 +9,6 @@
 #include "store/FileSize.h"
 
 namespace inspection {
-
-namespace tool = ISCSI::TOOL;
 
 std::error_code Context::setRoot(const std::string& folder) {
     const std::error_code error = root.set(folder);
