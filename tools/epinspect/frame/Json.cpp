@@ -11,7 +11,7 @@ using inspection::jsonText;
 
 namespace {
 
-/// The members that tell a path: "NAME", and "NAMEHex" where it is not UTF-8.
+/// The members that hold a path: "NAME", and "NAMEHex" where it is not UTF-8.
 std::string pathMembers(const std::string& name, const std::string& path) {
     std::string members = "\"" + name + "\":" + jsonText(path);
     if (isUTF8(path)) return members;
