@@ -45,10 +45,12 @@ const std::string list = "store/var/db/iscsi/luns.json",
                       "s/volume2/volume1/; s/: 7/: 263/' " +
                       list + " >s/var/db/iscsi/luns.json; ";
 const std::string lun9 =
-    "LUN 9: configuration cannot be loaded: The LUN list holds a value of the wrong type, or one that does not fit its "
-    "field (code 9004)";
-const std::string none9003 = " is known: The LUN list is not a JSON array: Bad message (code 9003)\n";
-const std::string noList = "The LUN list is missing or cannot be read: ", notKnown = "LUN 0-255: none is known: ";
+    "LUN 9: configuration cannot be loaded: The LUN list s/var/db/iscsi/luns.json holds a value of the wrong type, or "
+    "one that does not fit its field: Bad message (code 9004)";
+const std::string none9003 =
+    " is known: The LUN list s/var/db/iscsi/luns.json is not a JSON array: Bad message (code 9003)\n";
+const std::string noList = "The LUN list s/var/db/iscsi/luns.json is missing or cannot be read: ",
+                  notKnown = "LUN 0-255: none is known: ";
 
 // clang-format off
 const Case cases[] = {
@@ -59,7 +61,7 @@ const Case cases[] = {
      "epinspect --root store map 1 | tail -n 1; epinspect --root store entry 2 1 --json", 0, "diff 2 M --json: 3\ndiff 2 M --json: 3\n"
      "LUN 1: 4096 entries in …\n{\"kind\":\"entry\",\"file\":\"/volume2/@iSCSI/LUN/THIN…_00000\",\"lid\":2,\"index\":1,…\n", ""},
     {"takes a file of digits after a dot", "cp store" + map1 + " 7; epinspect map ./7 | tail -n 1; epinspect map 7", 1, "4096 entries in …\n",
-     says({"LUN 7: configuration cannot be loaded: " + noList + "No such file or directory (code 9002)"})},
+     says({"LUN 7: configuration cannot be loaded: The LUN list /var/db/iscsi/luns.json is missing or cannot be read: No such file or directory (code 9002)"})},
     {"keeps all LUNs that have a map", twoLuns + "epinspect --root s find --extent 0 --luns 1-300 --json | head -n 2; epinspect --root s find --extent 0 --luns 1-300 | head -n 1;"
      "epinspect --root s list --luns 300 | grep LUN; epinspect --root s locate " + map1 + " 0 | head -n 1; epinspect --root s diff 300 1 --json | tail -n 1", 0,
      "{\"kind\":\"error\",\"file\":null,\"lid\":9,\"error\":null,\"code\":9004,…\n{\"kind\":\"match\",\"file\":\"" + map1 + "\",\"lid\":1,\"lids\":[1,300],\"first\":0,…\n" +
@@ -78,6 +80,12 @@ const Case cases[] = {
      "epinspect --root s $c 2>err >out; echo $? $(sed 's/.*: none//' err); done; rm $L; mkdir $L; epinspect --root s check >out; echo $?; rmdir $L; echo '[]' >$L; epinspect --root s list >out; echo $?; "
      "epinspect --root s list --luns 3-4 >out", 1, "1" + none9003 + "1" + none9003 + "1" + none9003 + "1" + none9003 + "1 is known:…not known, give --extent-size…\n0\n1\n0\n",
      says({notKnown + noList + "Invalid argument (code 9002)", notKnown + "No such LUN (code 9001)", "LUN 3-4: none is known: No such LUN (code 9001)"})},
+    {"loses no LUN of a damaged LUN list without a word", "epsample s; cd s/var/db/iscsi; L=luns.json; cp $L good; T='epinspect --root ../../..'; "
+     "t() { for c in check 'check " + map1 + "' 'lun 1-2'; do $T $c >out; echo -n $?; done; }; sed 's/^\\]/, {}]/' good >$L; t; echo '[{}]' >$L; t; "
+     "sed 's/name\": /&5, \"x\": /' good >$L; t; rm $L; ln -s none $L; t", 0, "110111111111", "…"},
+    {"looks for every map of a LUN", "epsample s; rm s/volume2/@iSCSI/LUN/*; epinspect --root s find --pool 16 | tail -n 1; epinspect --root s find --pool 16 >out", 1,
+     "4096 entries in 1 map: 3 matches of 768 entries\n", says({"/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000" + missing,
+     "/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000" + missing})},
 };
 // clang-format on
 

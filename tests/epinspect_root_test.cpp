@@ -34,7 +34,8 @@ const std::string denied = ": cannot be opened: Permission denied" + openFailed;
 const std::string leadsOut = ": cannot be opened: a link leads out of the folder of --root" + openFailed;
 const std::string tooMany = ": cannot be opened: Too many levels of symbolic links" + openFailed;
 const std::string noList =
-    "LUN 3: configuration cannot be loaded: The LUN list is missing or cannot be read: Invalid argument (code 9002)";
+    "LUN 3: configuration cannot be loaded: The LUN list /dev/null is missing or cannot be read: Invalid argument "
+    "(code 9002)";
 const std::string ep = "/volume1/@iSCSI/EP/", table = ep + "EP_TBL", map = "/volume1/@iSCSI/LUN/THINun_00000";
 const std::string in = "tSize\":4369\n", refused = "\"error\":\"EP_ERR_OPEN_FAILED\n";
 const std::string abc = "map         24584  1 entry  /volume1/@iSCSI/LUN/a  b  c\n";

@@ -353,12 +353,17 @@ Result goThrough(KnownList& known, FileBytes& bytes, const FileState& file, std:
     return isList && finder.found() ? finder.fillRecord(record) : otherwise;
 }
 
+/// Where the list lies.
+const char* listPath() {
+    const char* path = std::getenv("KELPISCSIEP_LUNS");  // NOLINT(concurrency-mt-unsafe): nothing here sets it
+    return path != nullptr ? path : "/var/db/iscsi/luns.json";
+}
+
 Result findLun(std::uint32_t lid, void* record) {
     static std::mutex mutex;
     static KnownList& known = *new KnownList;  // never destroyed: threads may call for as long as the program runs
     const std::lock_guard<std::mutex> lock(mutex);
-    const char* path = std::getenv("KELPISCSIEP_LUNS");  // NOLINT(concurrency-mt-unsafe): nothing here sets it
-    FileBytes bytes(path != nullptr ? path : "/var/db/iscsi/luns.json");
+    FileBytes bytes(listPath());
     const std::optional<FileState> file = bytes.state();
     if (!file) return LIST_UNREADABLE;
     if (known.file == file) {
@@ -368,15 +373,26 @@ Result findLun(std::uint32_t lid, void* record) {
     return goThrough(known, bytes, *file, lid, record);
 }
 
-/// Makes errno tell why the list is of no use, and 0 where it is: nothing else stands for a list that is there and says
-/// nothing of the LUN.
+/// Makes errno tell why the list is of no use, for this LUN or for all, and 0 where it is: nothing else stands for a
+/// list that is there and says nothing of the LUN.
 void setReason(Result result) {
-    if (result == LIST_MALFORMED) {
+    if (result == LIST_MALFORMED || result == BAD_VALUE) {
         errno = EBADMSG;
     } else if (result != LIST_UNREADABLE) {
         errno = 0;
     } else if (errno == 0) {  // no call has failed: it is no regular file
         errno = EINVAL;
+    }
+}
+
+/// "The LUN list /var/db/iscsi/luns.json" and `what` is wrong with it. Stays as it is until the thread asks again.
+const char* aboutList(const char* what) {
+    static thread_local std::string text;
+    try {
+        text = std::string("The LUN list ") + listPath() + " " + what;
+        return text.c_str();
+    } catch (...) {
+        return "There is no memory for a text";
     }
 }
 
@@ -404,11 +420,11 @@ __attribute__((visibility("default"))) const char* KELPiSCSIStrError(int code) {
         case NO_SUCH_LUN:
             return "No such LUN";
         case LIST_UNREADABLE:
-            return "The LUN list is missing or cannot be read";
+            return aboutList("is missing or cannot be read");
         case LIST_MALFORMED:
-            return "The LUN list is not a JSON array";
+            return aboutList("is not a JSON array");
         case BAD_VALUE:
-            return "The LUN list holds a value of the wrong type, or one that does not fit its field";
+            return aboutList("holds a value of the wrong type, or one that does not fit its field");
         default:
             return "Unknown error";
     }

@@ -72,6 +72,8 @@ void Context::prepareLuns() {
         if (obstacle && list.error != EACCES) {  // which the system finds too, and before any link
             failed(*obstacle);
             list.hostPath = "/dev/null";
+        } else if (list.isMissing() && list.dangling) {  // one that is not there at all is no failure
+            failed({{path, ""}, tool::EP_ERR_OPEN_FAILED, list.error, {}});
         }
         lunList_ = std::move(list.hostPath);
     }
