@@ -77,14 +77,16 @@ TEST_F(Changes, AreNoticedByEveryCommandThatWalks) {
              std::vector<std::pair<std::vector<const char*>, int>>{{{"map", "m", "--json"}, 0},
                                                                    {{"diff", "m", "none", "--json"}, 3},
                                                                    {{"find", "m", "--json", "--pool", "7"}, 0},
+                                                                   {{"entry", "m", "0-8191", "--json"}, 0},
                                                                    {{"check", "m", "--json"}, 3}}) {
             EXPECT_EQ(whole ? status : 1, run(words, change)) << words[0] << ": " << what;
             const std::string says = !change ? "" : "epinspect: m: has changed while it was read\n";
             EXPECT_TRUE(fits(content(".err"), (whole ? "" : "…") + says)) << words[0] << ": " << what;
-            const bool isCheck = words[0] == std::string("check");
-            const std::string list = !change   ? "…\"changed\":[]…"
-                                     : isCheck ? "…\"passing\":true…\"changed\":[\"m\"]…"
-                                               : "…\"changed\":[\"m\"]…";
+            const bool isCheck = words[0] == std::string("check"), hasSummary = words[0] != std::string("entry");
+            const std::string list = !hasSummary ? "…"
+                                     : !change   ? "…\"changed\":[]…"
+                                     : isCheck   ? "…\"passing\":true…\"changed\":[\"m\"]…"
+                                                 : "…\"changed\":[\"m\"]…";
             EXPECT_TRUE(fits(content(".out"), whole ? list : "…")) << words[0] << ": " << what;
         }
     }
@@ -97,6 +99,25 @@ TEST_F(Changes, OfAMapThatWasWalkedBeforeCastDoubtOnWhatItShares) {
     EXPECT_TRUE(fits(content(".err"), "epinspect: first: has changed while it was read\n"));
     EXPECT_TRUE(
         fits(content(".out"), "…second: shared-extents: entry 0: …: the file has changed while it was read)\n…"));
+}
+
+TEST_F(Changes, OfADataFileCastDoubtOnEntriesThatPointIntoIt) {
+    const std::string lun = "/volume1/@iSCSI/LUN/x", data = "/volume1/@iSCSI/EP/EP_DAT_0000";
+    namespace map = epbuilder::map;
+    EPFileBuilder file =
+        EPFileBuilder::map().set(map::totalCount, 8192).set(map::mappedCount, 3).set(map::syncCount, 0);
+    file.entry(0, 0x8000000000000000).entry(1, 0x8000000040000000);
+    write("r" + lun, file.entry(8191, 0x8000000000000001));
+    EPFileBuilder held = EPFileBuilder::data();
+    write("r" + data + "0", held.resize(24576 + 4096));
+    run({"--root", "r", "check", lun.c_str(), "--extent-size", "4096"}, [&] {
+        fs::resize_file("r" + data + "0", 24576 + 8192);
+        fs::copy("r" + data + "0", "r" + data + "1");
+    });
+    EXPECT_EQ(says({data + "0: has changed while it was read", data + "1: has changed while it was read"}),
+              content(".err"));
+    EXPECT_TRUE(fits(content(".out"), lun + ": missing-data-file: entry 1: … (possibly passing: …)\n" + lun +
+                                          ": beyond-data-file: entry 8191: … (possibly passing: …)\n1 file…"));
 }
 
 }  // namespace

@@ -67,7 +67,7 @@ void Report::complete(Finding& finding) const {
         const auto file = known_.find(path);
         return file != known_.end() ? file->second.lid : std::nullopt;
     };
-    finding.passing = context_.hasChanged(finding.file);
+    finding.passing = context_.hasChanged(finding.file) || context_.hasChanged(finding.dataFilePath);
     if (!finding.lid) finding.lid = lidOf(finding.file);
     if (!finding.partner) return;
     finding.passing = finding.passing || context_.hasChanged(finding.partner->file);

@@ -25,7 +25,7 @@ struct DataFile {
     bool missing = false;                               ///< nothing lies there
     std::optional<Failure> failure;                     ///< without a part; `file` is then null
 
-    std::optional<ChangeWatch> watch;  ///< where somebody asks for changes
+    std::optional<ChangeWatch> watch;  ///< nothing where it is missing
 
     FileState state;         ///< of what lay there when it was opened
     unsigned int looks = 0;  ///< how often DataFiles had been told to look again
@@ -35,7 +35,7 @@ struct DataFile {
 class DataFiles {
 public:
     /// Of the volume on which the file at `path` of the target lies. With `remarks` there is a remark about each data
-    /// file whose data start is doubtful, and about each that changes.
+    /// file whose data start is doubtful.
     DataFiles(Context& context, const std::string& path, bool remarks);
 
     /// The data file `number`. The reference holds until the next call.
@@ -44,7 +44,7 @@ public:
     /// From now on what at() gives is as it lies there now, looked at once for each file.
     void lookAgain() { ++looks_; }
 
-    /// Tells the context which of those that were opened have changed since.
+    /// Tells the context which of those that were asked for have changed since.
     void noticeChanges() const;
 
     /// Lists the volume's folder, once: from then on a data file that it does not hold costs no look. False when that
