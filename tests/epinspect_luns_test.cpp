@@ -6,14 +6,17 @@
 #include "ProgramTest.h"
 
 // The platform's library, for the program as a function of the test: LUN 1 is fine, LUN 2 is damaged. Ids without a LUN
-// get -5, those above 65535 -6; with `down` every id gets -8.
-static bool down = false, rewritten = false;
+// get -5, those above 65535 -6; with `down` every id gets -8, with `comesAndGoes` -9 but for
+// LUN 1 and large ids right after it.
+static bool down = false, rewritten = false, comesAndGoes = false, isThere = false;
 static int reason = 0;  ///< errno for ids without a LUN
 static unsigned int loadsOfLun2 = 0, unused = 0;
 
 extern "C" __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsigned int lid, int, void* record) {
     errno = lid == 2 ? EIO : reason;
     if (down) return -8;
+    isThere = lid == 1 || (isThere && lid > 65535);
+    if (comesAndGoes && !isThere) return -9;
     if (lid == 2) return ++loadsOfLun2 == 1 ? -7 : 0;
     if (lid == 1) std::memcpy(static_cast<char*>(record) + 118, "/volume1", 8);
     if (lid > 65535 && rewritten) return ++unused > 20 ? -9 : -6;
@@ -106,6 +109,11 @@ TEST_F(Luns, AreToldFromIdsWithoutOne) {
         says({damaged,
               "LUN 0-255: some may be missing, the answer for ids without a LUN has changed meanwhile (code -9)"}));
     rewritten = false;
+    comesAndGoes = true;
+    expectHere(
+        {"", "lun", "0-2"}, 1,
+        says({"LUN 0-2: some may be missing, the answer for ids without a LUN has changed meanwhile (code -6)"}));
+    comesAndGoes = false;
     down = true;
     const std::string noFiles = "…no EP files there…", none = "LUN 0-255: none is known: out of service";
     for (const int system : {0, ENOENT, EACCES}) {

@@ -136,6 +136,7 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
     for (std::uint64_t id = lids.first; id <= lids.last; ++id) {
         std::optional<Miss> miss = tryLun(context, id, lun);
         if (!miss) {
+            if (!met) unused.ask();  // an answer that does not change with the first LUN stands for all of them
             met = true;
             each(lun);
         } else {
