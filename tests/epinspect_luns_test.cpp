@@ -66,10 +66,11 @@ const Case cases[] = {
     {"takes a file of digits after a dot", "cp store" + map1 + " 7; epinspect map ./7 | tail -n 1; epinspect map 7", 1, "4096 entries in …\n",
      says({"LUN 7: configuration cannot be loaded: The LUN list /var/db/iscsi/luns.json is missing or cannot be read: No such file or directory (code 9002)"})},
     {"keeps all LUNs that have a map", twoLuns + "epinspect --root s find --extent 0 --luns 1-300 --json | head -n 2; epinspect --root s find --extent 0 --luns 1-300 | head -n 1;"
-     "epinspect --root s list --luns 300 | grep LUN; epinspect --root s locate " + map1 + " 0 | head -n 1; epinspect --root s diff 300 1 --json | tail -n 1", 0,
+     "epinspect --root s list --luns 300 | grep LUN; epinspect --root s locate " + map1 + " 0 | head -n 1; epinspect --root s diff 300 1 --json | tail -n 1; "
+     "epinspect --root s check --luns 10-300 | grep -o 'LUN [0-9]*: [a-z]*-[a-z]*'; epinspect --root s check --luns 1-300 2>out | grep -o 'LUN 300: [a-z]*-[a-z]*'", 0,
      "{\"kind\":\"error\",\"file\":null,\"lid\":9,\"error\":null,\"code\":9004,…\n{\"kind\":\"match\",\"file\":\"" + map1 + "\",\"lid\":1,\"lids\":[1,300],\"first\":0,…\n" +
      map1 + ": LUNs 1, 300: 0: mapped…\nmap         57344  LUN 300 …\nLUN 1 byte 0: …\n{\"kind\":\"summary\",\"file\":\"" + map1 + "\",\"lid\":300,\"otherFile\":\"" + map1 +
-     "\",\"otherLid\":1,…\n", says({lun9, lun9})},
+     "\",\"otherLid\":1,…\nLUN 300: lun-size\nLUN 300: beyond-data\nLUN 300: extent-size\nLUN 300: lun-size\nLUN 300: extent-size\nLUN 300: same-map\n", says({lun9, lun9})},
     {"reports a damaged LUN", twoLuns + "for c in 'lun 8-10' list check 'find --extent 7' 'check 1'; do epinspect -v --root s $c | tail -n 1; done", 0, "…1 match of 1 entry\n…",
      "epinspect: iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig …lid: 9 ,…\nepinspect: " + lun9 + "\nepinspect: iSCSI:…" + lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n"},
     {"reports a damaged LUN once", twoLuns + "epinspect --root s find 9 --extent 7", 1, "0 entries in 0 maps: 0 matches of 0 entries\n", says({lun9})},
