@@ -76,6 +76,7 @@ TEST_F(Changes, AreNoticedByEveryCommandThatWalks) {
         for (const auto& [words, status] :
              std::vector<std::pair<std::vector<const char*>, int>>{{{"map", "m", "--json"}, 0},
                                                                    {{"diff", "m", "none", "--json"}, 3},
+                                                                   {{"diff", "none", "m", "--json"}, 3},
                                                                    {{"find", "m", "--json", "--pool", "7"}, 0},
                                                                    {{"entry", "m", "0-8191", "--json"}, 0},
                                                                    {{"check", "m", "--json"}, 3}}) {

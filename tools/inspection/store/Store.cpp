@@ -52,6 +52,9 @@ void failEmptyStore(Context& context) {
 }
 
 Store::Store(Context& context, const Lids& lids) : context_(context) {
+    if (context.collection && !context.collection->complete) {
+        context.fail({context.root.hostPath(""), ""}, "files may be missing, the collection is incomplete", 0);
+    }
     forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
