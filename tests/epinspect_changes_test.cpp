@@ -73,16 +73,18 @@ TEST_F(Changes, AreNoticedByEveryCommandThatWalks) {
     write("none", EPFileBuilder::map());
     for (const auto& [what, change] : changes) {
         const bool whole = what != std::string("it shrinks");
-        for (const auto& [words, status] :
-             std::vector<std::pair<std::vector<const char*>, int>>{{{"map", "m", "--json"}, 0},
-                                                                   {{"diff", "m", "none", "--json"}, 3},
-                                                                   {{"diff", "none", "m", "--json"}, 3},
-                                                                   {{"find", "m", "--json", "--pool", "7"}, 0},
-                                                                   {{"entry", "m", "0-8191", "--json"}, 0},
-                                                                   {{"check", "m", "--json"}, 3}}) {
+        for (const auto& [words, status] : std::vector<std::pair<std::vector<const char*>, int>>{
+                 {{"map", "m", "--json"}, 0},
+                 {{"diff", "m", "none", "--json"}, 3},
+                 {{"diff", "none", "m", "--json"}, 3},
+                 {{"find", "m", "--json", "--pool", "7"}, 0},
+                 {{"entry", "m", "0-8191", "--json"}, 0},
+                 {{"read", "m", "--extent-size", "512", "--output", "i", "--json"}, 0},
+                 {{"check", "m", "--json"}, 3}}) {
+            fs::remove(path("i"));
             EXPECT_EQ(whole ? status : 1, run(words, change)) << words[0] << ": " << what;
             const std::string says = !change ? "" : "epinspect: m: has changed while it was read\n";
-            EXPECT_TRUE(fits(content(".err"), (whole ? "" : "…") + says)) << words[0] << ": " << what;
+            EXPECT_TRUE(fits(content(".err"), whole ? says : "…" + says + "…")) << words[0] << ": " << what;
             const bool isCheck = words[0] == std::string("check"), hasSummary = words[0] != std::string("entry");
             const std::string list = !hasSummary ? "…"
                                      : !change   ? "…\"changed\":[]…"
@@ -111,14 +113,17 @@ TEST_F(Changes, OfADataFileCastDoubtOnEntriesThatPointIntoIt) {
     write("r" + lun, file.entry(8191, 0x8000000000000001));
     EPFileBuilder held = EPFileBuilder::data();
     write("r" + data + "0", held.resize(24576 + 4096));
-    run({"--root", "r", "check", lun.c_str(), "--extent-size", "4096"}, [&] {
-        fs::resize_file("r" + data + "0", 24576 + 8192);
-        fs::copy("r" + data + "0", "r" + data + "1");
-    });
+    const auto grow = [&] {
+        fs::resize_file("r" + data + "0", fs::file_size("r" + data + "0") + 4096);
+        fs::copy("r" + data + "0", "r" + data + "1", fs::copy_options::overwrite_existing);
+    };
+    run({"--root", "r", "check", lun.c_str(), "--extent-size", "4096"}, grow);
     EXPECT_EQ(says({data + "0: has changed while it was read", data + "1: has changed while it was read"}),
               content(".err"));
     EXPECT_TRUE(fits(content(".out"), lun + ": missing-data-file: entry 1: … (possibly passing: …)\n" + lun +
                                           ": beyond-data-file: entry 8191: … (possibly passing: …)\n1 file…"));
+    run({"--root", "r", "read", lun.c_str(), "--extent-size", "512"}, grow);
+    EXPECT_TRUE(fits(content(".err"), "…" + says({data + "0: has changed while it was read"}) + "…"));
 }
 
 }  // namespace
