@@ -1,11 +1,15 @@
 // A map that changes while epinspect walks it: every command that walks says so.
+#include <dirent.h>
+#include <dlfcn.h>
 #include <sys/syscall.h>
 
+#include <cerrno>
 #include <utility>
 
 #include "InProcess.h"
 #include "ProgramTest.h"
 
+static int namesLeft = -1;             ///< of folders; after them reading a folder fails; below 0: it does not
 static std::function<void()> happens;  ///< once, when the second block of a map's entries is about to be read
 
 // read() itself, whatever a hardened build makes of that name.
@@ -13,6 +17,15 @@ ssize_t readInAStoreInUse(int descriptor, void* bytes, std::size_t size) __asm__
 __attribute__((visibility("default"))) ssize_t readInAStoreInUse(int descriptor, void* bytes, std::size_t size) {
     if (happens && lseek(descriptor, 0, SEEK_CUR) == 24576 + 8 * 4096) std::exchange(happens, {})();
     return syscall(SYS_read, descriptor, bytes, size);
+}
+
+dirent64* readdirOfABadDisk(DIR* folder) __asm__("readdir64");
+__attribute__((visibility("default"))) dirent64* readdirOfABadDisk(DIR* folder) {
+    static const auto system = reinterpret_cast<decltype(&readdirOfABadDisk)>(dlsym(RTLD_NEXT, "readdir64"));
+    if (namesLeft > 0) --namesLeft;
+    if (namesLeft != 0) return system(folder);
+    errno = EIO;
+    return nullptr;
 }
 
 namespace {
@@ -124,6 +137,16 @@ TEST_F(Changes, OfADataFileCastDoubtOnEntriesThatPointIntoIt) {
                                           ": beyond-data-file: entry 8191: … (possibly passing: …)\n1 file…"));
     run({"--root", "r", "read", lun.c_str(), "--extent-size", "512"}, grow);
     EXPECT_TRUE(fits(content(".err"), "…" + says({data + "0: has changed while it was read"}) + "…"));
+}
+
+TEST_F(Changes, OfADiskThatFailsInAFolderAreAFailure) {
+    namesLeft = 3;
+    const int status = ProgramTest::run([this] {
+        _exit(chdir(path("").c_str()) + runHere({"", "--root", "store", "list"}));
+    });
+    namesLeft = -1;
+    EXPECT_EQ(1, status);
+    EXPECT_TRUE(fits(content(".err"), says({"/: cannot be opened: Input/output error (…)"}) + "…"));
 }
 
 }  // namespace
