@@ -84,6 +84,9 @@ public:
     /// environment names one.
     void prepareLuns();
 
+    /// Whether the environment names the list of LUNs: the user's choice, which is to be there.
+    static bool isListNamed();
+
 private:
     std::optional<std::string> lunList_;  ///< where the list below the root folder lies
     std::vector<std::string> changedFiles_;

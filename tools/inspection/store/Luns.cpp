@@ -170,7 +170,10 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
     return trial;
 }
 
-bool isUnreadable(const Failure& none) { return none.reason != 0 && none.reason != ENOENT && none.reason != ENOTDIR; }
+bool isUnreadable(const Failure& none) {
+    const bool isAbsent = none.reason == ENOENT || none.reason == ENOTDIR;
+    return none.reason != 0 && (!isAbsent || Context::isListNamed());
+}
 
 void forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each) {
     const LunTrial trial = tryLuns(context, lids, each);
