@@ -78,12 +78,15 @@ const Case cases[] = {
      "epinspect: own: is not empty, …\nepinspect: FOLDER: '': must not be empty. Try 'epinspect collect --help'.\n"
      "epinspect: s/volume1/@iSCSI/EP: lies inside the store, which is never written\n"},
     {"says that a collection is incomplete", "(ulimit -f 20; epinspect --root own collect c); echo $?; "
-     "epinspect --root c list | grep -c EP_; rm -r c; rm own" + table2 + "; mkdir own" + table2 + "; "
-     "epinspect --root own collect c; epinspect --root c list | tail -n 0", 0,
-     "0 files and 2 LUNs collected, 0 bytes: c\n1\n…9 files and 2 LUNs …",
-     "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
+     "epinspect --root c list | grep -c missing; rm -r c; rm own" + table2 + "; mkdir own" + table2 + "; "
+     "epinspect --root own collect c; epinspect --root c list --json | head -n 1; rm c/volume1/@iSCSI/EP/*; "
+     "for what in list check 'check /var/db/iscsi/EP_JNL'; do epinspect --root c $what >/dev/null; echo $?; done; "
+     "epinspect diff c c", 1,
+     "0 files and 2 LUNs collected, 0 bytes: c\n1\n7\n9 files and 2 LUNs …: c\n"
+     R"({"kind":"error","file":"c","error":null,"code":0,"message":"c: a collection of …; it is incomplete"})"
+     "\n1\n1\n1\n…", "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
      "epinspect: c: a collection of …; it is incomplete\n…epinspect: " + table2 + ": cannot be opened: neither …)\n" +
-     incomplete + "epinspect: c: a collection of …; it is incomplete\n…"},
+     incomplete + "epinspect: c: a collection of …; it is incomplete\n…" + incomplete + incomplete},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
     damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not what a collection has there"),
     damaged("that took more than there was", "sed -i s/6442475520/24575/ collection.json", "not what a collection …"),
@@ -139,8 +142,8 @@ TEST_F(Collect, KeepsWhatItHasWhenInterrupted) {
     };
     EXPECT_EQ(1, collectHere());
     EXPECT_TRUE(fits(content(".err"), "epinspect: …/c: interrupted: the collection is incomplete\n"));
-    expect({"", "epinspect --root c dump --json /var/db/iscsi/EP_JNL; ls c", 0,
-            "{\"kind\":\"jnl\"…}\ncollection.json\nvar\nvolume1\n", ""});
+    expect({"", "epinspect --root c dump --json /var/db/iscsi/EP_JNL; cd c; find * -type f | sort", 0,
+            "{\"kind\":\"jnl\"…}\ncollection.json\nvar/db/iscsi/EP_JNL\nvar/db/iscsi/luns.json\n", ""});
 }
 
 TEST_F(Collect, ReadsAFileThatChangesAgainUpToThreeTimes) {

@@ -25,6 +25,7 @@ public:
         const std::error_code error = setRoot(folder);
         if (error) throw UsageError{"'" + folder + "': " + error.message()};
         if (damagedCollection) session.failed(*damagedCollection);
+        if (collection && !collection->complete) session.failed({{folder, ""}, 0, 0, "the collection is incomplete"});
         while (folder_.size() > 1 && folder_.back() == '/') folder_.pop_back();
     }
 

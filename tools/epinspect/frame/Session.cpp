@@ -31,8 +31,8 @@ void Session::remarkOnCollection() {
     const auto time = static_cast<unsigned int>(collection->time);
     std::string text = "a collection of " + ISCSI::TOOL::GetTimeInString(time) + ", without data, made by ";
     text += collection->program;
-    if (!collection->complete) text += "; it is incomplete";
-    remark(root.hostPath(""), text);
+    if (collection->complete) return remark(root.hostPath(""), text);
+    failed({{root.hostPath(""), ""}, 0, 0, text + "; it is incomplete"});
 }
 
 void Session::failed(const Failure& failure) {

@@ -22,7 +22,8 @@ public:
     /// cannot.
     void setRoot(const std::string& folder);
 
-    /// Says on standard error when what is looked at is a collection, and of when.
+    /// Says on standard error when what is looked at is a collection, and of when. An incomplete one is a failure: what
+    /// it lacks cannot be looked at.
     void remarkOnCollection();
 
     /// Prints the message, as an object too with --json. The exit status is 1 from then on. Throws OutputFailure.

@@ -108,8 +108,10 @@ Collector::Outcome Collector::collect(const StoreFile& file) {
     }
     CollectedFile collected;
     const Outcome outcome = copy(file, copyPath, collected);
-    if (outcome == Outcome::unreadable) unlink(copyPath.c_str());
-    if (outcome != Outcome::taken) return outcome;
+    if (outcome != Outcome::taken) {  // half a map would be taken for all of it
+        unlink(copyPath.c_str());
+        return outcome;
+    }
     collection_.files.push_back(collected);
     return writeList() ? Outcome::taken : Outcome::stopped;
 }
