@@ -135,6 +135,13 @@ const Case cases[] = {
 TEST_P(Collect, Promises) { expect(GetParam()); }
 INSTANTIATE_TEST_SUITE_P(, Collect, testing::ValuesIn(cases), nameOf);
 
+TEST_F(Collect, NeverWritesIntoAStoreThatHasAnotherNameToo) {
+    const std::string mounted = "mkdir m; unshare --map-root-user --mount sh -c 'mount --bind own/volume1 m && ";
+    if (run(mounted + "true' 2>/dev/null") != 0) GTEST_SKIP() << "nothing can be mounted here";
+    expect({"", "rmdir m; " + mounted + "epinspect --root own collect m/c'; ls own/volume1", 0, "@iSCSI\n",
+            "epinspect: m/c: lies inside the store, which is never written\n"});
+}
+
 TEST_F(Collect, KeepsWhatItHasWhenInterrupted) {
     int reads = 0;
     beforeRead = [&reads] {
