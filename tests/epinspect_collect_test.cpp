@@ -123,6 +123,12 @@ const Case cases[] = {
      R"({"kind":"field","file":")" + data2 + R"(","otherFile":")" + data2 + R"(","field":"size","a":16801792,"b":99999}
 {"kind":"summary","file":"own","otherFile":"b","summary":true,"files":11,"fields":2,"same":4352,…})" "\n",
      "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"},
+    {"an empty store is no success", "mkdir e; epinspect --root e collect c; echo $?; epinspect diff own e/ | tail -n 1; "
+     "epinspect diff $PWD/e e", 1, "0 files and 0 LUNs collected, 0 bytes: c\n1\n"
+     "10 files: 10 only in the first, …\n0 files: …\n",
+     "epinspect: LUN 0-255: …\nepinspect: e: no EP files found (EP_ERR_NO_PATH, 18990401)\n" + incomplete +
+     "epinspect: e: LUN 0-255: none is known: …\nepinspect: e: no EP files found …\nepinspect: …/e: LUN 0-255: …\n"
+     "epinspect: e: LUN 0-255: …\nepinspect: /…/e: no EP files found …\nepinspect: e: no EP files found …\n"},
     {"diff knows the LUNs of both stores", "large cp -a own b; sed -i 's/\"lid\": 2/\"lid\": 31/' "
      "b/var/db/iscsi/luns.json; printf '\\377' | dd of=b" + map2 + " bs=1 seek=44 conv=notrunc status=none; "
      "epinspect diff own b --json | head -n 1", 0,

@@ -60,6 +60,7 @@ void Collector::run(const Lids& lids) {
     for (const StoreFile& file : files) {
         if (collect(file) == Outcome::stopped) return;
     }
+    if (collection_.files.empty()) failEmptyStore(context_);
 }
 
 bool Collector::finish(bool complete) {
