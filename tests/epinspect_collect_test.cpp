@@ -51,11 +51,17 @@ const Case cases[] = {
      "Binary files…EP_DAT_00001 differ\nBinary files own" + data2 + " and c" + data2 + " differ\n", ""},
     {"answers on a collection as on the store", "printf x >>own" + map2 + "; rm own" + table2 + "; "
      "ln -s gone own/volume1/@iSCSI/EP/EP_DAT_00002; ln own" + data2 + " own/volume2/@iSCSI/EP/EP_DAT_00001; "
+     "mkdir own/spare; mv own/volume2/@iSCSI/EP/EP_FRI own/spare/f; ln -s /spare/f own/volume2/@iSCSI/EP/EP_FRI; "
+     "ln -s ../EP/EP_DAT_00000 own/volume2/@iSCSI/EP/EP_DAT_00002; "
      "epinspect --root own collect c; for what in 'list --json' check 'check --json' 'locate 1 540000000' "
      "'map " + map2 + "' 'find --pool 32' 'entry " + map2 + " 0' 'lun 1-2' 'dump /var/db/iscsi/EP_JNL'; do "
      "for root in own c; do epinspect --root $root $what 2>&1 | grep -v 'a collection of' >$root.out; done; "
      "cmp own.out c.out; done; stat -c %h c/volume2/*/EP/EP_DAT_00001", 0,
-     "10 files and 2 LUNs collected, …: c\n2\n", ""},
+     "12 files and 2 LUNs collected, …: c\n2\n", ""},
+    {"keeps a configuration without LUNs", "echo '[]' >own/var/db/iscsi/luns.json; epinspect --root own collect c; "
+     "epinspect --root c check | tail -n 0", 0, "10 files and 0 LUNs …",
+     "epinspect: LUN 0-255: none is known: No such LUN (code 9001)\nepinspect: c: a collection of …\n"
+     "epinspect: LUN 0-255: none is known: No such LUN (code 9001)\n"},
     {"keeps holes and times", "large truncate -s 40M own" + map2 + "; touch -d @1000000000.5 own" + map2 + "; "
      "large epinspect --root own collect c >/dev/null; du -k c" + map2 + " | cut -f1; stat -c '%.Y %s' c" + map2, 0,
      "2…\n1000000000.5…41943040\n", ""},

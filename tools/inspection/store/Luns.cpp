@@ -160,12 +160,15 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
 
 bool isUnreadable(const Failure& none) { return none.reason != 0 && none.reason != ENOENT && none.reason != ENOTDIR; }
 
-void forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each) {
-    const LunTrial trial = tryLuns(context, lids, each);
+LunTrial forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each) {
+    LunTrial trial = tryLuns(context, lids, each);
     for (const Failure& failure : trial.failures) context.failed(failure);
-    if (!trial.none) return;
-    if (lids.asked || isUnreadable(*trial.none)) return context.failed(*trial.none);
-    context.remark(textOf(trial.none->subject), whatOf(*trial.none));
+    if (trial.none && (lids.asked || isUnreadable(*trial.none))) {
+        context.failed(*trial.none);
+    } else if (trial.none) {
+        context.remark(textOf(trial.none->subject), whatOf(*trial.none));
+    }
+    return trial;
 }
 
 }  // namespace inspection

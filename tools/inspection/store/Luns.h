@@ -65,7 +65,7 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
 bool isUnreadable(const Failure& none);
 
 /// The same as tryLuns(), and reports what went wrong. That there is no LUN is a failure where the user asked for these
-/// ids or the configuration cannot be read, else a remark.
-void forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each);
+/// ids or the configuration cannot be read, else a remark. Returns what went wrong.
+LunTrial forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each);
 
 }  // namespace inspection

@@ -52,7 +52,8 @@ void failEmptyStore(Context& context) {
 }
 
 Store::Store(Context& context, const Lids& lids) : context_(context) {
-    forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
+    const LunTrial tried = forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
+    hasConfiguration_ = !luns_.empty() || (tried.none && tried.none->reason == 0);
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
     const std::string journalFolder = fs::path(journal).parent_path().string();

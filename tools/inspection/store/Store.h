@@ -56,6 +56,9 @@ public:
     /// The LUNs found, lowest id first; none at all where there is no configuration.
     const std::vector<Lun>& luns() const { return luns_; }
 
+    /// Whether there is a configuration, be it without any of these LUNs.
+    bool hasConfiguration() const { return hasConfiguration_; }
+
     /// Calls each() for the files, whose bytes are not read: journal, then volume by volume table, free-index, data and
     /// map files, then map files on no volume. Those that a configured LUN should have (its map file, the table and
     /// free-index file of its volume, the journal) are among them when they are missing. What may not be opened or
@@ -75,6 +78,7 @@ private:
 
     Context& context_;
     std::vector<Lun> luns_;
+    bool hasConfiguration_ = false;
     LunsByMap lunsByMap_;
     std::map<Place, std::set<std::string>> folders_;  ///< with the names of what should lie there
     std::set<std::string> reported_;                  ///< what could not be looked at
