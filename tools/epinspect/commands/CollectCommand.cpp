@@ -73,6 +73,7 @@ bool makeFolder(Session& session, const std::string& name) {
 
 void run(const CollectOptions& options, Session& session) {
     if (!makeFolder(session, options.folder)) return;
+    session.listing = false;
     holdInterruptions();
     Collector collector(session, options.folder, std::string("epinspect ") + EPINSPECT_VERSION, std::time(nullptr));
     collector.run(options.lids);

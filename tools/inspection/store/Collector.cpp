@@ -59,7 +59,7 @@ Collector::Collector(Context& context, std::string folder, std::string program, 
 void Collector::run(const Lids& lids) {
     if (!writeList()) return;
     Store store(context_, lids);
-    if (!writeLuns(store)) return;
+    if (context_.interrupted() || !writeLuns(store)) return;
     std::vector<StoreFile> files;
     store.forEachFile([&](const StoreFile& file) {
         files.push_back(file);

@@ -138,6 +138,7 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
         const std::uint64_t done = id - lids.first + 1;
         if (done % askAfter == 0) unused.ask();
         context.progress("LUN ids", done, count);
+        if (context.interrupted()) return {};
     }
     unused.ask();
     const std::optional<int> usual = usualCode(misses, count);
