@@ -58,8 +58,8 @@ struct LunTrial {
     std::optional<Failure> none;    ///< there is no LUN and no other failure: what the first id got
 };
 
-/// Calls each() for the LUNs whose ids are in `lids`, lowest id first. Every id is loaded once. Ends when the context is
-/// interrupted.
+/// Calls each() for the LUNs whose ids are in `lids`, lowest id first. Every id is loaded once. Ends when the context
+/// is interrupted.
 LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each);
 
 /// Whether there is no LUN because the configuration cannot be read; an empty one, or none at all, is no failure.
