@@ -52,11 +52,17 @@ const Case cases[] = {
      "Binary files…EP_DAT_00001 differ\nBinary files own" + data2 + " and c" + data2 + " differ\n", ""},
     {"answers on a collection as on the store", "printf x >>own" + map2 + "; rm own" + table2 + "; "
      "ln -s gone own/volume1/@iSCSI/EP/EP_DAT_00002; ln own" + data2 + " own/volume2/@iSCSI/EP/EP_DAT_00001; "
+     "mkdir own/spare; mv own/volume2/@iSCSI/EP/EP_FRI own/spare/f; ln -s /spare/f own/volume2/@iSCSI/EP/EP_FRI; "
+     "ln -s ../EP/EP_DAT_00000 own/volume2/@iSCSI/EP/EP_DAT_00002; "
      "epinspect --root own collect c; for what in 'list --json' check 'check --json' 'locate 1 540000000' "
      "'map " + map2 + "' 'find --pool 32' 'entry " + map2 + " 0' 'lun 1-2' 'dump /var/db/iscsi/EP_JNL'; do "
      "for root in own c; do epinspect --root $root $what 2>&1 | grep -v 'a collection of' >$root.out; done; "
      "cmp own.out c.out; done; stat -c %h c/volume2/*/EP/EP_DAT_00001", 0,
-     "10 files and 2 LUNs collected, …: c\n2\n", ""},
+     "12 files and 2 LUNs collected, …: c\n2\n", ""},
+    {"keeps a configuration without LUNs", "echo '[]' >own/var/db/iscsi/luns.json; epinspect --root own collect c; "
+     "epinspect --root c check | tail -n 0", 0, "10 files and 0 LUNs …",
+     "epinspect: LUN 0-255: none is known: No such LUN (code 9001)\nepinspect: c: a collection of …\n"
+     "epinspect: LUN 0-255: none is known: No such LUN (code 9001)\n"},
     {"keeps holes and times", "large truncate -s 40M own" + map2 + "; touch -d @1000000000.5 own" + map2 + "; "
      "large epinspect --root own collect c >/dev/null; du -k c" + map2 + " | cut -f1; stat -c '%.Y %s' c" + map2, 0,
      "2…\n1000000000.5…41943040\n", ""},
@@ -79,12 +85,15 @@ const Case cases[] = {
      "epinspect: own: is not empty, …\nepinspect: FOLDER: '': must not be empty. Try 'epinspect collect --help'.\n"
      "epinspect: s/volume1/@iSCSI/EP: lies inside the store, which is never written\n"},
     {"says that a collection is incomplete", "(ulimit -f 20; epinspect --root own collect c); echo $?; "
-     "epinspect --root c list | grep -c EP_; rm -r c; rm own" + table2 + "; mkdir own" + table2 + "; "
-     "epinspect --root own collect c; epinspect --root c check", 1,
-     "0 files and 2 LUNs collected, 0 bytes: c\n1\n…9 files and 2 LUNs …\n9 files, …",
-     "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
+     "epinspect --root c list | grep -c missing; rm -r c; rm own" + table2 + "; mkdir own" + table2 + "; "
+     "epinspect --root own collect c; epinspect --root c list --json | head -n 1; rm c/volume1/@iSCSI/EP/*; "
+     "for what in list check; do epinspect --root c $what >/dev/null; echo $?; done; "
+     "epinspect diff c c", 1,
+     "0 files and 2 LUNs collected, 0 bytes: c\n1\n7\n9 files and 2 LUNs …: c\n"
+     R"({"kind":"error","file":"c","error":null,"code":0,"message":"c: files may be missing, the collection is )"
+     "incomplete\"}\n1\n1\n…", "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
      "epinspect: c: a collection of …\n" + mayMiss + "…epinspect: " + table2 + ": cannot be opened: neither …)\n" +
-     incomplete + "epinspect: c: a collection of …\n" + mayMiss},
+     incomplete + "epinspect: c: a collection of …\n" + mayMiss + "…" + mayMiss + mayMiss},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
     damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not a collection's list"),
     damaged("that took more than there was", "sed -i s/6442475520/24575/ collection.json", "not a collection's list"),
@@ -121,6 +130,12 @@ const Case cases[] = {
      R"({"kind":"field","file":")" + data2 + R"(","otherFile":")" + data2 + R"(","field":"size","a":16801792,"b":99999}
 {"kind":"summary","file":"own","otherFile":"b","summary":true,"files":11,"fields":2,"same":4352,…})" "\n",
      "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"},
+    {"an empty store is no success", "mkdir e; epinspect --root e collect c; echo $?; epinspect diff own e/ | tail -n 1; "
+     "epinspect diff $PWD/e e", 1, "0 files and 0 LUNs collected, 0 bytes: c\n1\n"
+     "10 files: 10 only in the first, …\n0 files: …\n",
+     "epinspect: LUN 0-255: …\nepinspect: e: no EP files found (EP_ERR_NO_PATH, 18990401)\n" + incomplete +
+     "epinspect: e: LUN 0-255: none is known: …\nepinspect: e: no EP files found …\nepinspect: …/e: LUN 0-255: …\n"
+     "epinspect: e: LUN 0-255: …\nepinspect: /…/e: no EP files found …\nepinspect: e: no EP files found …\n"},
     {"diff knows the LUNs of both stores", "large cp -a own b; sed -i 's/\"lid\": 2/\"lid\": 31/' "
      "b/var/db/iscsi/luns.json; printf '\\377' | dd of=b" + map2 + " bs=1 seek=44 conv=notrunc status=none; "
      "epinspect diff own b --json | head -n 1", 0,
@@ -134,6 +149,13 @@ const Case cases[] = {
 TEST_P(Collect, Promises) { expect(GetParam()); }
 INSTANTIATE_TEST_SUITE_P(, Collect, testing::ValuesIn(cases), nameOf);
 
+TEST_F(Collect, NeverWritesIntoAStoreThatHasAnotherNameToo) {
+    const std::string mounted = "mkdir m; unshare --map-root-user --mount sh -c 'mount --bind own/volume1 m && ";
+    if (run(mounted + "true' 2>/dev/null") != 0) GTEST_SKIP() << "nothing can be mounted here";
+    expect({"", "rmdir m; " + mounted + "epinspect --root own collect m/c'; ls own/volume1", 0, "@iSCSI\n",
+            "epinspect: m/c: lies inside the store, which is never written\n"});
+}
+
 TEST_F(Collect, KeepsWhatItHasWhenInterrupted) {
     int reads = 0;
     beforeRead = [&reads] {
@@ -141,8 +163,8 @@ TEST_F(Collect, KeepsWhatItHasWhenInterrupted) {
     };
     EXPECT_EQ(1, collectHere());
     EXPECT_TRUE(fits(content(".err"), "epinspect: …/c: interrupted: the collection is incomplete\n"));
-    expect({"", "epinspect --root c dump --json /var/db/iscsi/EP_JNL; ls c", 0,
-            "{\"kind\":\"jnl\"…}\ncollection.json\nvar\nvolume1\n", ""});
+    expect({"", "epinspect --root c dump --json /var/db/iscsi/EP_JNL; cd c; find * -type f | sort", 0,
+            "{\"kind\":\"jnl\"…}\ncollection.json\nvar/db/iscsi/EP_JNL\nvar/db/iscsi/luns.json\n", ""});
 }
 
 TEST_F(Collect, ReadsAFileThatChangesAgainUpToThreeTimes) {

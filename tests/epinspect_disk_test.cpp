@@ -20,7 +20,7 @@ __attribute__((visibility("default"))) ssize_t writeToImage(int descriptor, cons
     if (writesAllowed == 0) return -1;
     if (writesAllowed > 0) --writesAllowed;
     if (lseek64(descriptor, position, SEEK_SET) < 0) return -1;
-    return write(descriptor, bytes, size);
+    return write(descriptor, bytes, std::min<std::size_t>(size, 100000));
 }
 
 namespace {
@@ -106,11 +106,11 @@ TEST_F(Disk, AnImageThatCannotBeFinishedKeepsWhatIsRight) {
     EXPECT_EQ(1, read(0, [] { return ENOSPC; }));
     EXPECT_EQ(says({"i: removed, nothing was written to it: No space left on device"}), content(".err"));
     EXPECT_FALSE(fs::exists(path("i")));
-    EXPECT_EQ(1, read(3, [] { return ENOSPC; }));
-    EXPECT_TRUE(
-        fits(content(".err"), says({"i: incomplete, it holds the first … of 5963776 bytes: No space left on device"})));
+    EXPECT_EQ(1, read(2, [] { return ENOSPC; }));
+    EXPECT_EQ(says({"i: incomplete, it holds the first 200000 of 5963776 bytes: No space left on device"}),
+              content(".err"));
     const std::string begun = content("i");
-    EXPECT_TRUE(!begun.empty() && begun == image_.substr(262144, begun.size())) << begun.size();
+    EXPECT_TRUE(begun == image_.substr(262144, 200000)) << begun.size();
     fs::remove(path("i"));
     EXPECT_EQ(1, read(3, [] {
                   writesAllowed = raise(SIGINT) - 1;
@@ -177,6 +177,13 @@ TEST_F(Disk, AnyRangeIsReadAsTheStoreIsNow) {
     EXPECT_LT(1000000U, check(data + "1: LUN 1 bytes "));
     fs::rename(away, file);
     EXPECT_EQ(0U, check(""));
+    for (const std::string& replaced : {file, copy.map->path}) {
+        fs::rename(replaced, away);
+        EXPECT_EQ(0, mkfifo(replaced.c_str(), 0600));  // whoever opens that waits for ever
+        EXPECT_LT(1000000U, check(": neither a regular file nor a block device"));
+        fs::rename(away, replaced);
+        EXPECT_EQ(0U, check(""));
+    }
     const auto size = fs::file_size(file);
     fs::resize_file(file, size / 2);
     EXPECT_LT(100000U, check(": past the end, the file holds "));

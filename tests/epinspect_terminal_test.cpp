@@ -78,6 +78,12 @@ TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {
     Terminal reading(80, script("epinspect read endless --extent-size 1G --offset 90T --length 90T >/dev/null"));
     Terminal entering(80, script("epinspect entry endless 5 0-99999999 >/dev/null"));
     Terminal trying(80, script("KELPISCSIEP_LUNS=none epinspect lun 0-4294967295 --json >none"));
+    Terminal collecting(80, script("exec epinspect collect c --luns 0-4294967295"));
+    EXPECT_TRUE(fits(collecting.shownUntil(" left"), "  …% …of 4294967296 LUN ids, … s left"));
+    collecting.interrupt();
+    EXPECT_TRUE(fits(collecting.shown(),
+                     "  …%…\r\033[Kepinspect: c: interrupted: the collection is incomplete\n"
+                     "0 files and 0 LUNs collected, 0 bytes: c\n=1"));
     EXPECT_TRUE(fits(drawing.shownUntil(" left"), "  …%  … of 137438950400 entries, … s left"));
     EXPECT_TRUE(fits(reading.shownUntil(" left"), " …%  … of 98956046499840 bytes, … s left"));
     const std::string entries = entering.shownUntil(" left");  // all that were read, and not the last block of them

@@ -1,15 +1,15 @@
 // epinspect collect: what is needed to look at a store elsewhere, without its data.
-#include <etc/ISCSIEPFormat.h>
-
 #include <ctime>
 #include <filesystem>
 #include <memory>
+#include <set>
 
 #include "commands/Commands.h"
 #include "commands/MapArguments.h"
 #include "frame/Interruption.h"
 #include "frame/Output.h"
 #include "store/Collector.h"
+#include "store/FileNames.h"
 #include "store/Folder.h"
 #include "store/Luns.h"
 
@@ -25,14 +25,32 @@ struct CollectOptions {
     Lids lids = usualLids;
 };
 
-/// Whether `folder` lies inside the store that is collected.
+/// The folders below which nothing may be written. Of a copy that is all of it; the machine itself has room beside its
+/// store.
+std::set<FileIdentity> foldersOfStore(const Session& session) {
+    std::set<FileIdentity> folders;
+    const auto add = [&](const std::string& path) {
+        const Located located = session.root.locate(path);
+        if (located.isThere()) folders.insert(located.identity);
+    };
+    const bool isCopy = session.root.isFolder() && session.root.locate("/").identity != identityOf("/");
+    if (isCopy) add("/");
+    add("/var/db/iscsi");
+    for (const std::string& name : listFolder(session, "/").names) {
+        if (volumeIn(name) != 0) add("/" + name + (isCopy ? "" : "/@iSCSI"));
+    }
+    return folders;
+}
+
+/// Whether `folder`, which need not be there, lies inside the store that is collected, whatever names lead there.
 bool isInsideStore(const Session& session, const fs::path& folder) {
+    const std::set<FileIdentity> store = foldersOfStore(session);
     std::error_code error;
-    const std::string path = fs::weakly_canonical(folder, error).string() + "/";
-    const std::string root =
-        session.root.isFolder() ? fs::canonical(session.root.hostPath("/"), error).string() + "/" : "";
-    if (!root.empty()) return path.compare(0, root.size(), root) == 0;
-    return path.find(tool::EP_ISCSI_FOLDER) != std::string::npos || path.rfind(tool::EP_JNL_FOLDER, 0) == 0;
+    for (fs::path above = fs::weakly_canonical(folder, error); above.has_relative_path(); above = above.parent_path()) {
+        const auto identity = identityOf(above.string());
+        if (above.filename() == "@iSCSI" || (identity && store.count(*identity) > 0)) return true;
+    }
+    return false;
 }
 
 /// Makes the folder; reports why it cannot be used.
@@ -57,6 +75,7 @@ bool makeFolder(Session& session, const std::string& name) {
 
 void run(const CollectOptions& options, Session& session) {
     if (!makeFolder(session, options.folder)) return;
+    session.listing = false;
     holdInterruptions();
     Collector collector(session, options.folder, std::string("epinspect ") + EPINSPECT_VERSION, std::time(nullptr));
     collector.run(options.lids);

@@ -29,7 +29,7 @@ public:
     }
 
     void remark(const std::string& subject, const std::string& text) override {
-        session_.remark(folder_ + subject, text);
+        session_.remark(folder_ + (isOnTarget(subject) ? "" : ": ") + subject, text);
     }
 
     void progress(const char* things, std::uint64_t done, std::uint64_t total) override {
@@ -43,11 +43,16 @@ public:
 protected:
     void report(const Failure& failure) override {
         Failure here = failure;
-        if (!here.subject.file.empty()) here.subject.file = folder_ + here.subject.file;
+        if (isOnTarget(here.subject.file)) here.subject.file.insert(0, folder_);
         session_.failed(here);
     }
 
 private:
+    /// Whether this is the path of a file; it may be the folder itself, or a LUN.
+    bool isOnTarget(const std::string& subject) const {
+        return subject.substr(0, 1) == "/" && subject != root.hostPath("");
+    }
+
     Session& session_;
     std::string folder_;
 };
@@ -135,8 +140,11 @@ void compareStores(const DiffOptions& options, DiffScope scope, Session& session
     DiffTotals totals;
     FilesDiff files(scope, totals);
     Store stores[] = {Store(sides[0], usualLids), Store(sides[1], usualLids)};
+    bool isEmpty[] = {true, true};
     for (const FilePair& pair : pairFiles(stores[0], stores[1])) {
         ++totals.files;
+        isEmpty[0] = isEmpty[0] && !pair.a;
+        isEmpty[1] = isEmpty[1] && !pair.b;
         if (!pair.a || !pair.b) {
             ++(pair.a ? totals.onlyFirst : totals.onlySecond);
             printOnlyInOne(session, pair);
@@ -149,6 +157,9 @@ void compareStores(const DiffOptions& options, DiffScope scope, Session& session
         const DiffSide a = {sides[0], path, NamedBy::target};
         const DiffSide b = {sides[1], path, NamedBy::target};
         if (scope.headers || isMap) files.compare(a, b, output, isMap);
+    }
+    for (const int i : {0, 1}) {
+        if (isEmpty[i]) failEmptyStore(sides[i]);
     }
     printSummary(session, {options.a.file}, {options.b.file}, totals, scope);
 }

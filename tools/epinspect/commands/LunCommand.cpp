@@ -39,7 +39,10 @@ void printLun(Session& session, const Lun& lun) {
 
 void printLuns(Session& session, Range lids) {
     const auto print = [&session](const Lun& lun) { printLun(session, lun); };
-    if (lids.first < lids.last) return forEachLun(session, {lids.first, lids.last}, print);
+    if (lids.first < lids.last) {
+        forEachLun(session, {lids.first, lids.last}, print);
+        return;
+    }
     Lun lun;
     const auto lid = static_cast<std::uint32_t>(lids.first);
     if (session.succeeded(loadLun(session, lid, lun), subjectOf({lid, lid}))) print(lun);

@@ -54,8 +54,10 @@ public:
     explicit ImageSink(const Descriptor& image) : image_(image) {}
 
     void put(std::string_view bytes) override {
-        if (const int error = writeAt(image_.number(), bytes.data(), bytes.size(), end_)) throw ImageFailure{error};
-        end_ += bytes.size();
+        const std::uint64_t start = end_;
+        const int error = writeAt(image_.number(), bytes.data(), bytes.size(), end_);
+        holdsData_ = holdsData_ || end_ > start;
+        if (error != 0) throw ImageFailure{error};
     }
 
     std::uint64_t skip(std::uint64_t length) override {
@@ -63,9 +65,14 @@ public:
         return length;
     }
 
+    /// How much of the LUN it has, holes included; and whether any byte of that was written.
+    std::uint64_t end() const { return end_; }
+    bool holdsData() const { return holdsData_; }
+
 private:
     const Descriptor& image_;
     std::uint64_t end_ = 0;
+    bool holdsData_ = false;
 };
 
 void reportMissing(Session& session, const LunMap& lun, const LunTotals& totals) {
@@ -74,16 +81,16 @@ void reportMissing(Session& session, const LunMap& lun, const LunTotals& totals)
                                                 " bytes could not be read, zeros stand in their place");
 }
 
-/// Ends an image that cannot be finished after its last byte that is right, or removes it. Reports that, and why.
-void giveUp(Session& session, const std::string& path, const Descriptor& image, const LunTotals& totals,
+/// Keeps what is of use in an image that cannot be finished. Reports that, and why.
+void giveUp(Session& session, const std::string& path, const Descriptor& image, const ImageSink& sink,
             std::uint64_t length, int error) {
     session.endProgress();
-    const std::string done = std::to_string(totals.all());
+    const std::string done = std::to_string(sink.end());
     std::string what = "incomplete, it holds the first " + done + " of " + std::to_string(length) + " bytes";
-    if (totals.data == 0) {
+    if (!sink.holdsData()) {
         unlink(path.c_str());
         what = "removed, nothing was written to it";
-    } else if (ftruncate(image.number(), static_cast<off_t>(totals.all())) != 0) {
+    } else if (ftruncate(image.number(), static_cast<off_t>(sink.end())) != 0) {
         what = "incomplete, only the first " + done + " bytes are right";
     }
     const bool interrupted = isInterrupted();
@@ -119,7 +126,7 @@ void writeImage(const ReadOptions& options, Session& session, const LunMap& lun,
     if (!image.isOpen()) return session.failed({{path, ""}, 0, errno, "cannot be made"});
     ImageSink sink(image);
     LunCopy copy(session, lun, options.place.choice, sink);
-    const auto end = [&](int error) { giveUp(session, path, image, copy.totals(), length, error); };
+    const auto end = [&](int error) { giveUp(session, path, image, sink, length, error); };
     try {
         setSize(image, length);
         copy.run(options.offset, length);

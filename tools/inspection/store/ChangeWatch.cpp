@@ -36,6 +36,7 @@ ChangeWatch::State ChangeWatch::look() const {
     state.size = status.st_size;
     state.seconds = status.st_mtim.tv_sec;
     state.nanoseconds = status.st_mtim.tv_nsec;
+    if (!S_ISREG(status.st_mode) && !S_ISBLK(status.st_mode)) return state;
     const Trial trial(*context_);
     tool::ISCSIEPFile file(hostPath_);
     state.headerError = file.readHeader();

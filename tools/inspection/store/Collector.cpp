@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <filesystem>
+#include <functional>
 #include <tuple>
 
 #include "JsonText.h"
@@ -41,6 +42,13 @@ std::string listed(const tool::ISCSILUNConfInfo& record) {
            ",\"rootPath\":" + jsonText(record.rootPath) + ",\"name\":" + jsonText(record.name) + "}";
 }
 
+/// Where a file lies on the target, links followed.
+std::string realPathOf(const TargetRoot& root, const StoreFile& file) {
+    if (root.isFolder()) return file.hostPath.substr(root.hostPath("").size());
+    std::error_code error;
+    return std::filesystem::canonical(file.hostPath, error).string();
+}
+
 }  // namespace
 
 Collector::Collector(Context& context, std::string folder, std::string program, std::int64_t time)
@@ -52,15 +60,18 @@ Collector::Collector(Context& context, std::string folder, std::string program, 
 void Collector::run(const Lids& lids) {
     if (!writeList()) return;
     Store store(context_, lids);
-    if (!writeLuns(store.luns())) return;
+    if (context_.interrupted() || !writeLuns(store)) return;
     std::vector<StoreFile> files;
     store.forEachFile([&](const StoreFile& file) {
         files.push_back(file);
         allBytes_ += bytesToTake(file);
     });
+    const auto isLink = [](const StoreFile& file) { return file.link.has_value(); };
+    std::stable_partition(files.begin(), files.end(), std::not_fn(isLink));  // then what links lead to is there
     for (const StoreFile& file : files) {
-        if (collect(file) == Outcome::stopped) return;
+        if ((isLink(file) ? collectLink(file) : collect(file)) == Outcome::stopped) return;
     }
+    if (collection_.files.empty()) failEmptyStore(context_);
 }
 
 bool Collector::finish(bool complete) {
@@ -75,11 +86,11 @@ std::uint64_t Collector::bytesToTake(const StoreFile& file) const {
     return isData ? std::min<std::uint64_t>(there, tool::EP_HEADER_BLOCK_SIZE) : there;
 }
 
-/// The LUNs as the stand-in for the platform's library reads them; nothing where there are none.
-bool Collector::writeLuns(const std::vector<Lun>& luns) {
-    if (luns.empty()) return true;
+/// The LUNs as the stand-in for the platform's library reads them; nothing where there is no configuration.
+bool Collector::writeLuns(const Store& store) {
+    if (!store.hasConfiguration()) return true;
     std::string text;
-    for (const Lun& lun : luns) {
+    for (const Lun& lun : store.luns()) {
         const tool::ISCSILUNConfInfo& record = lun.record;
         if (!isUTF8(record.uuid) || !isUTF8(record.rootPath) || !isUTF8(record.name)) {
             context_.failed({{"", "LUN " + std::to_string(record.lid)},
@@ -99,26 +110,71 @@ bool Collector::writeLuns(const std::vector<Lun>& luns) {
 
 Collector::Outcome Collector::collect(const StoreFile& file) {
     const std::string copyPath = folder_ + file.path;
-    if (file.missing && !file.link) return Outcome::taken;
+    if (file.missing) return Outcome::taken;
     const int error = makeFoldersAbove(copyPath);
     if (error != 0) return cannotWrite(copyPath, error);
-    if (file.missing) {  // a link that leads nowhere stays one
-        std::error_code failure;
-        std::filesystem::create_symlink(*file.link, copyPath, failure);
-        return failure ? cannotWrite(copyPath, failure.value()) : Outcome::taken;
-    }
     CollectedFile collected;
     const Outcome outcome = copy(file, copyPath, collected);
-    if (outcome == Outcome::unreadable) unlink(copyPath.c_str());
-    if (outcome != Outcome::taken) return outcome;
+    if (outcome != Outcome::taken) {  // half a map would be taken for all of it
+        unlink(copyPath.c_str());
+        return outcome;
+    }
     collection_.files.push_back(collected);
     return writeList() ? Outcome::taken : Outcome::stopped;
 }
 
-/// Copies a file, up to three times while it changes.
+/// A link stays one. What it leads to is collected where it lies, even if that is no place of a store's file.
+Collector::Outcome Collector::collectLink(const StoreFile& file) {
+    StoreFile original = file;
+    original.path = realPathOf(context_.root, file);
+    struct stat status = {};
+    const bool isFree = lstat((folder_ + original.path).c_str(), &status) != 0;
+    if (!file.missing && copyOf(file) == nullptr && isFree && original.path != file.path) {
+        const Outcome outcome = collect(original);
+        if (outcome != Outcome::taken) return outcome;
+    }
+    const std::string copyPath = folder_ + file.path;
+    std::error_code failure;
+    if (const int error = makeFoldersAbove(copyPath)) return cannotWrite(copyPath, error);
+    std::filesystem::create_symlink(*file.link, copyPath, failure);
+    if (failure) return cannotWrite(copyPath, failure.value());
+    if (file.missing) return Outcome::taken;
+    const CollectedFile* copy = copyOf(file);
+    if (copy == nullptr || !isNameOf(*copy, file)) {  // it went over links that the collection has not
+        unlink(copyPath.c_str());
+        return collect(file);
+    }
+    collection_.files.push_back(*copy);
+    collection_.files.back().path = file.path;
+    return writeList() ? Outcome::taken : Outcome::stopped;
+}
+
+/// What has been collected of the same file under another name; null when nothing has.
+const CollectedFile* Collector::copyOf(const StoreFile& file) const {
+    struct stat status = {};
+    if (stat(file.hostPath.c_str(), &status) != 0) return nullptr;
+    const auto copy = copies_.find({status.st_dev, status.st_ino});
+    return copy != copies_.end() ? &copy->second : nullptr;
+}
+
+/// Whether the path of `file` leads to `copy` in the collection too.
+bool Collector::isNameOf(const CollectedFile& copy, const StoreFile& file) const {
+    TargetRoot root;
+    if (root.set(folder_)) return false;
+    const Located located = root.locate(file.path);
+    return located.isThere() && located.identity == identityOf(folder_ + copy.path);
+}
+
+/// Copies a file, up to three times while it changes. One that has been copied under another name becomes a second name
+/// of that copy.
 Collector::Outcome Collector::copy(const StoreFile& file, const std::string& copyPath, CollectedFile& collected) {
     constexpr int mostTries = 3;
-    if (linkToCopy(file, copyPath, collected)) return Outcome::taken;
+    const CollectedFile* known = copyOf(file);
+    if (known != nullptr && link((folder_ + known->path).c_str(), copyPath.c_str()) == 0) {
+        collected = *known;
+        collected.path = file.path;
+        return Outcome::taken;
+    }
     for (int tries = 1; tries <= mostTries; ++tries) {
         const Outcome outcome = copyOnce(file, copyPath, collected);
         if (outcome != Outcome::taken) return outcome;
@@ -126,17 +182,6 @@ Collector::Outcome Collector::copy(const StoreFile& file, const std::string& cop
     }
     context_.remark(file.path, "has changed while it was read");
     return Outcome::taken;
-}
-
-/// A file that has been copied under another name becomes a second name of that copy.
-bool Collector::linkToCopy(const StoreFile& file, const std::string& copyPath, CollectedFile& collected) {
-    struct stat status = {};
-    if (stat(file.hostPath.c_str(), &status) != 0) return false;
-    const auto known = copies_.find({status.st_dev, status.st_ino});
-    if (known == copies_.end() || link((folder_ + known->second.path).c_str(), copyPath.c_str()) != 0) return false;
-    collected = known->second;
-    collected.path = file.path;
-    return true;
 }
 
 Collector::Outcome Collector::copyOnce(const StoreFile& file, const std::string& copyPath, CollectedFile& collected) {

@@ -33,12 +33,14 @@ private:
     /// How the work on a file ended.
     enum class Outcome { taken, unreadable, stopped };
 
-    bool writeLuns(const std::vector<Lun>& luns);
+    bool writeLuns(const Store& store);
     std::uint64_t bytesToTake(const StoreFile& file) const;
     Outcome collect(const StoreFile& file);
+    Outcome collectLink(const StoreFile& file);
+    const CollectedFile* copyOf(const StoreFile& file) const;
     Outcome copy(const StoreFile& file, const std::string& copyPath, CollectedFile& collected);
     Outcome copyOnce(const StoreFile& file, const std::string& copyPath, CollectedFile& collected);
-    bool linkToCopy(const StoreFile& file, const std::string& copyPath, CollectedFile& collected);
+    bool isNameOf(const CollectedFile& copy, const StoreFile& file) const;
     bool writeList();
 
     /// Reports that `path` of the collection cannot be written, and stops.

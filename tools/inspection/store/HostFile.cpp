@@ -27,7 +27,7 @@ std::uint64_t nextHole(int file, std::uint64_t position, std::uint64_t end) {
 
 }  // namespace
 
-int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position) {
+int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t& position) {
     while (size > 0) {
         const ssize_t written = pwrite(file, bytes, size, static_cast<off_t>(position));
         if (written < 0 && errno == EINTR) continue;
@@ -57,7 +57,8 @@ int writeWhole(const std::string& path, const std::string& text) {
     const std::string fresh = path + ".new";
     Descriptor file(open(fresh.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666));
     if (!file.isOpen()) return errno;
-    int error = writeAt(file.number(), text.data(), text.size(), 0);
+    std::uint64_t end = 0;
+    int error = writeAt(file.number(), text.data(), text.size(), end);
     const int closing = file.close();
     if (error == 0) error = closing;
     if (error == 0 && std::rename(fresh.c_str(), path.c_str()) != 0) error = errno;
@@ -82,7 +83,6 @@ CopyEnd copySparse(int from, int to, std::uint64_t size, const std::function<boo
         if (got <= 0) return {How::readFailed, got < 0 ? errno : 0};
         const int error = writeAt(to, block.data(), static_cast<std::size_t>(got), position);
         if (error != 0) return {How::writeFailed, error};
-        position += static_cast<std::uint64_t>(got);
         if (!step(position)) return {How::stopped, 0};
     }
     if (ftruncate(to, static_cast<off_t>(size)) != 0) return {How::writeFailed, errno};

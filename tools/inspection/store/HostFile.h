@@ -10,8 +10,8 @@
 
 namespace inspection {
 
-/// Writes all of the bytes. Returns 0 or the errno value.
-int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t position);
+/// Writes all of the bytes from `position` on, which becomes the end of those written. Returns 0 or the errno value.
+int writeAt(int file, const char* bytes, std::size_t size, std::uint64_t& position);
 
 /// Puts all of the file at `path` into `text`. Returns 0 or the errno value of what failed, EFBIG when it holds more
 /// than `most` bytes; `text` may then hold a part.

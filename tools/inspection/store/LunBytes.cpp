@@ -93,13 +93,17 @@ private:
 };
 
 LunBytes::LunBytes(Context& context, const LunMap& lun, const PlaceChoice& choice)
-    : lun_(lun), choice_(choice), files_(context, lun.targetPath, true) {}
+    : context_(context), lun_(lun), choice_(choice), files_(context, lun.targetPath, true) {}
 
 void LunBytes::forEachPart(std::uint64_t offset, std::uint64_t length, const Each& each) {
     files_.lookAgain();
     const std::uint64_t size = lun_.extentSize;
     const std::uint64_t mapEnd = std::min(lun_.mappableSize(), offset + length);
     Parts parts(offset, offset + length, each);
+    const std::optional<Failure> obstacle = mapEnd > offset ? mapObstacle() : std::nullopt;
+    if (obstacle &&
+        !parts.addUnreadable(mapEnd - offset, {{lun_.file, ""}, obstacle->error, obstacle->reason, obstacle->what}))
+        return;
     std::vector<MapEntry> entries;
     while (parts.at() < mapEnd) {
         const std::uint64_t first = parts.at() / size;
@@ -125,6 +129,12 @@ void LunBytes::forEachPart(std::uint64_t offset, std::uint64_t length, const Eac
     if (parts.addUnreadable(parts.end() - parts.at(), {{pastMap.subject.file, ""}, pastMap.error, 0, pastMap.what})) {
         parts.flush();
     }
+}
+
+/// Why the map file may not be opened: another one lies in its place.
+std::optional<Failure> LunBytes::mapObstacle() const {
+    if (stateOf(lun_.map->path) == lun_.state) return std::nullopt;
+    return context_.root.locate(lun_.targetPath).obstacleToFile(lun_.file);
 }
 
 /// Reads some of the entries from `first` to `last`; none where the file has ended. After a failure `entries` has the

@@ -72,12 +72,14 @@ public:
 private:
     class Parts;
 
+    std::optional<Failure> mapObstacle() const;
     int readEntries(std::uint64_t first, std::uint64_t last, std::vector<MapEntry>& entries);
     bool addRun(Parts& parts, const MapRun& run);
     bool addExtents(Parts& parts, const ExtentPlace& place, std::uint64_t offset, std::uint64_t length);
     bool readPiece(const LunPart& part, unsigned char* bytes, const Each& missing);
     bool readRest(const LunPart& part, unsigned char* bytes, const Each& missing);
 
+    const Context& context_;
     const LunMap& lun_;
     PlaceChoice choice_;
     DataFiles files_;

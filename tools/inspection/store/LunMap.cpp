@@ -40,7 +40,7 @@ std::uint64_t LunMap::mappableSize() const {
 
 LunMap LunMap::copy() const {
     auto own = std::make_unique<tool::ISCSIEPFileMAP>(map->path);
-    return {lids, file, targetPath, std::move(own), extentSize, {}, entries, size};
+    return {lids, file, targetPath, std::move(own), extentSize, {}, entries, size, state};
 }
 
 Subject LunMap::subject(const std::string& part) const {
@@ -81,6 +81,7 @@ std::optional<LunMap> openLunMap(Context& context, const LunName& lun, std::opti
     map.map = std::move(opened.file);
     map.watch = opened.watch;
     map.entries = opened.entries;
+    map.state = stateOf(map.map->path);
     map.size = known ? std::min<std::uint64_t>(named->luns.front().record.size, sizeLimit) : map.mappableSize();
     return map;
 }

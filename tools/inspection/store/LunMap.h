@@ -11,6 +11,7 @@
 
 #include "store/ChangeWatch.h"
 #include "store/Context.h"
+#include "store/FileSize.h"
 #include "store/NamedMap.h"
 
 namespace inspection {
@@ -24,6 +25,7 @@ struct LunMap {
     std::optional<ChangeWatch> watch;                  ///< of the map file, from before it was opened
     std::uint64_t entries = 0;
     std::uint64_t size = 0;  ///< bytes of the LUN, at most 2^63: as configured, else what the entries hold
+    FileState state;         ///< of what was opened
 
     /// How many bytes the entries stand for, at most 2^63.
     std::uint64_t mappableSize() const;

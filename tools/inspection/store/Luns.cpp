@@ -146,6 +146,7 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
         const std::uint64_t done = id - lids.first + 1;
         if (done % askAfter == 0) unused.ask();
         context.progress("LUN ids", done, count);
+        if (context.interrupted()) return {};
     }
     unused.ask();
     const std::optional<int> usual = usualCode(misses, count);
@@ -175,12 +176,15 @@ bool isUnreadable(const Failure& none) {
     return none.reason != 0 && (!isAbsent || Context::isListNamed());
 }
 
-void forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each) {
-    const LunTrial trial = tryLuns(context, lids, each);
+LunTrial forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each) {
+    LunTrial trial = tryLuns(context, lids, each);
     for (const Failure& failure : trial.failures) context.failed(failure);
-    if (!trial.none) return;
-    if (lids.asked || isUnreadable(*trial.none)) return context.failed(*trial.none);
-    context.remark(textOf(trial.none->subject), whatOf(*trial.none));
+    if (trial.none && (lids.asked || isUnreadable(*trial.none))) {
+        context.failed(*trial.none);
+    } else if (trial.none) {
+        context.remark(textOf(trial.none->subject), whatOf(*trial.none));
+    }
+    return trial;
 }
 
 }  // namespace inspection

@@ -58,7 +58,8 @@ struct LunTrial {
     std::optional<Failure> none;    ///< there is no LUN and no other failure: what the first id got
 };
 
-/// Calls each() for the LUNs whose ids are in `lids`, lowest id first. Every id is loaded once.
+/// Calls each() for the LUNs whose ids are in `lids`, lowest id first. Every id is loaded once. Ends when the context
+/// is interrupted.
 LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each);
 
 /// Whether there is no LUN because the configuration cannot be read; an empty one is no failure, nor is none at all
@@ -66,7 +67,7 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
 bool isUnreadable(const Failure& none);
 
 /// The same as tryLuns(), and reports what went wrong. That there is no LUN is a failure where the user asked for these
-/// ids or the configuration cannot be read, else a remark.
-void forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each);
+/// ids or the configuration cannot be read, else a remark. Returns what went wrong.
+LunTrial forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each);
 
 }  // namespace inspection

@@ -31,12 +31,6 @@ bool precedes(const std::string& one, const std::string& other) {
     return std::pair(rank(one), std::string_view(one)) < std::pair(rank(other), std::string_view(other));
 }
 
-std::vector<Lun> findLuns(Context& context, const Lids& lids) {
-    std::vector<Lun> luns;
-    forEachLun(context, lids, [&luns](const Lun& lun) { luns.push_back(lun); });
-    return luns;
-}
-
 /// Whether what lies at `path` counts as a map file by its folder alone.
 bool mayHaveAnyName(const std::string& path) {
     const FileKind* kind = kindByName(path);
@@ -57,11 +51,21 @@ void failEmptyStore(Context& context) {
     context.fail({top.empty() ? "/" : top, ""}, "no EP files found", tool::EP_ERR_NO_PATH);
 }
 
-Store::Store(Context& context, const Lids& lids) : Store(context, findLuns(context, lids)) {}
+Store::Store(Context& context, const Lids& lids) : context_(context) {
+    const LunTrial tried = forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
+    hasConfiguration_ = !luns_.empty() || (tried.none && tried.none->reason == 0);
+    findFolders();
+}
 
 Store::Store(Context& context, std::vector<Lun> luns) : context_(context), luns_(std::move(luns)) {
-    if (context.collection && !context.collection->complete) {
-        context.fail({context.root.hostPath(""), ""}, "files may be missing, the collection is incomplete", 0);
+    hasConfiguration_ = !luns_.empty();
+    findFolders();
+}
+
+/// Finds out where files of the store may lie, and which should.
+void Store::findFolders() {
+    if (context_.collection && !context_.collection->complete) {
+        context_.fail({context_.root.hostPath(""), ""}, "files may be missing, the collection is incomplete", 0);
     }
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
@@ -69,10 +73,10 @@ Store::Store(Context& context, std::vector<Lun> luns) : context_(context), luns_
     folders_[{journalPlace, journalFolder}];
     if (!luns_.empty()) folders_[{journalPlace, journalFolder}].insert(fs::path(journal).filename().string());
     for (const Lun& lun : luns_) {
-        const std::string map = context.root.plainPath(lun.mapPath);
+        const std::string map = context_.root.plainPath(lun.mapPath);
         lunsByMap_.add(map, lun);
         expect(map);
-        const Trial trial(context);
+        const Trial trial(context_);
         const tool::ISCSIEPFile file(map);
         std::string path;
         if (file.getTBLFilePath(path) == 0) expect(path);

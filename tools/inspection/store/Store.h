@@ -60,6 +60,9 @@ public:
     /// The LUNs found, lowest id first; none at all where there is no configuration.
     const std::vector<Lun>& luns() const { return luns_; }
 
+    /// Whether there is a configuration, be it without any of these LUNs.
+    bool hasConfiguration() const { return hasConfiguration_; }
+
     /// Calls each() for the files, whose bytes are not read: journal, then volume by volume table, free-index, data and
     /// map files, then map files on no volume. Those that a configured LUN should have (its map file, the table and
     /// free-index file of its volume, the journal) are among them when they are missing. What may not be opened or
@@ -70,6 +73,7 @@ private:
     /// Folders that may hold files of the store, in the order of forEachFile(): by volume, the journal's first.
     using Place = std::pair<std::uint64_t, std::string>;
 
+    void findFolders();
     void expect(const std::string& path);
     std::vector<std::string> namesIn(const std::string& folder);
     std::vector<std::string> storeFilesIn(const std::string& folder, std::set<std::string> expected);
@@ -79,6 +83,7 @@ private:
 
     Context& context_;
     std::vector<Lun> luns_;
+    bool hasConfiguration_ = false;
     LunsByMap lunsByMap_;
     std::map<Place, std::set<std::string>> folders_;  ///< with the names of what should lie there
     std::set<std::string> reported_;                  ///< what could not be looked at
