@@ -14,12 +14,13 @@
 extern "C" __attribute__((visibility("default"), weak)) void syslog(int /*priority*/, const char* /*format*/, ...) {}
 
 /// Stops what runs wild: after ten seconds for an input, before a file gets larger than 8 MiB, and without showing what
-/// it prints. Options that are typed come later, and count more.
+/// it prints. Inputs are as long as they may be from the start: a slow program would not get beyond a few bytes.
+/// Options that are typed come later, and count more.
 extern "C" int LLVMFuzzerInitialize(int* count, char*** arguments) {
-    static char time[] = "-timeout=10", output[] = "-close_fd_mask=3";
+    static char time[] = "-timeout=10", output[] = "-close_fd_mask=3", length[] = "-len_control=0";
     static std::vector<char*> words(*arguments, *arguments + *count);
-    words.insert(words.begin() + 1, {time, output});
-    *count += 2;
+    words.insert(words.begin() + 1, {time, output, length});
+    *count += 3;
     *arguments = words.data();
     const rlimit fileSize = {8U << 20U, RLIM_INFINITY};
     return setrlimit(RLIMIT_FSIZE, &fileSize);

@@ -18,10 +18,11 @@ constexpr std::size_t extentSize = 512;
 const std::string names[] = {"volume1/@iSCSI/LUN/BLUNux_00000", "volume1/@iSCSI/LUN/THINuy_00000",
                              "volume1/@iSCSI/EP/EP_DAT_00000", "volume1/@iSCSI/EP/EP_TBL"};
 
-/// The store's folder, gone at the end of the program, and the content of its files as they are before each run.
+/// The store's folder and a copy of it, gone at the end of the program, and the content of its files as they are before
+/// each run.
 struct Store {
     Store() {
-        require(mkdtemp(root.data()) != nullptr);
+        require(mkdtemp(root.data()) != nullptr && mkdtemp(whole.data()) != nullptr);
         EPFileBuilder map = EPFileBuilder::map().set(epbuilder::map::totalCount, 64);
         for (std::uint64_t i = 0; i < 64; ++i) map.entry(i, i % 8 == 7 ? 0 : 1ULL << 63U | i);
         map.write(root + "/" + names[0]);
@@ -35,10 +36,12 @@ struct Store {
             std::ifstream file(root + "/" + name, std::ios::binary);
             contents.emplace_back(std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>());
         }
+        fs::copy(root, whole, fs::copy_options::recursive);
     }
-    ~Store() { fs::remove_all(root); }
+    ~Store() { fs::remove_all(root), fs::remove_all(whole); }
 
     std::string root = (fs::temp_directory_path() / "epfuzzXXXXXX").string();
+    std::string whole = root;  ///< what it is compared with
     std::vector<std::string> contents;
 };
 
@@ -74,20 +77,31 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
     for (std::size_t i = 0; i < contents.size(); ++i) {
         std::ofstream(store.root + "/" + names[i], std::ios::binary | std::ios::trunc) << contents[i];
     }
-    const std::string one = "/" + names[0], other = "/" + names[1], root = "--root=" + store.root;
-    run({"epinspect", root, "check", "--luns", "1-2", "--extent-size", sizeOfExtents});
-    run({"epinspect", root, "check", "--luns", "1", "--json", one, other});
-    run({"epinspect", root, "list", "--luns", "1-2", "--json"});
-    run({"epinspect", root, "diff", one, other});
-    run({"epinspect", root, "find", "--extent", small + "-" + bits});
-    run({"epinspect", root, "map", one, "--first", small, "--chart"});
-    run({"epinspect", root, "entry", other, small, offset});
-    run({"epinspect", root, "locate", "1", small, offset});
-    run({"epinspect", root, "locate", other, offset, "--extent-size", sizeOfExtents, "--address-bits", "48"});
-    run({"epinspect", root, "read", "1", "--offset", small, "--length", length, "--count-from", "file"});
-    const std::string image = store.root + "/image";
-    run({"epinspect", root, "read", "1", "--output", image, "--offset", small, "--json"});
+    const std::string one = "/" + names[0], other = "/" + names[1], data = "/" + names[2];
+    const std::string image = store.root + "/image", collected = store.root + "/collected";
+    const auto inspect = [&folder = store.root](std::vector<std::string> words) {
+        words.insert(words.begin(), {"epinspect", "--root=" + folder});
+        run(words);
+    };
+    inspect({"check", "--luns", "1-2", "--extent-size", sizeOfExtents});
+    inspect({"check", "--luns", "1", "--json", one, other});
+    inspect({"list", "--luns", "1-2", "--json"});
+    inspect({"dump", "--json", one, data, "/" + names[3]});
+    inspect({"diff", one, other});
+    inspect({"diff", "--headers", "--json", one, other});
+    inspect({"diff", store.whole, store.root});
+    inspect({"find", "--extent", small + "-" + bits});
+    inspect({"map", one, "--first", small, "--chart"});
+    inspect({"entry", other, small, offset});
+    inspect({"locate", "1", small, offset});
+    inspect({"locate", other, offset, "--extent-size", sizeOfExtents, "--address-bits", "48"});
+    inspect({"read", "1", "--offset", small, "--length", length, "--count-from", "file"});
+    inspect({"read", "1", "--output", image, "--offset", small, "--json"});
+    inspect({"extent", data, small, "--extent-size", length});
+    inspect({"collect", collected, "--luns", "1-2"});
+    run({"epinspect", "--root", collected, "check", "--luns", "1-2"});
+    run({"epinspect", "--root", collected, "read", "1", "--offset", small, "--json"});
     fs::remove(image);
-    run({"epinspect", root, "extent", "/" + names[2], small, "--extent-size", length});
+    fs::remove_all(collected);
     return 0;
 }

@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include <cctype>
+#include <csignal>
 #include <fstream>
 #include <functional>
 #include <string>
@@ -51,7 +52,9 @@ inline std::string holds(const std::string& what) {
 inline int exitStatus(int status) { return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status); }
 
 /// Keeps this process and what it starts from running wild: for longer than a minute, or filling the disk with a file.
+/// It can be interrupted even where the tests run in the background.
 inline void limitProcess() {
+    signal(SIGINT, SIG_DFL);
     const rlimit fileSize = {8U << 20U, RLIM_INFINITY};
     setrlimit(RLIMIT_FSIZE, &fileSize);
     alarm(60);

@@ -167,6 +167,13 @@ TEST_F(Collect, KeepsWhatItHasWhenInterrupted) {
             "{\"kind\":\"jnl\"…}\ncollection.json\nvar/db/iscsi/EP_JNL\nvar/db/iscsi/luns.json\n", ""});
 }
 
+TEST_F(Collect, NamesACopyThatCannotBeMade) {
+    beforeRead = [this] { std::filesystem::create_directories(path("c" + table2)); };
+    EXPECT_EQ(1, collectHere());
+    EXPECT_TRUE(
+        fits(content(".err"), "epinspect: …/c" + table2 + ": cannot be written: Is a directory\n…incomplete\n"));
+}
+
 TEST_F(Collect, ReadsAFileThatChangesAgainUpToThreeTimes) {
     int changes = 0;
     beforeRead = [&] {

@@ -205,6 +205,9 @@ TEST_F(Store, ReadLosesNoMoreThanWhatCannotBeRead) {
     expectRead(-1, 24576 + 3 * MiB + 298000,
                std::string(294812, 'x') + std::string(4096, '\0') + std::string(301092, 'x'),
                ep + "0: LUN 5 bytes 4489216-4493311: " + reason + "…LUN 5: 4096 of 600000");
+    expectRead(
+        0, 24576 + 3 * MiB + 298000, zeros,
+        ep + "0: LUN 5 bytes 4194404-4794403: the file has become shorter while it was read (…: 600000 of 600000");
     expectRead(-1, 24576 + 32, zeros, all + reason + "…LUN 5: 600000 of 600000");
     expectRead(0, 24576 + 32, zeros, all + "the file has become shorter while it was read (…LUN 5: 600000 of 600000");
     // A block of a map is 512 entries.
