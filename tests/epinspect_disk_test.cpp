@@ -122,7 +122,7 @@ TEST_F(Disk, AnImageThatCannotBeFinishedKeepsWhatIsRight) {
 
 /// Keeps what it is told.
 struct Listener : inspection::Context {
-    void failed(const inspection::Failure& failure) override { ADD_FAILURE() << messageOf(failure); }
+    void report(const inspection::Failure& failure) override { ADD_FAILURE() << messageOf(failure); }
     void remark(const std::string& subject, const std::string& /*text*/) override { remarks += subject + "\n"; }
     void progress(const char* /*things*/, std::uint64_t /*done*/, std::uint64_t /*total*/) override {}
     void trying(bool /*begins*/) override {}

@@ -24,6 +24,7 @@ int run(int argc, char** argv) {
     addList(program, session);
     addDump(program, session);
     addCheck(program, session);
+    addUsage(program, session);
     addCollect(program, session);
     program.group("Entries of a map");
     addMap(program, session);
@@ -32,6 +33,7 @@ int run(int argc, char** argv) {
     addFind(program, session);
     program.group("Bytes");
     addLocate(program, session);
+    addOwner(program, session);
     addRead(program, session);
     addExtent(program, session);
     program.group("Configuration and paths");

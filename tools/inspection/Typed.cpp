@@ -19,6 +19,19 @@ Typed<std::uint64_t> parse(std::string_view digits, std::uint64_t most, const ch
     return number;
 }
 
+/// "FIRST-LAST", or one, each as `take` takes it.
+template <typename Take>
+Typed<Range> rangeOf(std::string_view text, Take&& take) {
+    const auto dash = text.find('-', 1);
+    const auto first = take(text.substr(0, dash));
+    if (first.fault != nullptr) return first.fault;
+    if (dash == std::string_view::npos) return Range{first.value, first.value};
+    const auto last = take(text.substr(dash + 1));
+    if (last.fault != nullptr) return last.fault;
+    if (last.value < first.value) return "range runs backwards";
+    return Range{first.value, last.value};
+}
+
 }  // namespace
 
 Typed<std::uint64_t> numberIn(std::string_view text, std::uint64_t most) { return parse(text, most, "not a number"); }
@@ -38,15 +51,11 @@ Typed<std::uint64_t> sizeIn(std::string_view text, std::uint64_t most) {
 }
 
 Typed<Range> rangeIn(std::string_view text, std::uint64_t most) {
-    static constexpr const char* what = "not a number, nor FIRST-LAST";
-    const auto dash = text.find('-', 1);
-    const auto first = parse(text.substr(0, dash), most, what);
-    if (first.fault != nullptr) return first.fault;
-    if (dash == std::string_view::npos) return Range{first.value, first.value};
-    const auto last = parse(text.substr(dash + 1), most, what);
-    if (last.fault != nullptr) return last.fault;
-    if (last.value < first.value) return "range runs backwards";
-    return Range{first.value, last.value};
+    return rangeOf(text, [most](std::string_view part) { return parse(part, most, "not a number, nor FIRST-LAST"); });
+}
+
+Typed<Range> sizeRangeIn(std::string_view text, std::uint64_t most) {
+    return rangeOf(text, [most](std::string_view part) { return sizeIn(part, most); });
 }
 
 }  // namespace inspection

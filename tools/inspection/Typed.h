@@ -31,4 +31,7 @@ Typed<std::uint64_t> sizeIn(std::string_view text, std::uint64_t most);
 /// "NUMBER" or "FIRST-LAST", of at most `most`.
 Typed<Range> rangeIn(std::string_view text, std::uint64_t most);
 
+/// "SIZE" or "FIRST-LAST", both sizes, of at most `most`.
+Typed<Range> sizeRangeIn(std::string_view text, std::uint64_t most);
+
 }  // namespace inspection

@@ -28,12 +28,14 @@ using namespace inspection;
 /// What there is to say goes to nbdkit's log.
 class PluginContext : public Context {
 public:
-    void failed(const Failure& failure) override { nbdkit_error("%s", messageOf(failure).c_str()); }
     void remark(const std::string& subject, const std::string& text) override {
         nbdkit_error("%s: %s", subject.c_str(), text.c_str());
     }
     void progress(const char* /*things*/, std::uint64_t /*done*/, std::uint64_t /*total*/) override {}
     void trying(bool /*begins*/) override {}
+
+protected:
+    void report(const Failure& failure) override { nbdkit_error("%s", messageOf(failure).c_str()); }
 };
 
 /// The parameters, and the LUN that they lead to.

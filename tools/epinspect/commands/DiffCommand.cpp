@@ -28,12 +28,6 @@ public:
         while (folder_.size() > 1 && folder_.back() == '/') folder_.pop_back();
     }
 
-    void failed(const Failure& failure) override {
-        Failure here = failure;
-        if (!here.subject.file.empty()) here.subject.file = folder_ + here.subject.file;
-        session_.failed(here);
-    }
-
     void remark(const std::string& subject, const std::string& text) override {
         session_.remark(folder_ + subject, text);
     }
@@ -45,6 +39,13 @@ public:
     void trying(bool begins) override { session_.trying(begins); }
     void changed(const std::string& name) override { session_.changed(folder_ + name); }
     std::vector<std::string> takeTrialLog() override { return session_.takeTrialLog(); }
+
+protected:
+    void report(const Failure& failure) override {
+        Failure here = failure;
+        if (!here.subject.file.empty()) here.subject.file = folder_ + here.subject.file;
+        session_.failed(here);
+    }
 
 private:
     Session& session_;

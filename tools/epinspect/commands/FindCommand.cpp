@@ -7,7 +7,6 @@
 #include "frame/Json.h"
 #include "frame/Numbers.h"
 #include "frame/Output.h"
-#include "map/MapWalk.h"
 #include "map/RunSearch.h"
 #include "store/ChosenFiles.h"
 #include "store/Luns.h"
@@ -76,10 +75,7 @@ void searchMap(const FindOptions& options, Session& session, const StoreFile& fi
             }
         });
     };
-    if (map.entries == 0) return;
-    const auto progress = [&](std::uint64_t done) { session.progress("entries", done, map.entries); };
-    const auto failure = walkRuns(file.path, *map.file, {0, map.entries - 1}, progress, each);
-    if (failure) session.failed(*failure);
+    walkAllRuns(session, file.path, *map.file, map.entries, each);
     map.watch->noticeChange();
 }
 

@@ -97,7 +97,8 @@ std::string partnerText(const Finding& finding) {
 std::string sharedText(const Finding& finding) {
     const Finding::Entries& entries = *finding.entries;
     return "pool " + std::to_string(entries.entry.poolNumber) + ", " +
-           extentsText(entries.entry.extentAddress, entries.count) + ", used by " + partnerText(finding) + " too";
+           extentsText(entries.entry.extentAddress, entries.count) + ", used by " + partnerText(finding) + " too" +
+           (finding.alike ? "; all that they share is alike, as in a snapshot" : "");
 }
 
 /// The part of a message that describes the entries.
@@ -170,6 +171,13 @@ std::string lineOf(const Finding& finding) {
            messageOf(finding) + (finding.passing ? " (possibly passing: the file has changed while it was read)" : "");
 }
 
+/// "PATH: LUN 3: shares 5 entries with its parent LUN 1, PATH".
+std::string lineOf(const Snapshot& snapshot) {
+    return snapshot.file + ": " + (snapshot.lid ? lunText(*snapshot.lid) + ": " : "") + "shares " +
+           counted(snapshot.entries, "entry", "entries") + " with its parent " +
+           (snapshot.parentLid ? lunText(*snapshot.parentLid) + ", " : "") + snapshot.parent;
+}
+
 }  // namespace
 
 void FindingOutput::print(const Finding& finding) {
@@ -197,6 +205,7 @@ void FindingOutput::printAsJson(const Finding& finding) {
     }
     if (finding.partner) json_->path("otherFile", finding.partner->file);
     if (finding.partner && finding.entries) json_->number("otherFirst", finding.partner->first);
+    if (finding.alike) json_->boolean("snapshot", true);
     if (finding.passing) json_->boolean("passing", true);
     json_->text("message", lineOf(finding)).end();
 }
@@ -211,6 +220,9 @@ void FindingOutput::printSummary(const Report& report) const {
     if (session_.json) return printSummaryAsJson(report, findings);
     epinspect::print(counted(report.files(), "file", "files") + ", " + counted(report.entries(), "entry", "entries") +
                      ", " + counted(findings, "finding", "findings") + rules + "\n");
+    for (const Snapshot& snapshot : report.snapshots()) {
+        epinspect::print("Snapshot: " + forReader(lineOf(snapshot)) + "\n");
+    }
     for (const std::string& text : report.gaps()) epinspect::print("Not compared: " + forReader(text) + "\n");
 }
 
@@ -223,7 +235,15 @@ void FindingOutput::printSummaryAsJson(const Report& report, std::uint64_t findi
         .number("findings", findings)
         .beginObject("rules");
     for (const auto& [rule, count] : report.findings()) json.number(std::string_view(nameOf(rule)), count);
-    json.endObject().texts("notCompared", report.gaps()).texts("changed", session_.changedFiles()).end();
+    json.endObject().texts("notCompared", report.gaps()).texts("changed", session_.changedFiles());
+    json.beginList("snapshots");
+    for (const Snapshot& snapshot : report.snapshots()) {
+        json.beginObject().path("file", snapshot.file).path("parent", snapshot.parent);
+        if (snapshot.lid) json.number("lid", *snapshot.lid);
+        if (snapshot.parentLid) json.number("parentLid", *snapshot.parentLid);
+        json.number("entries", snapshot.entries).endObject();
+    }
+    json.endList().end();
 }
 
 }  // namespace epinspect

@@ -202,7 +202,7 @@ void addLocate(Command& parent, Session& session) {
     addMapArgument(command, options->place.map);
     command.arguments("OFFSET", "Offset of a byte in the LUN; K, M, G, T or KiB, MiB, GiB, TiB may follow",
                       options->offsets, parseSize);
-    addPlaceOptions(command, options->place);
+    addPlaceOptions(command, options->place.extentSize, options->place.choice);
     command.flag("--json", "One JSON object per offset", session.json).action([options, &session] {
         run(*options, session);
     });

@@ -2,9 +2,9 @@
 #include <limits>
 #include <memory>
 
+#include "commands/Chart.h"
 #include "commands/Commands.h"
 #include "commands/MapArguments.h"
-#include "commands/MapChart.h"
 #include "commands/MapOutput.h"
 #include "frame/Json.h"
 #include "frame/Numbers.h"
@@ -60,7 +60,7 @@ void run(const MapOptions& options, Session& session) {
         return;
     }
     const std::uint64_t count = std::min(options.count, total - options.first);
-    MapChart chart(options.first, count, outputWidth());
+    Chart chart(options.first, count, outputWidth());
     MapSummary summary;
     Json json(named->file, named->lids());
     LineBuffer line;
@@ -87,7 +87,9 @@ void run(const MapOptions& options, Session& session) {
     if (session.json) {
         printSummary(json, summary, session.changedFiles());
     } else if (options.chart) {
-        print(chart.draw(outputIsUnicode()) + wrapped(textOf(*named, summary), outputWidth(), 0));
+        print(chart.draw(outputIsUnicode(), "entry", "entries") +
+              Chart::legend(outputIsUnicode(), outputWidth(), "Mapped", "") +
+              wrapped(textOf(*named, summary), outputWidth(), 0));
     } else {
         print(textOf(*named, summary) + "\n");
     }

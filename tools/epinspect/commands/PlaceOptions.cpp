@@ -12,20 +12,20 @@ CountFrom parseCountFrom(const std::string& text) { return meant(countFromIn(tex
 
 }  // namespace
 
-void addPlaceOptions(Command& command, PlaceOptions& options) {
-    command
-        .option("--extent-size", "SIZE",
-                "Bytes of an extent (default: as configured); K, M, G or KiB, MiB, GiB may "
-                "follow",
-                options.extentSize, parseExtentSize)
-        .option("--address-bits", "48|52",
-                "How many bits of an entry are its extent address; matters where bits 48 to "
-                "51 are set",
-                options.choice.addressBits, parseAddressBits)
-        .option("--count-from", "file|volume",
-                "From where extents are counted: within the data file, or from the "
-                "volume's start",
-                options.choice.countFrom, parseCountFrom);
+void addAddressBitsOption(Command& command, std::optional<AddressBits>& bits) {
+    command.option("--address-bits", "48|52",
+                   "How many bits of an entry are its extent address; matters where bits 48 to 51 are set", bits,
+                   parseAddressBits);
+}
+
+void addPlaceOptions(Command& command, std::optional<std::uint32_t>& extentSize, PlaceChoice& choice) {
+    command.option("--extent-size", "SIZE",
+                   "Bytes of an extent (default: as configured); K, M, G or KiB, MiB, GiB may follow", extentSize,
+                   parseExtentSize);
+    addAddressBitsOption(command, choice.addressBits);
+    command.option("--count-from", "file|volume",
+                   "From where extents are counted: within the data file, or from the volume's start", choice.countFrom,
+                   parseCountFrom);
 }
 
 }  // namespace epinspect

@@ -17,6 +17,10 @@ struct PlaceOptions {
     PlaceChoice choice;
 };
 
-void addPlaceOptions(Command& command, PlaceOptions& options);
+/// --address-bits 48|52.
+void addAddressBitsOption(Command& command, std::optional<AddressBits>& bits);
+
+/// Those of PLACE.
+void addPlaceOptions(Command& command, std::optional<std::uint32_t>& extentSize, PlaceChoice& choice);
 
 }  // namespace epinspect

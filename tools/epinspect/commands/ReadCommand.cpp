@@ -182,7 +182,7 @@ void addRead(Command& parent, Session& session) {
         .option("--output", "FILE", "Write a new file, with holes for what is not mapped or cannot be read",
                 options->output, [](const std::string& text) { return text; })
         .flag("--json", "With --output: one JSON object per range that cannot be read, then a summary", session.json);
-    addPlaceOptions(command, options->place);
+    addPlaceOptions(command, options->place.extentSize, options->place.choice);
     command.action([options, &session] { run(*options, session); });
 }
 

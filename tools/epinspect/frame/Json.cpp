@@ -47,6 +47,12 @@ Json& Json::number(std::string_view name, std::uint64_t value) {
     return *this;
 }
 
+Json& Json::null(std::string_view name) {
+    anyKey(name);
+    line_.add("null");
+    return *this;
+}
+
 Json& Json::hexadecimal(std::string_view name, std::uint64_t value) {
     anyKey(name);
     line_.add("\"").hexadecimal(value).add("\"");

@@ -43,6 +43,7 @@ public:
     /// The same under a name that is known at run time only.
     Json& number(std::string_view name, std::uint64_t value);
     Json& hexadecimal(std::string_view name, std::uint64_t value);
+    Json& null(std::string_view name);
 
     template <std::size_t keySize>
     Json& hexadecimal(const char (&name)[keySize], std::uint64_t value) {

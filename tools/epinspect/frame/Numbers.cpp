@@ -12,6 +12,8 @@ std::uint64_t parseSize(const std::string& text) { return meant(sizeIn(text, mos
 
 Range parseRange(const std::string& text) { return meant(rangeIn(text, most64Bits)); }
 
+Range parsePositions(const std::string& text) { return meant(sizeRangeIn(text, most64Bits / 2)); }
+
 Range parseRange32(const std::string& text) { return meant(rangeIn(text, most32Bits)); }
 
 }  // namespace epinspect

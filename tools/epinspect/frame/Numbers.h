@@ -29,7 +29,10 @@ std::uint64_t parseSize(const std::string& text);
 /// "NUMBER" or "FIRST-LAST", of 64 bits.
 Range parseRange(const std::string& text);
 
-/// The same of 32 bits.
+/// The same of positions in a file, below 2^63; K, M, G, T may follow.
+Range parsePositions(const std::string& text);
+
+/// "NUMBER" or "FIRST-LAST", of 32 bits.
 Range parseRange32(const std::string& text);
 
 }  // namespace epinspect

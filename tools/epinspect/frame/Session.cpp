@@ -35,7 +35,7 @@ void Session::remarkOnCollection() {
     remark(root.hostPath(""), text);
 }
 
-void Session::failed(const Failure& failure) {
+void Session::report(const Failure& failure) {
     if (json) {
         const Subject& subject = failure.subject;
         Json object(subject.file.empty() ? subject.map : subject.file, lidsOf(subject));

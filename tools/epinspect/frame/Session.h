@@ -25,10 +25,7 @@ public:
     /// Says on standard error when what is looked at is a collection, and of when.
     void remarkOnCollection();
 
-    /// Prints the message, as an object too with --json. The exit status is 1 from then on. Throws OutputFailure.
-    void failed(const Failure& failure) override;
-
-    /// The same without the object, for which the caller has one that says more.
+    /// Reports a failure as a message alone, for which the caller has an object that says more.
     void complainOf(const Failure& failure);
 
     void remark(const std::string& subject, const std::string& text) override;
@@ -42,6 +39,10 @@ public:
 
     /// The exit status that the run so far amounts to.
     int status() const;
+
+protected:
+    /// Prints the message, as an object too with --json. The exit status is 1 from then on. Throws OutputFailure.
+    void report(const Failure& failure) override;
 
 private:
     bool failed_ = false;

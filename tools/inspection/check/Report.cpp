@@ -26,7 +26,7 @@ void Report::beginFile(const std::string& path, std::optional<std::uint32_t> lid
 void Report::add(Finding finding) {
     constexpr std::size_t mostWaiting = 16384;  // a hostile store may have any number of them
     if (waiting_.size() >= mostWaiting) handOut();
-    if (finding.entries && !each_) {
+    if (finding.entries && (!each_ || finding.alike)) {
         const std::string other = finding.partner ? finding.partner->file : "";
         const auto [group, added] =
             groups_.try_emplace({finding.file, finding.rule, other, finding.dataFile}, waiting_.size());
@@ -61,12 +61,13 @@ void Report::askForChanges() const {
     }
 }
 
+std::optional<std::uint32_t> Report::lidOf(const std::string& path) const {
+    const auto file = known_.find(path);
+    return file != known_.end() ? file->second.lid : std::nullopt;
+}
+
 /// Adds what follows from the files that the finding is about.
 void Report::complete(Finding& finding) const {
-    const auto lidOf = [this](const std::string& path) {
-        const auto file = known_.find(path);
-        return file != known_.end() ? file->second.lid : std::nullopt;
-    };
     finding.passing = context_.hasChanged(finding.file);
     if (!finding.lid) finding.lid = lidOf(finding.file);
     if (!finding.partner) return;
@@ -80,6 +81,12 @@ std::pair<std::size_t, std::size_t> Report::rankOf(const Finding& finding) const
         return file != known_.end() ? file->second.rank : std::numeric_limits<std::size_t>::max();
     };
     return {rank(finding.file), finding.partner ? rank(finding.partner->file) : 0};
+}
+
+void Report::addSnapshot(Snapshot snapshot) {
+    snapshot.lid = lidOf(snapshot.file);
+    snapshot.parentLid = lidOf(snapshot.parent);
+    snapshots_.push_back(std::move(snapshot));
 }
 
 void Report::notCompared(const std::string& what, const std::string& file) {

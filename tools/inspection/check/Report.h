@@ -17,6 +17,16 @@
 
 namespace inspection {
 
+/// A map that shares extents with the map which it names as its parent, each at the same entry with the same content:
+/// as a snapshot does, and no finding.
+struct Snapshot {
+    std::string file;
+    std::string parent;
+    std::uint64_t entries;
+    std::optional<std::uint32_t> lid = {};
+    std::optional<std::uint32_t> parentLid = {};
+};
+
 /// Joins the findings about entries that break one rule against one partner, unless `each` run is to be seen, and hands
 /// all of them to `take` in the order of their files.
 class Report {
@@ -35,6 +45,9 @@ public:
 
     /// Remembers that `what` could not be compared; where that concerns one file: which one.
     void notCompared(const std::string& what, const std::string& file = {});
+
+    void addSnapshot(Snapshot snapshot);
+    const std::vector<Snapshot>& snapshots() const { return snapshots_; }
 
     /// Counts a file that has been read, and the entries of a map.
     void countFile() { ++files_; }
@@ -65,6 +78,7 @@ private:
     using Group = std::tuple<std::string, Rule, std::string, std::uint64_t>;
 
     void askForChanges() const;
+    std::optional<std::uint32_t> lidOf(const std::string& path) const;
     void complete(Finding& finding) const;
     std::pair<std::size_t, std::size_t> rankOf(const Finding& finding) const;
 
@@ -78,6 +92,7 @@ private:
     std::uint64_t entries_ = 0;
     std::map<Rule, std::uint64_t> findings_;
     std::map<std::string, Files> notCompared_;
+    std::vector<Snapshot> snapshots_;
 };
 
 }  // namespace inspection

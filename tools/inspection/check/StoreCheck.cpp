@@ -10,9 +10,9 @@
 #include <system_error>
 
 #include "check/DataRules.h"
-#include "map/MapWalk.h"
 #include "store/ChangeWatch.h"
 #include "store/FileSize.h"
+#include "store/OpenMap.h"
 
 namespace inspection {
 
@@ -132,20 +132,14 @@ void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) 
     const std::string folder = file.targetPath.substr(0, file.targetPath.rfind('/'));
     if (file.volume == 0) foldersWithoutVolume_.insert(folder);
     const bool isOwner = file.sameAs.empty();  // under another name it has been counted
-    if (isOwner) sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file.path);
+    if (isOwner) sharedExtents_.beginMap(file.volume != 0 ? std::to_string(file.volume) : folder, file, content);
     MapRules rules(file, content, report_);
     useDataFiles(file, rules);
     const auto each = [&](const MapRun& run) {
         rules.add(run);
         if (isOwner) sharedExtents_.add(run);
     };
-    std::optional<Failure> failure;
-    if (entries > 0) {
-        const auto progress = [&](std::uint64_t done) { context_.progress("entries", done, entries); };
-        failure = walkRuns(file.path, content, {0, entries - 1}, progress, each);
-    }
-    if (failure) context_.failed(*failure);
-    rules.finish(!failure);
+    rules.finish(walkAllRuns(context_, file.path, content, entries, each));
     reportUnreadable(rules);
 }
 
@@ -223,9 +217,7 @@ void StoreCheck::checkSharedExtents() {
     if (foldersWithoutVolume_.size() > 1) {
         report_.notCompared("shared-extents: maps in different folders whose paths name no volume");
     }
-    if (sharedExtents_.haveAll()) return sharedExtents_.check(report_);
-    report_.notCompared("shared-extents: the runs of all maps do not fit into memory");
-    context_.fail({"", "shared-extents"}, "out of memory for the runs of all maps", tool::EP_ERR_READ_FAILED);
+    sharedExtents_.check();
 }
 
 }  // namespace inspection

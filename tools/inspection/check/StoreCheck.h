@@ -31,7 +31,11 @@ struct CheckOptions {
 class StoreCheck {
 public:
     StoreCheck(Context& context, const CheckOptions& options, Report& report)
-        : context_(context), options_(options), files_(context, options.files, options.lids), report_(report) {}
+        : context_(context),
+          options_(options),
+          files_(context, options.files, options.lids),
+          report_(report),
+          sharedExtents_(context, report) {}
 
     /// Once. What cannot be read is reported to the context.
     void run();

@@ -42,7 +42,13 @@ public:
     std::optional<std::uint64_t> sizeOf(const std::string& hostPath) const;
 
     /// Something failed; what was asked for beside it goes on.
-    virtual void failed(const Failure& failure) = 0;
+    void failed(const Failure& failure) {
+        ++failures_;
+        report(failure);
+    }
+
+    /// How often that was so: a work that leaves the number as it was has seen all that it looked for.
+    std::uint64_t failures() const { return failures_; }
 
     /// There is something to know about `subject` that is no failure.
     virtual void remark(const std::string& subject, const std::string& text) = 0;
@@ -84,7 +90,12 @@ public:
     /// environment names one.
     void prepareLuns();
 
+protected:
+    /// Lets the user know of a failure.
+    virtual void report(const Failure& failure) = 0;
+
 private:
+    std::uint64_t failures_ = 0;
     std::optional<std::string> lunList_;  ///< where the list below the root folder lies
     std::vector<std::string> changedFiles_;
 };

@@ -92,6 +92,7 @@ DataFile DataFiles::open(std::uint64_t number) {
     const auto size = context_.sizeOf(located.hostPath);
     if (!size) return failed(tool::EP_ERR_OPEN_FAILED, errno);
     if (remarks_) remarkOnDataStart(context_, *data.file, data.path);
+    data.size = *size;
     data.dataSize = payloadOf(*data.file, *size);
     data.held = std::min(data.dataSize, payloadOf(*data.file, sizeOf(located.hostPath).value_or(0)));
     return data;

@@ -20,6 +20,7 @@ namespace inspection {
 struct DataFile {
     std::string path;  ///< on the target; empty when the map file's path names no volume
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFileDAT> file;  ///< its HEAD[0] is decoded, its type that of a data file
+    std::uint64_t size = 0;                             ///< bytes of the file
     std::uint64_t dataSize = 0;                         ///< bytes from the data start offset to the end
     std::uint64_t held = 0;                             ///< how many of these lie here: of a collection fewer
     bool missing = false;                               ///< nothing lies there

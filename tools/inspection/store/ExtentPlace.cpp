@@ -7,12 +7,6 @@ namespace {
 constexpr std::uint64_t limit = std::uint64_t{1} << 63U;  ///< of positions, in files as on volumes
 constexpr std::uint64_t dataFileSize = ISCSI::TOOL::EP_DAT_FILE_SPAN;
 
-/// The address of the first extent that starts in the data file `number` or after it.
-std::uint64_t firstExtentOf(std::uint64_t number, std::uint32_t extentSize) {
-    const std::uint64_t start = number * dataFileSize;
-    return start / extentSize + (start % extentSize > 0 ? 1 : 0);
-}
-
 std::string named(const ExtentAddress& address) {
     return "extent " + std::to_string(address.extent) + " of pool " + std::to_string(address.pool);
 }
@@ -55,6 +49,11 @@ std::optional<ExtentPlace> placeOf(std::uint64_t extentAddress, std::uint32_t ex
     const std::uint64_t number = extentAddress * extentSize / dataFileSize;
     return ExtentPlace{number, extentAddress - firstExtentOf(number, extentSize), extentAddress,
                        firstExtentOf(number + 1, extentSize)};
+}
+
+std::uint64_t firstExtentOf(std::uint64_t number, std::uint32_t extentSize) {
+    const std::uint64_t start = number * dataFileSize;
+    return start / extentSize + (start % extentSize > 0 ? 1 : 0);
 }
 
 std::optional<std::uint64_t> positionOf(std::uint64_t dataStart, std::uint64_t extent, std::uint32_t extentSize,

@@ -44,6 +44,9 @@ struct ExtentPlace {
 /// past byte 2^63 of the volume.
 std::optional<ExtentPlace> placeOf(std::uint64_t extentAddress, std::uint32_t extentSize);
 
+/// The address of the first extent that starts in the part of the volume of the data file `number`, or after it.
+std::uint64_t firstExtentOf(std::uint64_t number, std::uint32_t extentSize);
+
 /// The position in a data file of byte `offset` of its extent number `extent`; nothing when that is 2^63 or more.
 std::optional<std::uint64_t> positionOf(std::uint64_t dataStart, std::uint64_t extent, std::uint32_t extentSize,
                                         std::uint32_t offset);

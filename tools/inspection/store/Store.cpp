@@ -31,6 +31,12 @@ bool precedes(const std::string& one, const std::string& other) {
     return std::pair(rank(one), std::string_view(one)) < std::pair(rank(other), std::string_view(other));
 }
 
+std::vector<Lun> findLuns(Context& context, const Lids& lids) {
+    std::vector<Lun> luns;
+    forEachLun(context, lids, [&luns](const Lun& lun) { luns.push_back(lun); });
+    return luns;
+}
+
 /// Whether what lies at `path` counts as a map file by its folder alone.
 bool mayHaveAnyName(const std::string& path) {
     const FileKind* kind = kindByName(path);
@@ -51,8 +57,9 @@ void failEmptyStore(Context& context) {
     context.fail({top.empty() ? "/" : top, ""}, "no EP files found", tool::EP_ERR_NO_PATH);
 }
 
-Store::Store(Context& context, const Lids& lids) : context_(context) {
-    forEachLun(context, lids, [this](const Lun& lun) { luns_.push_back(lun); });
+Store::Store(Context& context, const Lids& lids) : Store(context, findLuns(context, lids)) {}
+
+Store::Store(Context& context, std::vector<Lun> luns) : context_(context), luns_(std::move(luns)) {
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
     const std::string journalFolder = fs::path(journal).parent_path().string();

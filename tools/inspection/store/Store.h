@@ -53,6 +53,9 @@ public:
     /// Loads the LUNs whose ids are in `lids`, as forEachLun() does.
     Store(Context& context, const Lids& lids);
 
+    /// With these LUNs, lowest id first.
+    Store(Context& context, std::vector<Lun> luns);
+
     /// The LUNs found, lowest id first; none at all where there is no configuration.
     const std::vector<Lun>& luns() const { return luns_; }
 
