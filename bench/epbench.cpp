@@ -1,4 +1,4 @@
-// What the library costs, each figure beside the floor it is held against. Run with --benchmark_filter to choose.
+// What the library costs, each figure beside the floor it is compared with. Run with --benchmark_filter to choose.
 #include <ISCSIEPFileDAT.h>
 #include <ISCSIEPFileFRI.h>
 #include <ISCSIEPFileJNL.h>

@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
-# How fast a LUN of 2 GiB, all mapped and in the page cache, gets out: through the plugin against nbdkit's own file
-# plugin on the same bytes in one file, and by `read`, `read --output` and `dd` to files. The best of several runs in
-# turn. bench/nbd.sh [BUILD_DIR [OTHER_EPINSPECT]]; the latter is measured too, an older version say. Takes 4 GiB of disk, and 2 GiB of memory for the image.
+# How fast a LUN of 2 GiB, all mapped and in the page cache, is read: through the plugin against nbdkit's own file plugin
+# on the same bytes in one file, and by `read`, `read --output` and `dd` to files. The best of several runs in turn.
+# bench/nbd.sh [BUILD_DIR [OTHER_EPINSPECT]]: another program, an older version for instance, is measured too. Takes 4 GiB
+# of disk, and 2 GiB of memory for the image.
 set -euo pipefail
 build=$(realpath "${1:-build/release}") other=${2:+$(realpath "$2")}
 scratch=$(mktemp -d "${TMPDIR:-/var/tmp}/epnbdXXXXXX")

@@ -14,5 +14,5 @@ target_compile_definitions(iscsieptool_flags INTERFACE _FILE_OFFSET_BITS=64)
 set(CMAKE_CXX_STANDARD 17)
 set(CMAKE_CXX_EXTENSIONS OFF)
 set(CMAKE_POSITION_INDEPENDENT_CODE ON)
-# The same bytes whatever folder it is built in: the libraries are found from where the program lies.
+# The same bytes in whatever folder they are built: programs look for the libraries relative to themselves.
 set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)

@@ -1,7 +1,8 @@
 # What goes where, in four components: runtime, development, tools, standin. The folders are those of GNUInstallDirs.
 include(CMakePackageConfigHelpers)
 
-# Libraries and programs find each other wherever the whole is moved; in the system's own folders they need no help.
+# Programs look for the libraries relative to themselves, so that an installation may be moved; in the system's own
+# folders that is not needed.
 set(system_libdirs /lib /usr/lib /usr/lib/${CMAKE_LIBRARY_ARCHITECTURE})
 if(NOT CMAKE_INSTALL_FULL_LIBDIR IN_LIST system_libdirs)
   set_target_properties(iscsieptool PROPERTIES INSTALL_RPATH "$ORIGIN")
@@ -17,8 +18,8 @@ install(TARGETS iscsieptool EXPORT iscsieptool
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
 install(DIRECTORY include/ DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/iscsieptool COMPONENT development)
 
-# The platform's library is wanted when a consumer runs, and is seldom on the machine where it is linked: its symbols
-# may stay unresolved there. The package config and the .pc take the option from here.
+# A consumer needs the platform's library when it runs. The machine where it is linked seldom has that library, so its
+# symbols may stay unresolved there. The package config and the .pc take the option from here.
 set(consumer_link_option --allow-shlib-undefined)
 target_link_options(iscsieptool INTERFACE $<INSTALL_INTERFACE:LINKER:${consumer_link_option}>)
 

@@ -1,4 +1,4 @@
-// Takes the input as what a collection says of its files.
+// Takes the input as the list of a collection's files, collection.json.
 #include <filesystem>
 #include <fstream>
 #include <variant>
@@ -35,7 +35,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
         return 0;
     }
     require(collection->sizeOf(folder.dataFile()).value_or(100) >= 100);
-    // Written and read again, it says the same.
+    // Written and read again, it is the same.
     require(collection->write(folder.path) == 0);
     const auto again = Collection::read(folder.path, folder.path + "/" + Collection::listName);
     const auto& same = std::get<Collection>(again);

@@ -62,7 +62,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
     std::vector<std::string> contents = store.contents;
     while (input.remaining_bytes() > 0) {
         std::string& content = contents[input.ConsumeIntegralInRange<std::size_t>(0, contents.size() - 1)];
-        // Where fields and entries are, rather than anywhere.
+        // Only where fields and entries are.
         static constexpr std::size_t starts[] = {0, 64, 4096, 4160, 4224, 8192, 24576, 24576};
         std::size_t at =
             starts[input.ConsumeIntegralInRange<std::size_t>(0, 7)] + input.ConsumeIntegral<std::uint8_t>();

@@ -58,7 +58,7 @@ public:
     std::string str() { return std::move(text_); }
 
 private:
-    /// The label with as many tabs as bring what follows to column 24; one where the label reaches that far itself.
+    /// The label, and as many tabs as it takes to column 24, at least one.
     std::string& label(std::string_view name) {
         const auto columns = name.size() + 1;
         return text_.append(name).append(1, ':').append(columns < 24 ? (24 - columns + 7) / 8 : 1, '\t');

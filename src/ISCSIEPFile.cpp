@@ -149,7 +149,7 @@ int ISCSIEPFile::getMAPFilePath(unsigned int lid, std::string& filePath) const {
         EP_LOG_ERR(180, "Failed to get LUN conf info. path: %s", path.c_str());
         return error;
     }
-    filePath = lun.rootPath + EP_MAP_FOLDER + lun.getTypeName() + lun.uuid + lun.name + "_00000";
+    filePath = lun.rootPath + EP_MAP_FOLDER + lun.getTypeName() + lun.uuid + lun.name + EP_MAP_NAME_END;
     return 0;
 }
 

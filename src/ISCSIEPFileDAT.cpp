@@ -55,8 +55,8 @@ void putDigits(const unsigned char* bytes, std::size_t count, char* digits) {
 /// when the read fails. Throws when memory cannot hold the digits.
 bool readDigits(EPFileStream& stream, std::size_t size, std::string& text) {
 #ifdef __cpp_lib_string_resize_and_overwrite
-    // Why this source is compiled as C++23 where the compiler is g++: the string's room is not filled before the digits
-    // are written, and one read brings all bytes, into its second half. The other way takes half as long again.
+    // This is why g++ compiles this source as C++23: the string's memory is not filled before the digits are written,
+    // and one read brings all bytes, into its second half. The other way takes half as long again.
     text.resize_and_overwrite(2 * size, [&stream, size](char* digits, std::size_t /*room*/) -> std::size_t {
         auto* bytes = reinterpret_cast<unsigned char*>(digits + size);
         if (!stream.read(bytes, size)) return 0;

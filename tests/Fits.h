@@ -9,7 +9,7 @@
 #include <string_view>
 #include <vector>
 
-/// `expected` with what stands in `text` in place of each "…"; from where that does not fit on, it is as it was.
+/// `expected`, each "…" in it replaced by what `text` has there. From the place on where the two differ nothing is.
 inline std::string filled(std::string_view expected, std::string_view text) {
     constexpr std::string_view gap = "…";
     constexpr auto none = std::string_view::npos;
@@ -24,11 +24,13 @@ inline std::string filled(std::string_view expected, std::string_view text) {
             done = at + piece.size();
             continue;
         }
-        at = done;  // or where at least its first lines stand
-        for (auto line = piece.find('\n'); line != none; line = piece.find('\n', line + 1)) {
+        at = done;  // or where at least its first lines stand: one, two, four, so that a long text takes no longer
+        std::size_t step = 1;
+        for (auto line = piece.find('\n'); line != none; step *= 2) {
             const auto found = text.find(piece.substr(0, line + 1), at);
             if (found == none) break;
             at = found;
+            for (auto more = step; more > 0 && line != none; --more) line = piece.find('\n', line + 1);
         }
         return std::string(text.substr(0, at)).append(at == done ? gap : "").append(expected);
     }
@@ -54,7 +56,7 @@ inline std::string partOf(std::string_view line, std::size_t from) {
     return text + (line.size() > from + 300 ? "[...]\n" : "\n");
 }
 
-/// Whether `text` is `expected`, in which "…" stands for anything; if not, tells the lines that differ.
+/// Whether `text` is `expected`, in which "…" stands for anything; if not, shows the lines that differ.
 inline testing::AssertionResult fits(std::string_view text, std::string_view expected) {
     const std::string whole = filled(expected, text);
     if (whole == text) return testing::AssertionSuccess();

@@ -35,7 +35,7 @@ protected:
     }
 };
 
-/// What a collection.json is damaged by, and what is said of it.
+/// A damage to collection.json, and the message about it.
 Case damaged(const std::string& how, const std::string& edit, const std::string& said) {
     return {"refuses a collection " + how,
             "epinspect --root own collect c >/dev/null; cd c; " + edit + "; epinspect --root . list --json", 1,
@@ -85,9 +85,9 @@ const Case cases[] = {
      "epinspect: c: a collection of …; it is incomplete\n…epinspect: " + table2 + ": cannot be opened: neither …)\n" +
      incomplete + "epinspect: c: a collection of …; it is incomplete\n…"},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
-    damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not what a collection has there"),
-    damaged("that took more than there was", "sed -i s/6442475520/24575/ collection.json", "not what a collection …"),
-    damaged("with a path from nowhere", "sed -i 's,\"/var,\"var,' collection.json", "not what a collection has there"),
+    damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not a collection's list"),
+    damaged("that took more than there was", "sed -i s/6442475520/24575/ collection.json", "not a collection's list"),
+    damaged("with a path from nowhere", "sed -i 's,\"/var,\"var,' collection.json", "not a collection's list"),
     damaged("whose list does not fit a file", "truncate -s 9 var/db/iscsi/EP_JNL",
             "24576 bytes of /var/db/iscsi/EP_JNL were taken, but the file has 9"),
 
@@ -123,7 +123,8 @@ const Case cases[] = {
     {"diff knows the LUNs of both stores", "large cp -a own b; sed -i 's/\"lid\": 2/\"lid\": 31/' "
      "b/var/db/iscsi/luns.json; printf '\\377' | dd of=b" + map2 + " bs=1 seek=44 conv=notrunc status=none; "
      "epinspect diff own b --json | head -n 1", 0,
-     R"({"kind":"field","file":")" + map2 + R"(","lid":2,"otherFile":")" + map2 + R"(","otherLid":31,"field":…)" "\n", ""},
+     R"({"kind":"field","file":")" + map2 + R"(","lid":2,"otherFile":")" + map2 + R"(","otherLid":31,"field":…)" "\n",
+     ""},
 };
 // clang-format on
 

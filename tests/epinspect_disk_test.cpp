@@ -120,7 +120,7 @@ TEST_F(Disk, AnImageThatCannotBeFinishedKeepsWhatIsRight) {
     EXPECT_TRUE(content("i").size() > begun.size() && image_.find(content("i")) == 262144) << content("i").size();
 }
 
-/// Keeps what it is told.
+/// Keeps failures and remarks.
 struct Listener : inspection::Context {
     void report(const inspection::Failure& failure) override { ADD_FAILURE() << messageOf(failure); }
     void remark(const std::string& subject, const std::string& /*text*/) override { remarks += subject + "\n"; }
@@ -180,7 +180,7 @@ TEST_F(Disk, AnyRangeIsReadAsTheStoreIsNow) {
     const auto size = fs::file_size(file);
     fs::resize_file(file, size / 2);
     EXPECT_LT(100000U, check(": past the end, the file holds "));
-    fs::resize_file(file, size);  // what was cut off reads as zeros now, which no failure tells
+    fs::resize_file(file, size);  // what was cut off reads as zeros now, without a failure
     fs::remove_all(path("disk"));
     EXPECT_LT(10000000U, check(cannotOpen));
     EXPECT_EQ(data + "1\n", context.remarks);

@@ -1,4 +1,4 @@
-// epinspect dump: header blocks as text and as JSON, how the kind of a file is told, and what is doubtful about it.
+// epinspect dump: header blocks as text and as JSON, how the kind of a file is found, and what is doubtful about it.
 #include "Dumps.h"
 #include "ProgramTest.h"
 

@@ -41,7 +41,8 @@ const Case cases[] = {
      "20' '17592186044416 --extent-size 1M' '2251799813685245 --extent-size 8K'; do epinspect extent data $n; done", 1,
      "", says({"data: extent 2" + holds("0-1"), "data: extent 1" + holds("0"), "data: extent 0" + holds("none"),
            "data: extent 17592186044416" + holds("none"), "data: extent 2251799813685245" + holds("none")})},
-    {"says what is doubtful or wrong about extents", "for f in gone EP_TBL late early; do epinspect extent $f 0 --extent-size 8; done", 0, "0000000000000000\n",
+    {"says what is doubtful or wrong about extents", "for f in gone EP_TBL late early; do epinspect extent $f 0 "
+     "--extent-size 8; done", 0, "0000000000000000\n",
      says({"gone: extent 0" + missing,
            "EP_TBL: extent 0" + wrongType, "late: data start offset 0x6001 lies past the end of the file",
            "late: extent 0" + holds("none"), "early: data start offset 0x5ff8 lies inside the header block"})},

@@ -7,7 +7,7 @@ class Losses : public ProgramTest {
 protected:
     Losses() {
         expect({"", "chmod 755 .; epsample own", 0, "", ""});
-        // Only a user that is not root can lack the right to read.
+        // Root may read everything.
         if (geteuid() == 0) asUser_ = "setpriv --reuid=65534 --regid=65534 --clear-groups ";
         canBeUser_ = std::system(script(asUser_ + "epinspect --version >.out 2>&1").c_str()) == 0;
     }

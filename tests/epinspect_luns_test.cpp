@@ -52,32 +52,52 @@ const std::string noList = "The LUN list is missing or cannot be read: ", notKno
 
 // clang-format off
 const Case cases[] = {
-    {"takes an id wherever it takes a map", "for c in 'map M --json' 'map M --chart' 'entry M 0-9 --json' 'find M --pool 0' "
-     "'find M --extent 4 --json' 'locate M 5M' 'locate M 5M --json' 'diff 2 M --json' 'read M --length 99K' 'check M --json'; do "
-     "for m in 1 " + map1 + "; do epinspect --root store $(echo \"$c\" | sed s,M,$m,) >$(basename $m) || echo \"$c: $?\"; done; "
+    {"takes an id wherever it takes a map", "for c in 'map M --json' 'map M --chart' 'entry M 0-9 --json' "
+     "'find M --pool 0' 'find M --extent 4 --json' 'locate M 5M' 'locate M 5M --json' 'diff 2 M --json' "
+     "'read M --length 99K' 'check M --json'; do for m in 1 " + map1 + "; do "
+     "epinspect --root store $(echo \"$c\" | sed s,M,$m,) >$(basename $m) || echo \"$c: $?\"; done; "
      "cmp 1 $(basename " + map1 + ") && test -s 1 || echo \"$c differs\"; done; "
-     "epinspect --root store map 1 | tail -n 1; epinspect --root store entry 2 1 --json", 0, "diff 2 M --json: 3\ndiff 2 M --json: 3\n"
-     "LUN 1: 4096 entries in …\n{\"kind\":\"entry\",\"file\":\"/volume2/@iSCSI/LUN/THIN…_00000\",\"lid\":2,\"index\":1,…\n", ""},
-    {"takes a file of digits after a dot", "cp store" + map1 + " 7; epinspect map ./7 | tail -n 1; epinspect map 7", 1, "4096 entries in …\n",
+     "epinspect --root store map 1 | tail -n 1; epinspect --root store entry 2 1 --json", 0,
+     "diff 2 M --json: 3\ndiff 2 M --json: 3\n"
+     "LUN 1: 4096 entries in …\n{\"kind\":\"entry\",\"file\":\"/volume2/@iSCSI/LUN/THIN…_00000\",\"lid\":2,\"index\":1,"
+     "…\n", ""},
+    {"takes a file of digits after a dot", "cp store" + map1 + " 7; epinspect map ./7 | tail -n 1; epinspect map 7", 1,
+     "4096 entries in …\n",
      says({"LUN 7: configuration cannot be loaded: " + noList + "No such file or directory (code 9002)"})},
-    {"keeps all LUNs that have a map", twoLuns + "epinspect --root s find --extent 0 --luns 1-300 --json | head -n 2; epinspect --root s find --extent 0 --luns 1-300 | head -n 1;"
-     "epinspect --root s list --luns 300 | grep LUN; epinspect --root s locate " + map1 + " 0 | head -n 1; epinspect --root s diff 300 1 --json | tail -n 1", 0,
-     "{\"kind\":\"error\",\"file\":null,\"lid\":9,\"error\":null,\"code\":9004,…\n{\"kind\":\"match\",\"file\":\"" + map1 + "\",\"lid\":1,\"lids\":[1,300],\"first\":0,…\n" +
-     map1 + ": LUNs 1, 300: 0: mapped…\nmap         57344  LUN 300 …\nLUN 1 byte 0: …\n{\"kind\":\"summary\",\"file\":\"" + map1 + "\",\"lid\":300,\"otherFile\":\"" + map1 +
+    {"keeps all LUNs that have a map", twoLuns + "epinspect --root s find --extent 0 --luns 1-300 --json | head -n 2;"
+     " epinspect --root s find --extent 0 --luns 1-300 | head -n 1;"
+     "epinspect --root s list --luns 300 | grep LUN; epinspect --root s locate " + map1 +
+     " 0 | head -n 1; epinspect --root s diff 300 1 --json | tail -n 1", 0,
+     "{\"kind\":\"error\",\"file\":null,\"lid\":9,\"error\":null,\"code\":9004,…\n{\"kind\":\"match\",\"file\":\"" +
+     map1 + "\",\"lid\":1,\"lids\":[1,300],\"first\":0,…\n" +
+     map1 + ": LUNs 1, 300: 0: mapped…\nmap         57344  LUN 300 …\nLUN 1 byte 0: …\n"
+     "{\"kind\":\"summary\",\"file\":\"" + map1 + "\",\"lid\":300,\"otherFile\":\"" + map1 +
      "\",\"otherLid\":1,…\n", says({lun9, lun9})},
-    {"reports a damaged LUN", twoLuns + "for c in 'lun 8-10' list check 'find --extent 7' 'check 1'; do epinspect -v --root s $c | tail -n 1; done", 0, "…1 match of 1 entry\n…",
-     "epinspect: iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig …lid: 9 ,…\nepinspect: " + lun9 + "\nepinspect: iSCSI:…" + lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n"},
-    {"reports a damaged LUN once", twoLuns + "epinspect --root s find 9 --extent 7", 1, "0 entries in 0 maps: 0 matches of 0 entries\n", says({lun9})},
-    {"names the map in errors about a LUN", "epinspect --root store locate 1 4G --json 2>&1 | head -n 1; epsample s; rm s" + map1 + "; epinspect --root s locate 1 0 --json 2>&1 | head -n 1", 0,
-     "{\"kind\":\"error\",\"file\":\"" + map1 + "\",\"lid\":1,\"error\":\"EP_ERR_READ_FAILED\",…\n{\"kind\":\"error\",\"file\":\"" + map1 + "\",\"error\":\"EP_ERR_OPEN_FAILED\",…\n", ""},
-    {"needs no LUN list", "epsample s; rm s/var/db/iscsi/luns.json; for c in list check 'find --extent 0'; do epinspect --root s $c >out || echo $?; done; epinspect --root s find " + map1 + " --extent 0; "
+    {"reports a damaged LUN", twoLuns + "for c in 'lun 8-10' list check 'find --extent 7' 'check 1';"
+     " do epinspect -v --root s $c | tail -n 1; done", 0, "…1 match of 1 entry\n…",
+     "epinspect: iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig …lid: 9 ,…\nepinspect: " + lun9 + "\nepinspect: iSCSI:…" +
+     lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n"},
+    {"reports a damaged LUN once", twoLuns + "epinspect --root s find 9 --extent 7", 1,
+     "0 entries in 0 maps: 0 matches of 0 entries\n", says({lun9})},
+    {"names the map in errors about a LUN", "epinspect --root store locate 1 4G --json 2>&1 | head -n 1; epsample s;"
+     " rm s" + map1 + "; epinspect --root s locate 1 0 --json 2>&1 | head -n 1", 0,
+     "{\"kind\":\"error\",\"file\":\"" + map1 + "\",\"lid\":1,\"error\":\"EP_ERR_READ_FAILED\",…\n"
+     "{\"kind\":\"error\",\"file\":\"" + map1 + "\",\"error\":\"EP_ERR_OPEN_FAILED\",…\n", ""},
+    {"needs no LUN list", "epsample s; rm s/var/db/iscsi/luns.json; for c in list check 'find --extent 0';"
+     " do epinspect --root s $c >out || echo $?; done; epinspect --root s find " + map1 + " --extent 0; "
      "epinspect --root s locate " + map1 + " 0", 1, map1 + ": 0: mapped …\n4096 entries in 1 map: 1 match of 1 entry\n",
-     says({notKnown + noList + "No such file or directory (code 9002)", notKnown + noList + "No such file or directory (code 9002)", notKnown + noList + "No such file or directory (code 9002)",
-     map1 + ": extent size not known, give --extent-size: no LUN with an id from 0 to 255 has this map file (EP_ERR_BAD_EXTENT_SIZE, 18990507)"})},
-    {"fails on a LUN list of no use", "epsample s; L=s/var/db/iscsi/luns.json; echo [ >$L; for c in list check 'find --extent 0' 'find " + map1 + " --extent 0' 'locate " + map1 + " 0' 'map " + map1 + "'; do "
-     "epinspect --root s $c 2>err >out; echo $? $(sed 's/.*: none//' err); done; rm $L; mkdir $L; epinspect --root s check >out; echo $?; rmdir $L; echo '[]' >$L; epinspect --root s list >out; echo $?; "
-     "epinspect --root s list --luns 3-4 >out", 1, "1" + none9003 + "1" + none9003 + "1" + none9003 + "1" + none9003 + "1 is known:…not known, give --extent-size…\n0\n1\n0\n",
-     says({notKnown + noList + "Invalid argument (code 9002)", notKnown + "No such LUN (code 9001)", "LUN 3-4: none is known: No such LUN (code 9001)"})},
+     says({notKnown + noList + "No such file or directory (code 9002)", notKnown + noList +
+     "No such file or directory (code 9002)", notKnown + noList + "No such file or directory (code 9002)",
+     map1 + ": extent size not known, give --extent-size: no LUN with an id from 0 to 255 has this map file "
+     "(EP_ERR_BAD_EXTENT_SIZE, 18990507)"})},
+    {"fails on a LUN list of no use", "epsample s; L=s/var/db/iscsi/luns.json; echo [ >$L;"
+     " for c in list check 'find --extent 0' 'find " + map1 + " --extent 0' 'locate " + map1 + " 0' 'map " + map1 +
+     "'; do epinspect --root s $c 2>err >out; echo $? $(sed 's/.*: none//' err); done; rm $L; mkdir $L;"
+     " epinspect --root s check >out; echo $?; rmdir $L; echo '[]' >$L; epinspect --root s list >out; echo $?; "
+     "epinspect --root s list --luns 3-4 >out", 1, "1" + none9003 + "1" + none9003 + "1" + none9003 + "1" + none9003 +
+     "1 is known:…not known, give --extent-size…\n0\n1\n0\n",
+     says({notKnown + noList + "Invalid argument (code 9002)", notKnown + "No such LUN (code 9001)",
+     "LUN 3-4: none is known: No such LUN (code 9001)"})},
 };
 // clang-format on
 

@@ -23,11 +23,11 @@ using namespace epinspect;
 namespace {
 
 std::string forwarded;                  ///< what went to the system log
-std::uint64_t memoryLeft = UINT64_MAX;  ///< how often operator new does not fail yet
+std::uint64_t memoryLeft = UINT64_MAX;  ///< how many calls of operator new still succeed
 
 }  // namespace
 
-/// What the program's syslog() calls, and what a hardened build makes of that.
+/// What the program's syslog() calls, and what it calls in a hardened build.
 void keepForwarded(int priority, const char* format, va_list arguments) __asm__("vsyslog");
 [[gnu::visibility("default"), gnu::format(printf, 2, 0)]] void keepForwarded(int priority, const char* format,
                                                                              va_list arguments) {
@@ -98,7 +98,7 @@ TEST(Program, SaysThatMemoryRanOut) {
     EXPECT_EQ("epinspect: out of memory\n=1", Terminal(80, work).shown());
 }
 
-/// What a run ends with in which memory lasts for so many pieces, and none for the next one.
+/// The exit status of a run in which memory lasts for so many pieces, and not for the next one.
 int statusOfList(const char* root, std::uint64_t pieces) {
     const pid_t child = fork();
     if (child == 0) {

@@ -19,8 +19,8 @@ protected:
 const std::string tables =
                       "t() { epinspect --root r dump --json \"$@\" | grep -oE 'tSize.:[0-9]*|\"error.:.[A-Z_]*'; };",
                   closed =
-                      "closed() { [ $(id -u) = 0 ] || exec \"$@\"; "
-                      "setpriv --bounding-set=-all --inh-caps=-all \"$@\"; };",
+                      "closed() { if [ $(id -u) = 0 ]; then setpriv --bounding-set=-all --inh-caps=-all \"$@\"; "
+                      "else \"$@\"; fi; };",
                   lun =
                       "lun() { mkdir -p r/var/db/iscsi; printf '[{\"lid\":3,\"extentSize\":4096,\"size\":4096,"
                       "\"restoreTime\":0,\"type\":7,\"uuid\":\"u\",\"rootPath\":\"%s\",\"name\":\"n\"}]' \"$1\" "
@@ -40,7 +40,7 @@ const std::string in = "tSize\":4369\n", refused = "\"error\":\"EP_ERR_OPEN_FAIL
 const std::string abc = "map         24584  1 entry  /volume1/@iSCSI/LUN/a  b  c\n";
 const std::string listed = "tbl         24576  " + table + "\n";
 
-/// The line of a file with the size 24576 or with what else stands there, after it whatever the program adds.
+/// The object of a file, with its size and with what comes after that.
 std::string json(const std::string& path, const std::string& kind, const std::string& more,
                  const std::string& size = "24576") {
     return R"({"kind":"file","file":")" + path + R"(","fileKind":")" + kind + R"(","size":)" + size + R"(,"missing":)" +
@@ -60,7 +60,8 @@ const Case cases[] = {
      " r/file; ln -s file r/chain; ln -s ../../out r/volume1/up; mkdir -p r/volume2 r/var; "
      "ln -s ../../out/volume1/@iSCSI r/volume2/@iSCSI; ln -s ../../out/volume1 r/var/db; ln -s gone r/volume3; "
      "t folder" + table + " file chain volume1/up" + table + " r/folder/../r" + table + "; "
-     "T='epinspect --root r'; $T extent --raw file 0 --extent-size 1; $T list --luns 3; ln -s ../map r/collection.json; "
+     "T='epinspect --root r'; $T extent --raw file 0 --extent-size 1; $T list --luns 3; "
+     "ln -s ../map r/collection.json; "
      "$T lun 3; epinspect diff r r >r/none", 1,
      refused + refused + refused + refused + refused + listed,
      says({"folder" + table + leadsOut, "file" + leadsOut, "chain" + leadsOut, "volume1/up" + table + leadsOut,
@@ -115,7 +116,7 @@ const Case cases[] = {
     {"a closed folder is one message that names it", lun + closed + "lun /volume1; mkdir r/volume1/@iSCSI/LUN; "
      "cp map r" + map + "; cd r/volume1; >@iSCSI/EP/EP_FRI; for f in '000 @iSCSI/EP' '444 @iSCSI/EP' "
      "'311 @iSCSI/EP' '600 @iSCSI' '600 .'; do chmod $f; (cd ..; closed epinspect --root . list --luns 3; echo $?); "
-     "chmod 755 .; chmod -R u=rwX .; done 2>../../err | grep -v jnl; cat ../../err >&2", 0,
+     "chmod 755 \"$PWD\"; chmod -R u=rwX .; done 2>../../err | grep -v jnl; cat ../../err >&2", 0,
      "map…THINun_00000\n1\nmap…THINun_00000\n1\ntbl…\nfri…\nmap…THINun_00000\n1\n1\n1\n",
      says({"/volume1/@iSCSI/EP" + denied, "/volume1/@iSCSI/EP" + denied, "/volume1/@iSCSI/EP" + denied,
            "/volume1/@iSCSI" + denied, "/volume1" + denied})},

@@ -105,15 +105,18 @@ const Case cases[] = {
      file + ep.substr(0, ep.size() - 4) + R"(100000","fileKind":"dat","size":0,"missing":false})" "\n" +
      file + lun5 + R"(","fileKind":"map","size":24616,"missing":false,"entries":5,"typeName":"THIN","uuid":")" + uuid +
      R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-b" + same + "\n",
-     "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read: No such file or directory (code 9002)\n"},
+     "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read: No such file or directory (code "
+     "9002)\n"},
     {"list says what may not be opened", "rm far/var/db/iscsi/*; cd far/volume91/@iSCSI; mv EP LUN/folder; "
      "ln -s ../../../usr EP; rm LUN/THIN*; mkfifo LUN/pipe; ln -s none LUN/link; ln -s self LUN/self; "
      "epinspect --root ../.. list --luns 7; epinspect --root LUN/folder list", 1,
      "map       missing  " + maps + "link  link to none\n",
-     "epinspect: LUN 7: configuration cannot be loaded: The LUN list is missing or cannot be read: No such file or directory (code 9002)\n"
+     "epinspect: LUN 7: configuration cannot be loaded: The LUN list is missing or cannot be read: No such file or "
+     "directory (code 9002)\n"
      "epinspect: /volume91/@iSCSI/EP: cannot be opened: a link leads out of the folder of --root" + openFailed +
      "epinspect: " + maps + "pipe: cannot be opened: neither a regular file nor a block device (…)\n"
-     "epinspect: " + maps + "self: cannot be opened: Too many levels of symbolic links (…)\n…LUN/folder: no EP files found (…"},
+     "epinspect: " + maps + "self: cannot be opened: Too many levels of symbolic links (…)\n"
+     "…LUN/folder: no EP files found (…"},
     {"locate finds bytes", "epinspect --root store locate 1 540000000 430000000 18446744073709551615", 1,
      "LUN 1 byte 540000000: entry 514, byte 1031936 of its extent\n514: mapped, pool 16, extent 4194818\n"
      "/volume1/@iSCSI/EP/EP_DAT_00001 position 540024576 (extent 514 of the file)\n" + assumed + "; extents counted "
@@ -151,7 +154,8 @@ const Case cases[] = {
      "grep -abo '[a-z][a-z]*' image; epinspect --root far read 5 --count-from file --address-bits 48 2>/dev/null | "
      "grep -abo '[a-z][a-z]*'", 0, "1\n6291456\n4194304:three\n1048576:here\n2097152:two\n4194304:three\n",
      "epinspect: " + ep + "0: LUN 5 bytes 0-1048575: " + beyond0 + "epinspect: " + ep +
-     "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and both places lie inside the file; --count-from decides …\nepinspect: LUN 5 bytes 2097152-3145727: " + open2 +
+     "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and both places lie inside the file; --count-from decides …\n"
+     "epinspect: LUN 5 bytes 2097152-3145727: " + open2 +
      "epinspect: " + ep + "2: LUN 5 bytes 3145728-4194303: " + notFound + "epinspect: " + ep + "0: LUN 5 bytes "
      "4718592-5242879: " + beyond0 + "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: past the end, …\n"
      "epinspect: LUN 5: 5242880 of 6291456 bytes could not be read, zeros stand in their place\n"},

@@ -39,7 +39,7 @@ TEST_F(OnTerminal, AChartIsAsWideAsTheTerminal) {
                  "unmapped, 1 hole; 0 vpushed, 0 vpulled,\n0 synced\n=0"));
     EXPECT_TRUE(fits(shown(command), "  0 |" + full(74) + "|\n 74 |" + full(25) + "·|\n" + legend + "99 mapped, " +
                                          unmapped + ", 0\nsynced\n=0"));
-    EXPECT_TRUE(fits(shown(command, 0), shown(command)));  // it tells no width
+    EXPECT_TRUE(fits(shown(command, 0), shown(command)));  // its width is not known
     EXPECT_TRUE(fits(shown(command + " --first 98", 2), " 98 |█|\n 99 |·|\nOne\n…"));
     EXPECT_TRUE(
         fits(shown(command, 200), "  0 |" + full(99) + "·|\n" + legend + "99 mapped, " + unmapped + ", 0 synced\n=0"));
@@ -83,7 +83,7 @@ TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {
     drawing.interrupt();
     EXPECT_TRUE(fits(drawing.shown(), "  …%…\r\033[K=130"));
     listing.shownUntil(" left");
-    listing.signal(SIGINT);  // which it ignores, as it was told when it started
+    listing.signal(SIGINT);  // which it has ignored from its start
     std::filesystem::resize_file(path("endless"), 24576);
     EXPECT_TRUE(
         fits(listing.shown(),

@@ -71,7 +71,7 @@ constexpr int operationCount = 4;
 int reason = 0;  ///< what the last operation left in errno
 Lines logged;    ///< and its log lines
 
-/// Performs one of the operations that read, on whole files. Tells its code, and whether it has delivered a result.
+/// Performs one of the operations that read, on whole files. Returns its code, and whether it has delivered a result.
 /// Afterwards no more files may be open than before.
 std::pair<int, bool> perform(int operation) {
     const TempDir folder;

@@ -109,7 +109,7 @@ TEST(Lookup, EachStepFailsWithItsOwnLineAndCodeAndLeavesTheResult) {
 
 TEST(MapEntry, BitsBecomeMembersAndALine) {
     // clang-format off
-    const std::map<std::uint64_t, std::string> lines = {  // behind "pool number: "
+    const std::map<std::uint64_t, std::string> lines = {  // after "pool number: "
         {0, "0 ,extent address: 0 ,mapped: false ,vpushed: false ,vpulled: false ,synced: false"},
         {0x8000000000000400, "0 ,extent address: 1024 ,mapped: true ,vpushed: false ,vpulled: false ,synced: false"},
         {0x100000000000002a, "0 ,extent address: 42 ,mapped: false ,vpushed: false ,vpulled: false ,synced: true"},

@@ -36,7 +36,7 @@ void answer(unsigned int extentSize, unsigned long long size, int type) {
 extern "C" __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsigned int lid, int reserved, void* to) {
     askedLid = lid;
     EXPECT_EQ(0, reserved);
-    EXPECT_EQ(0U, reinterpret_cast<std::uintptr_t>(to) % 8);  // as the structure that it is to that library
+    EXPECT_EQ(0U, reinterpret_cast<std::uintptr_t>(to) % 8);  // for that library it is a structure with such numbers
     EXPECT_EQ(std::string(4480, '\0'), std::string(static_cast<const char*>(to), 4480));
     std::memcpy(to, record.data(), 4480);  // a failed call may leave anything in the record
     errno = EIO;

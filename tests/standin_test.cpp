@@ -49,7 +49,10 @@ extern "C" __attribute__((visibility("default"))) ssize_t read(int descriptor, v
     if (now > most) most = now;
     return memory;
 }
-[[gnu::noinline]] void operator delete(void* memory) noexcept { held -= malloc_usable_size(memory), std::free(memory); }
+[[gnu::noinline]] void operator delete(void* memory) noexcept {
+    held -= malloc_usable_size(memory);
+    std::free(memory);
+}
 [[gnu::noinline]] void operator delete(void* memory, std::size_t) noexcept { operator delete(memory); }
 
 static const std::string list =
@@ -154,7 +157,7 @@ TEST(StandIn, ReadsALongListOnceForAllThreadsAndKeepsLittleOfIt) {
     EXPECT_GE(size + 4 * 4 * 16384, bytesRead);
     EXPECT_GT(before + 65536 + 48 * count, most);
     EXPECT_GT(before + 8192 + 16 * count, held);
-    // Changed behind the system's back, and openly.
+    // A change through memory, which the file's state does not show; then one that it shows.
     const int descriptor = open(path.c_str(), O_RDWR);
     void* mapped = mmap(nullptr, size, PROT_READ | PROT_WRITE, MAP_SHARED, descriptor, 0);
     ASSERT_NE(MAP_FAILED, mapped);

@@ -26,20 +26,24 @@ static_assert((EP_MAP_ENTRY_ADDRESS_MASK | EP_MAP_ENTRY_POOL_MASK) == EP_MAP_ENT
 /// How many pool UUIDs a map file holds at most.
 inline constexpr unsigned int EP_POOL_COUNT_MAX = 1024;
 
-/// Bytes of its volume that a data file stands for: data file number N holds those from N times as many on.
+/// How many bytes of its volume a data file stands for: data file N for those from N * EP_DAT_FILE_SPAN on.
 inline constexpr unsigned long long EP_DAT_FILE_SPAN = 1ULL << 42;
 
-/// The names of the files. The number of a data file follows in decimal, of at least five digits.
+/// The names of the files. A data file's name ends in its number, in decimal and with at least five digits.
 inline constexpr char EP_JNL_FILE_NAME[] = "EP_JNL";
 inline constexpr char EP_TBL_FILE_NAME[] = "EP_TBL";
 inline constexpr char EP_FRI_FILE_NAME[] = "EP_FRI";
 inline constexpr char EP_DAT_FILE_PREFIX[] = "EP_DAT_";
 inline constexpr unsigned int EP_DAT_NUMBER_DIGITS = 5;
 
+/// The name of a LUN's map file is the LUN's type name, UUID and name, and ends in this.
+inline constexpr char EP_MAP_NAME_END[] = "_00000";
+
 /// Their folders, each with the slashes around it.
 inline constexpr char EP_JNL_FOLDER[] = "/var/db/iscsi/";  ///< the machine's journal
 inline constexpr char EP_VOLUME_PREFIX[] = "/volume";      ///< a volume, its number follows
 inline constexpr char EP_VOLUME_FOLDER[] = "/@iSCSI/EP/";  ///< on a volume: table, free-index and data files
 inline constexpr char EP_MAP_FOLDER[] = "/@iSCSI/LUN/";    ///< below a LUN's root path: its map file
+inline constexpr char EP_ISCSI_FOLDER[] = "/@iSCSI/";      ///< the folder above the last two
 
 }  // namespace ISCSI::TOOL

@@ -5,8 +5,8 @@
 
 namespace ISCSI::TOOL {
 
-/// The system's own syslog(), by its name alone: whatever <syslog.h> makes of that name in a hardened build, a caller
-/// that puts a syslog() of its own in its place is called.
+/// The system's syslog(), under its plain name. In a hardened build <syslog.h> would call another function, and a
+/// caller that defines a syslog() of its own would not be called.
 [[gnu::format(printf, 2, 3)]] void SystemLog(int priority, const char* format, ...) __asm__("syslog");
 
 inline constexpr int SYSTEM_LOG_ERR = 3;
@@ -39,7 +39,7 @@ constexpr const char* FileNameOf(const char* path) {
 #endif
 
 /// Writes the line of `operation` in `sourceFile`. `line` is a fixed number that identifies the failure and never
-/// follows the source text; the format's literal and its arguments come after it.
+/// follows the source text. After it come the format, which is a literal, and its arguments.
 #define EP_LOG_ERR_FOR(sourceFile, operation, line, format, ...)                                                       \
     do {                                                                                                               \
         const ::ISCSI::TOOL::ErrnoKeeper errnoBeforeLog;                                                               \

@@ -1,5 +1,5 @@
-// String tools: raw header bytes to text. They keep no state, throw nothing but what GetTimeInString says, and may run
-// on several threads at once.
+// String tools: raw header bytes to text. They keep no state and may run on several threads at once. Only
+// GetTimeInString() throws.
 #pragma once
 
 #include <time.h>  // NOLINT(modernize-deprecated-headers): localtime_r and tzset are POSIX, <ctime> need not have them
@@ -62,8 +62,8 @@ template <std::size_t... Places>
     return done;
 }
 
-/// Writes the two hexadecimal digits of each of `count` bytes to `digits`. The bytes may lie at the end of the room for
-/// the digits, in which case they are written over.
+/// Writes the two hexadecimal digits of each of `count` bytes to `digits`. `bytes` may be the second half of the memory
+/// at `digits`, which is then written over.
 inline void PutHexDigits(const unsigned char* bytes, std::size_t count, char* digits) {
     for (auto i = PutHexBlocks(bytes, count, digits, std::make_index_sequence<16>()); i < count; ++i) {
         std::memcpy(digits + 2 * i, &HexDigitPairs[2 * std::size_t{bytes[i]}], 2);

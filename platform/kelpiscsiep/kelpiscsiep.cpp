@@ -99,7 +99,7 @@ Key keyOf(const std::string& text) {
     return Key::other;
 }
 
-/// What is another one when a file has been changed, or another file has taken its place.
+/// What shows that a file was changed or replaced.
 struct FileState {
     dev_t device;
     ino_t inode;
@@ -301,7 +301,7 @@ private:
     Key key_ = Key::other;
     Lun lun_;
     std::optional<Lun> found_;
-    bool ended_ = false;  ///< by a part that is no LUN, or a LUN without an id: what follows does not count
+    bool ended_ = false;  ///< there was a part that is no LUN, or a LUN without an id: what follows does not count
     std::vector<LunStart> starts_;
 };
 
@@ -368,8 +368,8 @@ Result findLun(std::uint32_t lid, void* record) {
     return goThrough(known, bytes, *file, lid, record);
 }
 
-/// Makes errno tell why the list is of no use, and 0 where it is: nothing else stands for a list that is there and says
-/// nothing of the LUN.
+/// Sets errno to the reason why the list cannot be used, and to 0 where it can be: that is how a list without the LUN
+/// is told from a list of no use.
 void setReason(Result result) {
     if (result == LIST_MALFORMED) {
         errno = EBADMSG;

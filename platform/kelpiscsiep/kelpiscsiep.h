@@ -18,8 +18,8 @@ extern "C" {
 #define KELPISCSI_LUN_NAME 4213
 
 /* Fills `record` (zeroed by the caller) with the configuration of the LUN `lid`; `reserved` is 0.
- * Returns 0, or an error code that KELPiSCSIStrError() has a text for. With the stand-in errno then tells why its list
- * cannot be used, and is 0 where it can. */
+ * Returns 0, or an error code that KELPiSCSIStrError() has a text for. With the stand-in, errno is then the reason why
+ * its list cannot be used, and 0 where it can be used. */
 int KELPiSCSILunGetByLid(unsigned int lid, int reserved, void* record);
 
 /* The text of an error code. What an unknown code gets is not documented: it may be null. */

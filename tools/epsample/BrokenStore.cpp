@@ -1,5 +1,4 @@
-// Where each fault lies. LUNs 1 to 11 are named after theirs and, like LUN 12, have their data on volume 2, whose EP
-// files are sound.
+// Where each fault lies. LUNs 1 to 12 have their maps on volume 2, whose EP files are sound.
 //
 //   version            /var/db/iscsi/EP_JNL
 //   magic              /volume1/@iSCSI/EP/EP_TBL

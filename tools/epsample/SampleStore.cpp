@@ -58,7 +58,7 @@ EPFileBuilder mapHeaderOfLun1(std::uint64_t entries) {
     return mapFile(entries, mapped, synced);
 }
 
-/// Writes the entries of LUN 1 behind the header block, a cycle at a time.
+/// Writes the entries of LUN 1 after the header block, one cycle at a time.
 void writeEntriesOfLun1(const std::string& path, std::uint64_t entries) {
     std::array<std::uint64_t, cycle> stored{};
     std::array<std::uint64_t, cycle> step{};

@@ -24,7 +24,7 @@ struct Failure {
     std::vector<std::string> log = {};  ///< the library's log lines about it, where they were held back
 };
 
-/// "FILE: PART", as far as both are there.
+/// "FILE: PART", or the one of the two that is there.
 std::string textOf(const Subject& subject);
 
 /// "what failed: the system's reason (EP_ERR_NAME, code)", the reason and the code where there are such.
@@ -33,7 +33,7 @@ std::string whatOf(const Failure& failure);
 /// The same after "SUBJECT: ".
 std::string messageOf(const Failure& failure);
 
-/// The failure to read `place` ("entry 4096") past the end of a file that holds `count` of such.
+/// The failure to read `place` ("entry 4096") past the end of a file that holds `count` of them.
 Failure pastEnd(const std::string& file, const std::string& place, unsigned long long count);
 
 }  // namespace inspection

@@ -7,7 +7,7 @@ namespace inspection {
 
 namespace {
 
-/// The number that `digits` is; `what` it should have been.
+/// The number in `digits`; `what` is wrong when it holds none.
 Typed<std::uint64_t> parse(std::string_view digits, std::uint64_t most, const char* what) {
     const bool hexadecimal = digits.substr(0, 2) == "0x" || digits.substr(0, 2) == "0X";
     if (hexadecimal) digits.remove_prefix(2);

@@ -9,11 +9,11 @@
 
 namespace inspection {
 
-/// What a text stands for, or what is wrong with it.
+/// The value that a text stands for, or what is wrong with the text.
 template <typename Value>
 struct Typed {
     Value value{};
-    const char* fault = nullptr;  ///< null: nothing is
+    const char* fault = nullptr;  ///< what is wrong; null: nothing
 
     Typed(Value meant) : value(meant) {}
     Typed(const char* wrong) : fault(wrong) {}

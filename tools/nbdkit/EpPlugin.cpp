@@ -1,5 +1,5 @@
-// The plugin for nbdkit: a LUN as a read-only disk for everything that speaks NBD. Only this joins the two: what a LUN
-// holds, and what the parameters mean, is told by the inspection library.
+// The plugin for nbdkit: a LUN as a read-only disk for everything that speaks NBD. It only joins the two: what a LUN
+// holds and what the parameters mean is known to the inspection library.
 #define NBDKIT_API_VERSION 2
 #include <nbdkit-plugin.h>
 
@@ -25,7 +25,7 @@ namespace {
 
 using namespace inspection;
 
-/// What there is to say goes to nbdkit's log.
+/// Failures and remarks go to nbdkit's log.
 class PluginContext : public Context {
 public:
     void remark(const std::string& subject, const std::string& text) override {

@@ -1,5 +1,5 @@
 // epinspect collect: what is needed to look at a store elsewhere, without its data.
-#include <sys/stat.h>
+#include <etc/ISCSIEPFormat.h>
 
 #include <ctime>
 #include <filesystem>
@@ -15,6 +15,7 @@
 namespace epinspect {
 
 namespace fs = std::filesystem;
+namespace tool = ISCSI::TOOL;
 
 namespace {
 
@@ -30,7 +31,7 @@ bool isInsideStore(const Session& session, const fs::path& folder) {
     const std::string root =
         session.root.isFolder() ? fs::canonical(session.root.hostPath("/"), error).string() + "/" : "";
     if (!root.empty()) return path.compare(0, root.size(), root) == 0;
-    return path.find("/@iSCSI/") != std::string::npos || path.rfind("/var/db/iscsi/", 0) == 0;
+    return path.find(tool::EP_ISCSI_FOLDER) != std::string::npos || path.rfind(tool::EP_JNL_FOLDER, 0) == 0;
 }
 
 /// Makes the folder; reports why it cannot be used.

@@ -29,7 +29,7 @@ DifferenceName nameOf(Difference difference) {
     }
 }
 
-/// A side of a difference; of entries that are no run the first one, which the mark after it says.
+/// One side of a difference. Of entries that are no run it shows the first, with a mark after it.
 void writeSide(LineBuffer& line, const DiffRun::Side& side, std::uint64_t count) {
     writeEntries(line, *side.entry, side.isRun ? count : 1);
     if (!side.isRun) line.add(" ...");

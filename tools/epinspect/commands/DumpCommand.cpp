@@ -19,7 +19,7 @@ struct DumpOptions {
     const FileKind* kind = nullptr;  ///< --as
 };
 
-/// The kind that the type in HEAD[0] of the file at `path` tells, and HEAD[0] alone when it tells none; null after a
+/// The kind that follows from the type in HEAD[0] of the file at `path`; HEAD[0] alone when none does; null after a
 /// failure.
 const FileKind* kindFromType(Session& session, const std::string& name, const std::string& path) {
     tool::ISCSIEPFile head(path);

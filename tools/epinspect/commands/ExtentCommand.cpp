@@ -26,7 +26,7 @@ struct ExtentOptions {
     bool raw = false;
 };
 
-/// How many whole extents the file holds, or nothing when its size cannot be told.
+/// How many whole extents the file holds, or nothing when its size cannot be found out.
 std::optional<std::uint64_t> extentCount(const Session& session, const tool::ISCSIEPFileDAT& file,
                                          std::uint32_t extentSize) {
     const auto size = session.sizeOf(file.path);

@@ -18,7 +18,7 @@ namespace tool = ISCSI::TOOL;
 
 namespace {
 
-/// How many entries the map file `file` holds; nothing when there are none to be counted, which is said.
+/// How many entries the map file `file` holds; nothing for other files, and after a failure, which is reported.
 std::optional<std::uint64_t> entriesOf(Session& session, const StoreFile& file) {
     if (file.missing || file.kind->type != tool::EP_FILE_TYPE_MAP) return std::nullopt;
     tool::ISCSIEPFileMAP map(file.hostPath);
@@ -32,7 +32,7 @@ std::optional<std::uint64_t> entriesOf(Session& session, const StoreFile& file) 
     return entries;
 }
 
-/// What is known of a file, its path and what it is beside that last: one line where it fits.
+/// What is known of a file, then its path, then what else it is: a link, a second name. One line where that fits.
 void printFile(const StoreFile& file, const std::optional<std::uint64_t>& entries) {
     constexpr std::size_t sizeColumns = 14;
     constexpr unsigned int indent = 6;

@@ -62,7 +62,7 @@ std::vector<Candidate> candidatesIn(const DataFile& data, const ExtentPlace& pla
     return candidates;
 }
 
-/// Says what the way of counting rests on.
+/// Writes down why extents are counted in this way.
 void settleCounting(Byte& byte, const PlaceChoice& choice, const std::optional<CountFrom>& counting) {
     if (choice.countFrom) {
         byte.assumed.emplace_back(*choice.countFrom == CountFrom::file
@@ -79,7 +79,7 @@ void settleCounting(Byte& byte, const PlaceChoice& choice, const std::optional<C
             : "extents counted within the data file (counted from the volume's start they would lie past its end)");
 }
 
-/// Finds the candidates for a byte whose entry is mapped; reports why there is none, or none that can be read.
+/// Finds the candidates for a byte whose entry is mapped. Reports why there is none, or none that can be read.
 void findCandidates(const PlaceChoice& choice, Session& session, const LunMap& lun, DataFiles& files, Byte& byte) {
     const Subject subject = lun.subject(partOf(byte));
     const auto address = extentAddressOf(byte.entry, choice);

@@ -1,4 +1,4 @@
-// The way of a LUN's bytes to where they are wanted.
+// Copies the bytes of a LUN to where they are wanted.
 #pragma once
 
 #include <cstdint>
@@ -20,7 +20,7 @@ public:
 
     virtual void put(std::string_view bytes) = 0;
 
-    /// `length` bytes are not mapped, or nobody knows them. Returns how many of them it took: at least one.
+    /// `length` bytes are not mapped, or cannot be read. Returns how many of them it took: at least one.
     virtual std::uint64_t skip(std::uint64_t length) = 0;
 };
 

@@ -18,7 +18,7 @@ std::string lunsText(const std::vector<std::uint32_t>& lids);
 /// Appends "FIRST-LAST", or the one number when both are the same.
 void writeRange(LineBuffer& text, std::uint64_t first, std::uint64_t count);
 
-/// Appends what a run is whose first entry is `entry`: "hole", or flags, pool and extent addresses.
+/// Appends what a run of `count` entries holds, of which `entry` is the first: "hole", or flags, pool and extents.
 void writeEntries(LineBuffer& text, const MapEntry& entry, std::uint64_t count);
 
 /// Appends the line of a run.

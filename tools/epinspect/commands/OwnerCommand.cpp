@@ -71,7 +71,7 @@ void writePart(const AskedFile& asked, const OwnedRange& part) {
         const OwnedBytes bytes(part, owner, asked.start());
         json.beginObject().text("countFrom", owner.countFrom == CountFrom::file ? "file" : "volume");
         json.path("map", file.path);
-        if (const Lun* lun = file.lun()) json.number("lid", lun->record.lid);
+        json.lids(lidsOf(file.luns));
         json.number("index", owner.index).number("remainder", bytes.remainder);
         if (bytes.lunOffset) {
             json.number("lunOffset", *bytes.lunOffset);

@@ -1,4 +1,4 @@
-// What locate and read have in common: the map of a LUN, and the options that settle how its bytes are placed.
+// What locate and read have in common: the map of a LUN, and the options that decide where its bytes lie.
 #pragma once
 
 #include <cstdint>

@@ -74,7 +74,7 @@ void reportMissing(Session& session, const LunMap& lun, const LunTotals& totals)
                                                 " bytes could not be read, zeros stand in their place");
 }
 
-/// Keeps what is of use in an image that cannot be finished. Reports that, and why.
+/// Ends an image that cannot be finished after its last byte that is right, or removes it. Reports that, and why.
 void giveUp(Session& session, const std::string& path, const Descriptor& image, const LunTotals& totals,
             std::uint64_t length, int error) {
     session.endProgress();

@@ -24,7 +24,7 @@ bool isOneOf(std::string_view names, std::string_view name) {
 
 constexpr char noBreak = '\x1f';  ///< stands for a blank at which no line ends
 
-/// A row of the help: what is typed, and what it means, which starts a line of its own where the first is too long.
+/// A row of the help: what is typed, and what it means; the meaning gets lines of its own where the first is too long.
 std::string helpRow(const std::string& typed, const std::string& meaning, unsigned int column) {
     const std::string text = "  " + typed;
     if (text.size() + 2 > column) {

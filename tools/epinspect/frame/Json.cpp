@@ -11,22 +11,29 @@ using inspection::jsonText;
 
 namespace {
 
-/// The members that tell a path: "NAME", and "NAMEHex" where it is not UTF-8.
+/// The members that hold a path: "NAME", and "NAMEHex" where it is not UTF-8.
 std::string pathMembers(const std::string& name, const std::string& path) {
     std::string members = "\"" + name + "\":" + jsonText(path);
     if (isUTF8(path)) return members;
     return members.append(",\"").append(name).append("Hex\":\"").append(hexOf(path)).append("\"");
 }
 
+std::string lidMembers(const std::vector<std::uint32_t>& lids) {
+    std::string members = "\"lid\":" + std::to_string(lids.front());
+    if (lids.size() == 1) return members;
+    const char* separator = ",\"lids\":[";
+    for (const std::uint32_t lid : lids) {
+        members += separator + std::to_string(lid);
+        separator = ",";
+    }
+    return members + "]";
+}
+
 }  // namespace
 
 Json::Json(const std::string& file, const std::vector<std::uint32_t>& lids)
     : file_(file.empty() ? R"("file":null)" : pathMembers("file", file)) {
-    if (!lids.empty()) file_ += ",\"lid\":" + std::to_string(lids.front());
-    if (lids.size() < 2) return;
-    file_ += ",\"lids\":[" + std::to_string(lids[0]);
-    for (std::size_t i = 1; i < lids.size(); ++i) file_ += "," + std::to_string(lids[i]);
-    file_ += "]";
+    if (!lids.empty()) file_ += "," + lidMembers(lids);
 }
 
 Json& Json::begin(const char* kind) {
@@ -39,6 +46,11 @@ Json& Json::begin(const char* kind) {
 void Json::end() {
     line_.add("}\n");
     print(line_.view());
+}
+
+Json& Json::lids(const std::vector<std::uint32_t>& lids) {
+    if (!lids.empty()) ready(lidMembers(lids));
+    return *this;
 }
 
 Json& Json::number(std::string_view name, std::uint64_t value) {

@@ -1,5 +1,5 @@
-// The objects of --json: one a line, written as they come. Keys are the library's member names. Whatever the text dump
-// shows in hexadecimal is a "0x" text, every other number a number.
+// The objects of --json: one per line, written as they come. Keys are the library's member names. What the text dump
+// shows in hexadecimal is a "0x" text, every other number is a number.
 #pragma once
 
 #include <cstdint>
@@ -15,8 +15,8 @@ namespace epinspect {
 /// Writes objects about one file. Each kind of value has a name of its own, so that none is taken for another.
 class Json {
 public:
-    /// `file` goes into every object; empty: what the objects are about is no file. Of a map file so do the ids of the
-    /// LUNs that it is known to be of: "lid" the first, "lids" all where they are several.
+    /// Every object gets `file`, which is empty where the objects are not about a file, and the ids of the LUNs whose
+    /// map it is, as far as they are known: "lid" the first, and "lids" all where there are several.
     explicit Json(const std::string& file, const std::vector<std::uint32_t>& lids = {});
 
     /// Starts an object: "kind" and "file".
@@ -69,8 +69,11 @@ public:
     /// Bytes that are not UTF-8 become U+FFFD; all else is plain ASCII.
     Json& text(std::string_view name, std::string_view value);
 
-    /// The same of a path, whose bytes "NAMEHex" tells where they are not UTF-8.
+    /// The same of a path; where it is not UTF-8, "NAMEHex" holds its bytes.
     Json& path(const std::string& name, const std::string& value);
+
+    /// "lid" the first, "lids" all where they are several; nothing where there is none.
+    Json& lids(const std::vector<std::uint32_t>& lids);
 
     Json& texts(std::string_view name, const std::vector<std::string>& values);
 
@@ -94,7 +97,7 @@ private:
 
     std::string file_;  ///< the members that tell the file, ready to be written
     LineBuffer line_;
-    bool inner_ = false;  ///< something precedes what comes next
+    bool inner_ = false;  ///< a comma must come before the next member
 };
 
 }  // namespace epinspect

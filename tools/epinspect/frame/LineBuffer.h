@@ -37,8 +37,14 @@ private:
     template <typename... Views>
     LineBuffer& addViews(const Views&... views) {
         reserve((views.size() + ...));
-        ((std::memcpy(end(), views.data(), views.size()), size_ += views.size()), ...);
+        (append(views), ...);
         return *this;
+    }
+
+    /// Needs room for it.
+    void append(std::string_view view) {
+        std::memcpy(end(), view.data(), view.size());
+        size_ += view.size();
     }
 
     char* end() { return &buffer_[size_]; }

@@ -28,8 +28,8 @@ void finishOutput();
 /// Whether standard output is a terminal.
 bool outputIsTerminal();
 
-/// The columns of the terminal that `stream` (a file descriptor) is; where none tells them, what COLUMNS in the
-/// environment says, else 80.
+/// The width of the terminal that `stream` (a file descriptor) is. Where that is not known, COLUMNS in the environment
+/// says it; else it is 80.
 unsigned int terminalWidth(int stream);
 
 /// The same for standard output.

@@ -22,10 +22,10 @@ public:
     /// cannot.
     void setRoot(const std::string& folder);
 
-    /// Says on standard error when what is looked at is a collection, and of when.
+    /// Where the root is a collection: says so on standard error, and when it was made.
     void remarkOnCollection();
 
-    /// Reports a failure as a message alone, for which the caller has an object that says more.
+    /// Reports a failure as a message alone: the caller prints an object that says more.
     void complainOf(const Failure& failure);
 
     void remark(const std::string& subject, const std::string& text) override;
@@ -34,7 +34,7 @@ public:
     bool interrupted() override;
     std::vector<std::string> takeTrialLog() override { return takeHeldLines(); }
 
-    /// Takes the line that shows the progress away, for good.
+    /// Erases the line that shows the progress, for good.
     void endProgress() { progress_.reset(); }
 
     /// The exit status that the run so far amounts to.

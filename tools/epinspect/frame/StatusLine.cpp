@@ -21,7 +21,7 @@ extern "C" void endBySignal(int signal) {
     static_cast<void>(std::raise(signal));  // arrives, with its default action, when this handler returns
 }
 
-/// From now on the line is also taken away by the signals that end the program.
+/// From now on the signals that end the program erase the line first.
 void watchSignals() {
     for (const int signal : endingSignals) {
         struct sigaction action = {};

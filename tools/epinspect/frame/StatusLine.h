@@ -1,5 +1,5 @@
-// The line on standard error, a terminal, that shows how far a work has come. There is one, and it never mixes with
-// what is written there.
+// The line on standard error, where that is a terminal, that shows how far a work has come. There is only one, and it
+// never mixes with what else is written there.
 #pragma once
 
 #include <string_view>
@@ -9,7 +9,7 @@ namespace epinspect {
 /// Shows `text` in place of what the line showed before. The signals that end the program erase it too.
 void showStatusLine(std::string_view text);
 
-/// Takes the line away. May be called in a signal handler.
+/// Erases the line. May be called in a signal handler.
 void eraseStatusLine() noexcept;
 
 /// Writes all of `text` to the file descriptor `stream`; may be called in a signal handler. Returns 0 or the errno

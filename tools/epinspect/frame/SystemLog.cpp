@@ -1,6 +1,6 @@
-// The library calls syslog(); the one defined here takes that call. openlog() with LOG_PERROR would show the lines too,
-// but not escaped for a terminal, and could not keep them off the system log. In a static program the
-// function has another name (see CMakeLists.txt).
+// The library calls syslog(), and gets the one defined here. openlog() with LOG_PERROR would show the lines too, but
+// not escaped for a terminal, and could not keep them off the system log. In a static program the function has another
+// name (see CMakeLists.txt).
 #include "frame/SystemLog.h"
 
 #include <syslog.h>

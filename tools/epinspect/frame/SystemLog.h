@@ -30,7 +30,7 @@ private:
     QuietLog quiet_;
 };
 
-/// The lines held back since the last call, if log lines are shown. Those that nobody takes are forgotten.
+/// The lines held back since the last call, if log lines are shown. Lines that nobody takes are never shown.
 std::vector<std::string> takeHeldLines();
 
 }  // namespace epinspect

@@ -53,7 +53,7 @@ struct Value {
 struct Finding {
     /// Entries of a map, in runs of neighbours.
     struct Entries {
-        /// One run of `number` entries. Which extents they have does not matter, `firstEntry` is the first of them.
+        /// `number` neighbouring entries, of which `firstEntry` is the first. Their extents need not be consecutive.
         Entries(std::uint64_t index, std::uint64_t number, const MapEntry& firstEntry)
             : first(index), count(number), entry(firstEntry), entries(number) {}
 

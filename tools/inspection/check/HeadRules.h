@@ -14,7 +14,7 @@ namespace inspection {
 /// `kind`: the type against the file's name. Returns whether they agree.
 bool checkKind(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFile& content, Report& report);
 
-/// `data-start`: whether it lies behind the header block and in the file.
+/// `data-start`: whether it lies after the header block and inside the file.
 void checkDataStart(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFile& content, Report& report);
 
 /// `magic` and `version`: each against the value that most of the files have.

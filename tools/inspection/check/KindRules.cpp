@@ -6,7 +6,7 @@ namespace inspection {
 
 namespace {
 
-/// The type of a file that is like `other` although their kinds differ, or unlike although they do not.
+/// `file` has the type of `other`, which is of another kind; or another type than `other`, which is of its kind.
 Finding findingOf(const std::string& file, const KindDoubt& doubt, const Value& found, const std::string& other) {
     Finding finding = {file, Rule::kind, Value::number(doubt.type), found};
     finding.kinds = doubt;
@@ -52,8 +52,8 @@ std::set<std::string> KindTypes::check(Report& report) const {
     return wrong;
 }
 
-/// The kind to which `type` belongs: of which more files have it, in proportion, then in number; null where that does
-/// not decide.
+/// The kind to which `type` belongs: the one of which a larger share of files has it or, where the shares are equal,
+/// more files. Null where that does not decide.
 const FileKind* KindTypes::ownerOf(std::uint32_t type) const {
     const FileKind* owner = nullptr;
     std::uint64_t most = 0;

@@ -1,4 +1,4 @@
-// Rules for the types of files whose kind has no type that is known: tables, free-index files and journals.
+// Rules for the types of table files, free-index files and journals. Which type these kinds have is not known.
 #pragma once
 
 #include <ISCSIEPFile.h>
@@ -19,7 +19,7 @@ class KindTypes {
 public:
     void add(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFile& content);
 
-    /// `kind`: a type that another kind has too, or another one than most files of the kind have. Returns these files.
+    /// `kind`: a type that another kind has too, or that most files of its kind do not have. Returns these files.
     std::set<std::string> check(Report& report) const;
 
 private:

@@ -12,7 +12,7 @@
 
 namespace inspection {
 
-/// What is expected at a path and is not there: a link leads nowhere, or there is not even that.
+/// A file that is expected at a path: nothing is there, or a link that leads nowhere.
 struct MissingFile {
     std::string path;
     bool isLink;
@@ -22,7 +22,7 @@ struct MissingFile {
 /// `missing-map`: there is no file where the map file of these LUNs should be.
 void checkMissingMap(const MissingFile& file, Report& report);
 
-/// `missing-file`: there is no journal, table or free-index file for these LUNs, or what leads to one leads nowhere.
+/// `missing-file`: there is no journal, table or free-index file for these LUNs, or a link to one leads nowhere.
 void checkMissingFile(const MissingFile& file, Report& report);
 
 /// `missing-data-file`: a link leads nowhere.

@@ -14,9 +14,9 @@ namespace {
 
 constexpr std::uint32_t mostPools = ISCSI::TOOL::EP_POOL_COUNT_MAX;
 
-constexpr std::uint64_t noDataFile = std::numeric_limits<std::uint64_t>::max();  ///< past any that there can be
+constexpr std::uint64_t noDataFile = std::numeric_limits<std::uint64_t>::max();  ///< larger than any number of one
 
-/// The entries of `run` from the one that is `skipped` behind the first on.
+/// `count` entries of `run`, from the one after the first `skipped` on.
 MapRun partOf(const MapRun& run, std::uint64_t skipped, std::uint64_t count) {
     MapRun part = {run.first + skipped, count, run.entry};
     part.entry.extentAddress += skipped;
@@ -134,8 +134,8 @@ void MapRules::checkDataFiles(const MapRun& run) {
     }
 }
 
-/// Compares entries whose extents start in one data file, the first one at `place`. Counted from the volume's start an
-/// extent lies further on than counted within the data file: past the end by that reading, it is so by both.
+/// Compares entries whose extents start in one data file, the first one at `place`. Counted from the volume's start, an
+/// extent never lies before its place counted within the data file: if that one is past the end, both are.
 void MapRules::checkDataFile(const MapRun& part, const ExtentPlace& place) {
     const DataFile& data = dataFiles_->at(place.dataFile);
     if (data.missing) return take(missingDataFile_, part, place.dataFile);

@@ -15,13 +15,13 @@
 namespace inspection {
 
 /// Takes the runs of one map, in their order, from a single walk that serves all rules. Neighbouring entries that break
-/// one rule, as to data files against one of them, are a finding.
+/// one rule are one finding; of the rules about data files, one for each data file.
 class MapRules {
 public:
     MapRules(const StoreFile& file, const ISCSI::TOOL::ISCSIEPFileMAP& content, Report& report)
         : file_(file), content_(content), report_(report) {}
 
-    /// Compares entries with the data files too, where extents of `extentSize` bytes lie, not 0.
+    /// From now on entries are compared with the data files too. Extents have `extentSize` bytes, not 0.
     void useDataFiles(DataFiles& dataFiles, std::uint32_t extentSize);
 
     void add(const MapRun& run);
@@ -67,7 +67,7 @@ private:
     DataFiles* dataFiles_ = nullptr;
     std::uint32_t extentSize_ = 0;
     bool ambiguousBits_ = false;  ///< some entries were not compared with data files: bits 48 to 51 are set
-    std::map<std::uint64_t, Failure> unreadable_;  ///< nor others, whose data files could not be read, by number
+    std::map<std::uint64_t, Failure> unreadable_;  ///< data files, by number: nothing was compared with these
     Stretch unmappedBits_ = {&MapRules::reportUnmappedBits};
     Stretch addressBits_ = {&MapRules::reportAddressBits};
     Stretch missingDataFile_ = {&MapRules::reportMissingDataFile};

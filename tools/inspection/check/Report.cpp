@@ -23,6 +23,11 @@ void Report::beginFile(const std::string& path, std::optional<std::uint32_t> lid
     known_.emplace(path, File{known_.size(), lid, watch});
 }
 
+bool Report::hasChanged(const std::string& path) const {
+    const auto file = known_.find(path);
+    return file != known_.end() && file->second.watch.noticeChange();
+}
+
 void Report::add(Finding finding) {
     constexpr std::size_t mostWaiting = 16384;  // a hostile store may have any number of them
     if (waiting_.size() >= mostWaiting) handOut();
@@ -55,10 +60,7 @@ void Report::askForChanges() const {
         paths.insert(finding.file);
         if (finding.partner) paths.insert(finding.partner->file);
     }
-    for (const std::string& path : paths) {
-        const auto file = known_.find(path);
-        if (file != known_.end()) file->second.watch.noticeChange();
-    }
+    for (const std::string& path : paths) hasChanged(path);
 }
 
 std::optional<std::uint32_t> Report::lidOf(const std::string& path) const {

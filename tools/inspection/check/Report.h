@@ -1,4 +1,4 @@
-// What a check amounts to: findings, totals, and what could not be compared.
+// The result of a check: findings, totals, and what could not be compared.
 #pragma once
 
 #include <cstdint>
@@ -27,8 +27,8 @@ struct Snapshot {
     std::optional<std::uint32_t> parentLid = {};
 };
 
-/// Joins the findings about entries that break one rule against one partner, unless `each` run is to be seen, and hands
-/// all of them to `take` in the order of their files.
+/// Hands findings to `take`, in the order of their files. Joins those about entries that break one rule against one
+/// partner, unless `each` run is to be seen.
 class Report {
 public:
     Report(Context& context, bool each, std::function<void(const Finding&)> take)
@@ -38,12 +38,15 @@ public:
     /// `watch` knows whether it changes.
     void beginFile(const std::string& path, std::optional<std::uint32_t> lid, const ChangeWatch& watch);
 
+    /// Whether the file `path`, about which findings may come, has changed since beginFile(); tells the context.
+    bool hasChanged(const std::string& path) const;
+
     void add(Finding finding);
 
     /// Hands out what was added.
     void handOut();
 
-    /// Remembers that `what` could not be compared; where that concerns one file: which one.
+    /// Remembers that `what` could not be compared, and in which file, where that concerns one.
     void notCompared(const std::string& what, const std::string& file = {});
 
     void addSnapshot(Snapshot snapshot);
@@ -59,7 +62,7 @@ public:
     /// How many findings were handed out, by rule.
     const std::map<Rule, std::uint64_t>& findings() const { return findings_; }
 
-    /// What could not be compared and why, a text each.
+    /// What could not be compared, and why: one text for each.
     std::vector<std::string> gaps() const;
 
 private:
@@ -74,7 +77,7 @@ private:
         std::string first;
     };
 
-    /// What findings have in common that are joined: file, rule, other file, data file.
+    /// What joined findings have in common: file, rule, other file, data file.
     using Group = std::tuple<std::string, Rule, std::string, std::uint64_t>;
 
     void askForChanges() const;

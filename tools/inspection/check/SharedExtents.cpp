@@ -61,8 +61,11 @@ void SharedExtents::checkVolume(Volume& volume) {
     if (volume.shared.size() == 0) return;
     Uses uses;
     for (const std::uint32_t map : volume.maps) {
-        if (!collect(volume, map, uses))
-            report_.notCompared("shared-extents: a map cannot be read again", maps_[map].path);
+        const std::string& path = maps_[map].path;
+        const char* lack = nullptr;
+        if (!collect(volume, map, uses)) lack = "shared-extents: a map cannot be read again";
+        if (report_.hasChanged(path)) lack = "shared-extents: a map has changed while it was read";
+        if (lack != nullptr) report_.notCompared(lack, path);
     }
     std::sort(uses.begin(), uses.end(), [](const Use& one, const Use& other) {
         return std::tuple(one.extent(), one.map, one.first) < std::tuple(other.extent(), other.map, other.first);

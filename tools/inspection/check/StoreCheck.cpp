@@ -111,7 +111,7 @@ void StoreCheck::checkContent(const StoreFile& file, const FileKind& kind, tool:
     const auto* const table = dynamic_cast<const tool::ISCSIEPFileTBL*>(&content);
     if (map == nullptr && data == nullptr && table == nullptr) return;  // nothing but HEAD[0] is compared
     if (!isKind) {
-        report_.notCompared(std::string("what else concerns a ") + kind.title + ": the type is another", file.path);
+        report_.notCompared(std::string("all other rules for a ") + kind.title + ": the type is another", file.path);
     } else if (map != nullptr) {
         checkMap(file, *map);
     } else if (data != nullptr) {
@@ -143,7 +143,7 @@ void StoreCheck::checkMap(const StoreFile& file, tool::ISCSIEPFileMAP& content) 
     reportUnreadable(rules);
 }
 
-/// Where all of the store is checked, each data file is read for itself, and reported then.
+/// Where files were named. In a check of the whole store each data file is reported when it is checked itself.
 void StoreCheck::reportUnreadable(const MapRules& rules) {
     if (!files_.areNamed()) return;
     for (const auto& [number, failure] : rules.unreadable()) {

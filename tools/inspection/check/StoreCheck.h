@@ -1,4 +1,4 @@
-// The check of a store, or of some of its files: which rules are held against which file.
+// The check of a store, or of some of its files: which rules are applied to which file.
 #pragma once
 
 #include <ISCSIEPFileMAP.h>
@@ -37,7 +37,7 @@ public:
           report_(report),
           sharedExtents_(context, report) {}
 
-    /// Once. What cannot be read is reported to the context.
+    /// To be called once. What cannot be read is reported to the context.
     void run();
 
 private:
@@ -66,7 +66,7 @@ private:
     std::set<std::string> checked_;                               ///< paths on the target
     std::set<std::string> foldersWithoutVolume_;                  ///< with map files
     std::map<std::uint32_t, DataFiles> dataFiles_;                ///< by volume
-    std::set<std::string> unreadable_;                            ///< data files that were reported
+    std::set<std::string> unreadable_;                            ///< data files that have been reported
     std::map<std::string, std::optional<std::uint32_t>> tables_;  ///< extent sizes of table files that could be read
 };
 

@@ -43,8 +43,8 @@ inline std::uint64_t bitsOf(const MapEntry& entry) {
            (entry.vpulled ? EP_MAP_ENTRY_VPULLED : 0) | (entry.synced ? EP_MAP_ENTRY_SYNCED : 0) | lowBitsOf(entry);
 }
 
-/// The bits that count in both numbers, as the lowest bits of a number; and whether one of them is set. None is once it
-/// is settled to which number they belong.
+/// The ambiguous bits, which count in both numbers, shifted down to bit 0; and whether one of them is set. Once the
+/// masks of the format no longer overlap, none ever is.
 inline std::uint64_t ambiguousBitsOf(const MapEntry& entry) {
     return (entry.extentAddress & ISCSI::TOOL::EP_MAP_ENTRY_AMBIGUOUS_MASK) >> ISCSI::TOOL::EP_MAP_ENTRY_POOL_SHIFT;
 }

@@ -16,7 +16,7 @@ inline bool isSame(const MapEntry& a, const MapEntry& b) {
     return a.extentAddress == b.extentAddress && a.poolNumber == b.poolNumber && flagsOf(a) == flagsOf(b);
 }
 
-/// How two entries of one index differ; null stands for none, past the end of the file, which is as good as a hole.
+/// How two entries of one index differ. Null stands for an entry past the end of the file, which counts as a hole.
 inline Difference differenceOf(const MapEntry* a, const MapEntry* b) {
     const bool inFirst = a != nullptr && !isHole(*a);
     const bool inSecond = b != nullptr && !isHole(*b);
@@ -45,8 +45,8 @@ struct DiffRun {
 /// Compares the entries of two maps, which come block by block.
 class MapDiff {
 public:
-    /// Takes the entries of both maps from index `first` on, of a map that has ended fewer than of the other; calls
-    /// emit(run) for every run of differences that ends before the last of them.
+    /// Takes the entries of both maps from index `first` on; of a map that has ended there are fewer. Calls emit(run)
+    /// for every run of differences that ends before the last of these entries.
     template <typename Emit>
     void add(std::uint64_t first, const std::vector<MapEntry>& a, const std::vector<MapEntry>& b, Emit&& emit) {
         const auto both = std::min(a.size(), b.size());
@@ -57,7 +57,7 @@ public:
         for (std::size_t i = both; i < b.size(); ++i) compare(first + i, nullptr, &b[i], emit);
     }
 
-    /// No more entries come: calls emit() for the run that was still open.
+    /// No more entries come: calls emit() for the last run.
     template <typename Emit>
     void finish(Emit&& emit) {
         if (run_.count > 0) emit(run_);

@@ -9,7 +9,7 @@
 
 namespace inspection {
 
-/// Whether `next`, `count` entries behind the first entry of a run, continues it.
+/// Whether `next` continues a run of `count` entries, of which `first` is the first.
 inline bool continues(const MapEntry& first, std::uint64_t count, const MapEntry& next) {
     return next.extentAddress == first.extentAddress + (isHole(first) ? 0 : count) &&
            next.poolNumber == first.poolNumber && flagsOf(next) == flagsOf(first);
@@ -25,7 +25,7 @@ struct MapRun {
 /// Merges entries, which come block by block, into runs.
 class MapRuns {
 public:
-    /// Takes the entries from index `first` on; calls emit(run) for every run that ends before the last of them.
+    /// Takes the entries from index `first` on. Calls emit(run) for every run that ends before the last of them.
     template <typename Emit>
     void add(std::uint64_t first, const std::vector<MapEntry>& entries, Emit&& emit) {
         for (auto next = entries.begin(); next != entries.end();) {
@@ -41,7 +41,7 @@ public:
         }
     }
 
-    /// No more entries come: calls emit() for the run that is still open.
+    /// No more entries come: calls emit() for the last run.
     template <typename Emit>
     void finish(Emit&& emit) {
         if (run_.count > 0) emit(run_);
@@ -50,7 +50,7 @@ public:
 private:
     using Iterator = std::vector<MapEntry>::const_iterator;
 
-    /// The first of the entries from `next` on that the open run does not continue with.
+    /// The first entry from `next` on that does not continue the last run.
     Iterator endOfRun(Iterator next, Iterator end) const {
         const bool hole = isHole(run_.entry);
         const auto flags = flagsOf(run_.entry);

@@ -19,10 +19,10 @@ namespace inspection {
 struct WalkEnd {
     int error;          ///< 0, or the code of the read that failed
     int reason;         ///< the errno value of that read
-    std::uint64_t met;  ///< how many entries came before; fewer than the range holds where the file ends before
+    std::uint64_t met;  ///< how many entries came before that; fewer than in the range where the file has ended
 };
 
-/// Calls visit(index, entries) for one block after the other of the entries of `range`, as far as the file goes.
+/// Calls visit(index, entries) for one block after the other of the entries of `range`, up to the end of the file.
 /// HEAD[0] must have been decoded.
 template <typename Visit>
 WalkEnd walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, Range range, Visit&& visit) {
@@ -40,8 +40,9 @@ WalkEnd walkMap(ISCSI::TOOL::ISCSIEPFileMAP& file, Range range, Visit&& visit) {
     return {0, 0, met};
 }
 
-/// How reading entries of the file that the user called `name` ended: nothing when all came; else the failure, with the
-/// code `error` (errno was `reason`), or too early. `next` is the first entry that did not come.
+/// The failure that ended a read of entries from the file that the user called `name`; nothing when it was `complete`.
+/// `error` is the code of that read and `reason` its errno value; without them the file has become shorter. `next` is
+/// the first entry that did not come.
 inline std::optional<Failure> endOfRead(const std::string& name, std::uint64_t next, int error, int reason,
                                         bool complete) {
     const Subject place = {name, "entry " + std::to_string(next)};
@@ -50,8 +51,8 @@ inline std::optional<Failure> endOfRead(const std::string& name, std::uint64_t n
     return Failure{place, ISCSI::TOOL::EP_ERR_READ_FAILED, 0, "the file has become shorter while it was read"};
 }
 
-/// Calls each(run) for the runs of `range` of the file that the user called `name`, all of which the file held when its
-/// entries were counted, and progress(done) now and then. Returns what failed.
+/// Calls each(run) for the runs of `range`, and progress(done) now and then. The file, which the user called `name`,
+/// held all of the range when its entries were counted. Returns what failed.
 template <typename Progress, typename Each>
 std::optional<Failure> walkRuns(const std::string& name, ISCSI::TOOL::ISCSIEPFileMAP& file, Range range,
                                 Progress&& progress, Each&& each) {

@@ -13,7 +13,7 @@ namespace inspection {
 /// Entries of a run that fit a search.
 struct RunMatch {
     MapRun run;
-    std::optional<std::uint64_t> lowAddress;  ///< set where only the lowest 48 bits of the addresses fit: the first one
+    std::optional<std::uint64_t> lowAddress;  ///< the first address, where only the lowest 48 bits of the addresses fit
 };
 
 /// What is searched for; where both are given, both must fit.

@@ -12,11 +12,11 @@ namespace inspection {
 
 class ChangeWatch {
 public:
-    /// Watches the file at `hostPath`, which the user called `name`, from now on: to be made before it is first read.
+    /// Watches the file at `hostPath`, which the user called `name`. To be made before the file is first read.
     ChangeWatch(Context& context, std::string name, std::string hostPath);
 
-    /// Whether the file's size, modification time or header block is another by now, or the file itself. Tells the
-    /// context. Changes errno.
+    /// Whether the file has been replaced, or its size, modification time or header block has changed; the context is
+    /// then informed. Changes errno.
     bool noticeChange() const;
 
 private:

@@ -12,8 +12,9 @@ namespace inspection {
 
 class ChosenFiles {
 public:
-    /// The files in `names`, of a LUN id its map; all of the store where there are none. Loads the LUNs whose ids are
-    /// in `lids`, or are names, and reports what fails; but where files are named it is no news that there is no LUN.
+    /// The files in `names`, where a LUN id stands for its map; all of the store where there are no names. Loads the
+    /// LUNs with these ids and with the ids in `lids`, and reports what fails. That there is no LUN at all is not
+    /// reported where files are named, unless the user asked for `lids` or the configuration cannot be read.
     ChosenFiles(Context& context, const std::vector<LunName>& names, const Lids& lids);
 
     bool areNamed() const { return !names_.empty(); }
@@ -21,10 +22,10 @@ public:
     /// The LUNs found, lowest id first.
     const std::vector<Lun>& luns() const { return store_ ? store_->luns() : luns_; }
 
-    /// Calls each() for the files, in the order of Store::forEachFile() or as they were named, a file that is named
-    /// twice, under whatever names, once. Of a named file `path` is the name as typed or the path of the LUN's map, the
-    /// kind is null where its name tells none, and what is missing is left for the library to find. What may not be
-    /// opened is reported and left out.
+    /// Calls each() for the files, in the order of Store::forEachFile() or as they were named; once for each file, even
+    /// if it is named twice. Of a named file `path` is the name as typed or the path of the LUN's map, and the kind is
+    /// null where its name tells none. A named file that is missing is passed on; the library will fail to open it.
+    /// What may not be opened is reported and skipped.
     void forEach(const std::function<void(const StoreFile&)>& each);
 
 private:

@@ -104,7 +104,7 @@ std::variant<Collection, Failure> Collection::read(const std::string& folder, co
     const json document = json::parse(text, nullptr, false);
     if (document.is_discarded()) return damaged(list, "not JSON");
     auto collection = collectionIn(document);
-    if (!collection) return damaged(list, "not what a collection has there");
+    if (!collection) return damaged(list, "not a collection's list");
     const std::string damage = collection->damageIn(folder);
     if (!damage.empty()) return damaged(list, damage);
     return std::move(*collection);

@@ -22,7 +22,7 @@ struct CollectedFile {
     bool changed = false;     ///< while it was read
 };
 
-/// What is said of bytes that the target has and the collection has not.
+/// The message for bytes that the target has and the collection has not.
 inline constexpr const char* notCollectedText = "not in the collection, which holds no data";
 
 class Collection {
@@ -35,8 +35,8 @@ public:
     /// The name of the file in its folder.
     static constexpr const char* listName = "collection.json";
 
-    /// Reads the collection in `folder` from `list`, the file of that name there. Returns it, or why it cannot be read
-    /// or does not fit its files.
+    /// Reads the collection in `folder` from the file `list`, which has that name there. Returns it, or the failure
+    /// when it cannot be read or does not fit the files.
     static std::variant<Collection, Failure> read(const std::string& folder, const std::string& list);
 
     /// Writes "collection.json" in `folder` anew. Returns 0 or the errno value of what failed.
@@ -48,7 +48,8 @@ public:
 private:
     std::string damageIn(const std::string& folder);
 
-    std::map<std::pair<std::uint64_t, std::uint64_t>, std::uint64_t> sizes_;  ///< by device and inode, of cut files
+    std::map<std::pair<std::uint64_t, std::uint64_t>, std::uint64_t>
+        sizes_;  ///< by device and inode, of files not taken whole
 };
 
 }  // namespace inspection

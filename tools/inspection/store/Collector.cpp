@@ -10,6 +10,7 @@
 #include <tuple>
 
 #include "JsonText.h"
+#include "store/FileNames.h"
 #include "store/FileSize.h"
 #include "store/HostFile.h"
 
@@ -90,7 +91,7 @@ bool Collector::writeLuns(const std::vector<Lun>& luns) {
         text += (text.empty() ? "[\n" : ",\n") + listed(record);
         ++luns_;
     }
-    const std::string path = folder_ + "/var/db/iscsi/luns.json";
+    const std::string path = folder_ + lunListPath;
     int error = makeFoldersAbove(path);
     if (error == 0) error = writeWhole(path, (text.empty() ? "[" : text) + "\n]\n");
     return error == 0 || cannotWrite(path, error) == Outcome::taken;
@@ -174,7 +175,7 @@ Collector::Outcome Collector::copyOnce(const StoreFile& file, const std::string&
 
 bool Collector::writeList() {
     const int error = collection_.write(folder_);
-    return error == 0 || cannotWrite(folder_ + "/collection.json", error) == Outcome::taken;
+    return error == 0 || cannotWrite(pathIn(folder_, Collection::listName), error) == Outcome::taken;
 }
 
 Collector::Outcome Collector::cannotWrite(const std::string& path, int reason) {

@@ -18,19 +18,19 @@ public:
     /// made it, and when.
     Collector(Context& context, std::string folder, std::string program, std::int64_t time);
 
-    /// Once. Reports what cannot be read or written. After an interruption or a failure to write the collection stays
-    /// as far as it came. Until finish() it says that it is incomplete.
+    /// To be called once. Reports what cannot be read or written. After an interruption or a failure to write, what has
+    /// been collected stays. Until finish() the collection says that it is incomplete.
     void run(const Lids& lids);
 
-    /// Once, after run(): says whether the collection is complete. False when that cannot be written, which is
-    /// reported.
+    /// To be called once, after run(): writes down whether the collection is complete. False when that cannot be
+    /// written, which is reported.
     bool finish(bool complete);
 
     const Collection& collection() const { return collection_; }
     std::uint64_t luns() const { return luns_; }
 
 private:
-    /// How much of a file was taken, and whether it changed meanwhile; or what went wrong.
+    /// How the work on a file ended.
     enum class Outcome { taken, unreadable, stopped };
 
     bool writeLuns(const std::vector<Lun>& luns);

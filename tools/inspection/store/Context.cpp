@@ -1,7 +1,5 @@
 #include "store/Context.h"
 
-#include <etc/ISCSIEPDiagnostics.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <cstdlib>
@@ -11,8 +9,6 @@
 #include "store/FileSize.h"
 
 namespace inspection {
-
-namespace tool = ISCSI::TOOL;
 
 std::error_code Context::setRoot(const std::string& folder) {
     const std::error_code error = root.set(folder);
@@ -61,15 +57,14 @@ std::optional<std::string> Context::openablePath(const std::string& name, NamedB
 
 void Context::prepareLuns() {
     static constexpr const char* variable = "KELPISCSIEP_LUNS";  // of the stand-in for the platform's library
-    static constexpr const char* path = "/var/db/iscsi/luns.json";
-    static std::string ours;  // what another store has set is no choice of the user's
+    static std::string ours;  // a value set here for another store is not the user's choice
     if (!root.isFolder()) return;
     const char* set = std::getenv(variable);
     if (set != nullptr && set != ours) return;
     if (!lunList_) {
-        Located list = root.locate(path);
-        const auto obstacle = list.obstacle(path);
-        if (obstacle && list.error != EACCES) {  // which the system finds too, and before any link
+        Located list = root.locate(lunListPath);
+        const auto obstacle = list.obstacle(lunListPath);
+        if (obstacle && list.error != EACCES) {  // the stand-in meets that too, and before any link
             failed(*obstacle);
             list.hostPath = "/dev/null";
         }

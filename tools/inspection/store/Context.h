@@ -1,5 +1,4 @@
-// What every look at a store needs: where the store lies, and somebody who hears what went wrong and how far it has
-// come.
+// What every look at a store needs: where the store lies, and a place for failures, remarks and progress to go.
 #pragma once
 
 #include <cstdint>
@@ -14,8 +13,11 @@
 
 namespace inspection {
 
-/// Whose word the name of a file is: the user's, as it was typed, or a path of the target.
+/// Where the name of a file comes from: typed by the user, or a path of the target.
 enum class NamedBy { user, target };
+
+/// Where the stand-in for the platform's library looks for its list of LUNs.
+inline constexpr const char* lunListPath = "/var/db/iscsi/luns.json";
 
 /// Each program derives one from this. Used by one thread at a time.
 class Context {
@@ -41,7 +43,7 @@ public:
     /// cannot be told; errno then says why.
     std::optional<std::uint64_t> sizeOf(const std::string& hostPath) const;
 
-    /// Something failed; what was asked for beside it goes on.
+    /// Something failed; everything else that was asked for goes on.
     void failed(const Failure& failure) {
         ++failures_;
         report(failure);
@@ -59,20 +61,20 @@ public:
     /// Whether a long work is to end early, because the user wants so.
     virtual bool interrupted() { return false; }
 
-    /// Until the call with false, the log lines of the library are about what is only tried out: nobody needs to see
-    /// them. May be nested.
+    /// Something is only tried out, until the call with false: nobody needs to see the library's log lines about it.
+    /// May be nested.
     virtual void trying(bool begins) = 0;
 
-    /// The file that the user called `name` has changed while it was read. Remarks on it, once a file.
+    /// The file that the user called `name` has changed while it was read. Remarks on it, once per file.
     virtual void changed(const std::string& name);
 
-    /// Whether that was said of it.
+    /// Whether changed() was called for it.
     bool hasChanged(const std::string& name) const;
 
-    /// These files, in the order in which that was noticed.
+    /// All such files, in the order of the calls.
     const std::vector<std::string>& changedFiles() const { return changedFiles_; }
 
-    /// The log lines since a trial began, or since the last call. A failure that comes of the trial takes them along.
+    /// The log lines since a trial began, or since the last call: a failure that the trial ends in takes them along.
     virtual std::vector<std::string> takeTrialLog() { return {}; }
 
     /// Reports the failure of a call of the library, right after it (the system's reason is still in errno), when
@@ -82,12 +84,13 @@ public:
     /// Reports a failure that the library does not know, under its code that fits.
     void fail(const Subject& subject, std::string_view what, int error);
 
-    /// Where to open the file that messages call `name`; nothing, and a failure, when what lies there must not be
-    /// opened or, below a root folder, cannot be looked at. What is missing is left to the library to find.
+    /// Where to open the file that messages call `name`. Nothing, and a failure, when what lies there must not be
+    /// opened or, below a root folder, cannot be looked at. A missing file is no failure yet: the library will not find
+    /// it.
     std::optional<std::string> openablePath(const std::string& name, NamedBy by);
 
-    /// To be called before every look at a LUN: its list is then that of the store below the root folder, unless the
-    /// environment names one.
+    /// To be called before every look at a LUN: the LUN list is then the one below the root folder, unless the
+    /// environment names another.
     void prepareLuns();
 
 protected:

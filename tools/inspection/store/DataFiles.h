@@ -22,14 +22,14 @@ struct DataFile {
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFileDAT> file;  ///< its HEAD[0] is decoded, its type that of a data file
     std::uint64_t size = 0;                             ///< bytes of the file
     std::uint64_t dataSize = 0;                         ///< bytes from the data start offset to the end
-    std::uint64_t held = 0;                             ///< how many of these lie here: of a collection fewer
+    std::uint64_t held = 0;                             ///< how many of these are here: in a collection fewer
     bool missing = false;                               ///< nothing lies there
     std::optional<Failure> failure;                     ///< without a part; `file` is then null
 
     std::optional<ChangeWatch> watch;  ///< where somebody asks for changes
 
     FileState state;         ///< of what lay there when it was opened
-    unsigned int looks = 0;  ///< how often DataFiles had been told to look again
+    unsigned int looks = 0;  ///< how many calls of lookAgain() there had been
 };
 
 /// The data files of one volume. Opens each of them when it is asked for, and keeps those that were, up to a limit.
@@ -42,14 +42,14 @@ public:
     /// The data file `number`. The reference holds until the next call.
     const DataFile& at(std::uint64_t number);
 
-    /// From now on what at() gives is as it lies there now, looked at once for each file.
+    /// From now on at() looks at each file once more, and gives it as it is then.
     void lookAgain() { ++looks_; }
 
     /// Tells the context which of those that were opened have changed since.
     void noticeChanges() const;
 
-    /// Lists the volume's folder, once: from then on a data file that it does not hold costs no look. False when that
-    /// cannot be done, or when the path names no volume; error() then says why.
+    /// Lists the volume's folder, once. From then on at() does not look for a data file that is not in it. False when
+    /// the folder cannot be listed, as error() says, or when the path names no volume.
     bool list();
     const std::optional<Failure>& error() const { return listError_; }
 

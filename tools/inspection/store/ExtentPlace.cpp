@@ -67,7 +67,7 @@ std::optional<std::uint64_t> positionOf(std::uint64_t dataStart, std::uint64_t e
 std::optional<CountFrom> countingOf(const ExtentPlace& place, std::uint32_t extentSize, std::uint64_t offset,
                                     std::uint64_t dataSize, const PlaceChoice& choice) {
     if (choice.countFrom || place.inFile == place.inVolume) return choice.countFrom.value_or(CountFrom::file);
-    // Counted from the volume's start an extent lies further on: inside by that reading, it is so by both.
+    // Counted from the volume's start, an extent lies further on: if that place is inside the file, both are.
     if (place.inVolume * extentSize + offset < dataSize) return std::nullopt;
     return CountFrom::file;
 }

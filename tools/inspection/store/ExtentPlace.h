@@ -11,7 +11,7 @@
 
 namespace inspection {
 
-/// From where extents are counted when one is looked for in its data file.
+/// What the number of an extent in its data file counts from: the start of the file, or that of the volume.
 enum class CountFrom { file, volume };
 
 /// What the user chose where the format leaves it undecided.
@@ -20,7 +20,7 @@ struct PlaceChoice {
     std::optional<CountFrom> countFrom;
 };
 
-/// What is typed of it: a size, 48 or 52, "file" or "volume".
+/// These as they are typed: a size, 48 or 52, "file" or "volume".
 Typed<std::uint32_t> extentSizeIn(std::string_view text);
 Typed<AddressBits> addressBitsIn(std::string_view text);
 Typed<CountFrom> countFromIn(std::string_view text);

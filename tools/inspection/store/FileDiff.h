@@ -26,8 +26,8 @@ struct OpenedHeader {
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFile> file;  ///< null after a failure
 };
 
-/// Decodes the header block of the file that messages call `name`. Its kind is the one that its type tells, else its
-/// name; else only HEAD[0] is decoded, which is remarked. Reports failures.
+/// Decodes the header block of the file that messages call `name`. Its kind follows from its type, else from its name;
+/// where neither tells one, only HEAD[0] is decoded, with a remark. Reports failures.
 OpenedHeader openHeader(Context& context, const std::string& name, NamedBy by);
 
 /// A field that two header blocks hold different values of.
@@ -36,7 +36,7 @@ using FieldDifference = std::pair<HeaderField, HeaderField>;
 /// The fields in which two files of one kind differ.
 std::vector<FieldDifference> fieldDifferencesOf(const ISCSI::TOOL::ISCSIEPFile& a, const ISCSI::TOOL::ISCSIEPFile& b);
 
-/// A map whose entries are compared, and how the user called it.
+/// A map whose entries are compared, and the name that the user gave it.
 struct ComparedMap {
     Context& context;
     const std::string& name;

@@ -22,7 +22,7 @@ struct FileIdentity {
     }
 };
 
-/// Of what lies at `hostPath`, links followed; nothing when that cannot be told.
+/// Of what lies at `hostPath`, links followed; nothing when that cannot be found out.
 std::optional<FileIdentity> identityOf(const std::string& hostPath);
 
 }  // namespace inspection

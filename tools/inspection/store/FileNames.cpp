@@ -56,7 +56,7 @@ bool isMisnamed(std::string_view path) {
 }
 
 std::optional<MapName> mapNameIn(std::string_view fileName) {
-    static constexpr std::string_view end = "_00000";
+    static constexpr std::string_view end = tool::EP_MAP_NAME_END;
     const auto dash = fileName.find('-');  // no type name holds one: it is the UUID's
     if (dash == std::string_view::npos || dash <= 8 || fileName.size() < dash + 28 + end.size()) return std::nullopt;
     const auto typeName = fileName.substr(0, dash - 8);
@@ -68,7 +68,7 @@ std::optional<MapName> mapNameIn(std::string_view fileName) {
 }
 
 std::uint32_t volumeIn(std::string_view name) {
-    static constexpr std::string_view prefix = "volume";
+    static constexpr std::string_view prefix = tool::EP_VOLUME_PREFIX + 1;  // without the slash
     if (name.substr(0, prefix.size()) != prefix) return 0;
     const auto digits = name.substr(prefix.size());
     const bool plain = !digits.empty() && digits[0] >= '1' && digits[0] <= '9';

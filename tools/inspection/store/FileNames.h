@@ -19,7 +19,7 @@ inline std::string pathIn(const std::string& folder, std::string_view name) {
 /// Whether a path ends in the name of a data file, whatever follows its prefix.
 bool isDataFileName(std::string_view path);
 
-/// Whether that name is none that the target gives to a data file: the number in it has another form.
+/// Whether a path ends in such a name, but not as the target writes it: "EP_DAT_1".
 bool isMisnamed(std::string_view path);
 
 /// The number in the name of a data file, without or with folders; nothing where there is none.
@@ -35,8 +35,8 @@ struct MapName {
     std::string name;
 };
 
-/// The parts of the map file name `fileName` (without folders), nothing where they cannot be told apart: that takes a
-/// UUID of 36 characters and the usual end.
+/// The parts of the map file name `fileName` (without folders). Nothing where it has no UUID of 36 characters or not
+/// the usual end: its parts cannot be told apart then.
 std::optional<MapName> mapNameIn(std::string_view fileName);
 
 /// The number in the name of a volume's folder, 0 when it is not "volume" and a number in plain form.

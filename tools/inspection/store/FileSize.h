@@ -10,10 +10,10 @@
 
 namespace inspection {
 
-/// Its bytes, or nothing when that cannot be told; errno then says why.
+/// Its size in bytes, or nothing when that cannot be found out; errno then says why.
 std::optional<std::uint64_t> sizeOf(const std::string& path);
 
-/// What tells a file from another one, or from itself when it was longer or shorter: device, inode, size.
+/// What shows that a file was replaced, or became longer or shorter: device, inode, size.
 using FileState = std::tuple<std::uint64_t, std::uint64_t, std::uint64_t>;
 
 /// The state of what lies at `path`; all zero when nothing does.

@@ -1,4 +1,4 @@
-// Files that belong to this machine: what is written here, never to those of a store.
+// Reading and writing whole files of this machine. Files of a store are only read.
 #pragma once
 
 #include <cstddef>

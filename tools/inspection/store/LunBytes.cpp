@@ -118,7 +118,7 @@ void LunBytes::forEachPart(std::uint64_t offset, std::uint64_t length, const Eac
             runs.add(first, entries, add);
             runs.finish(add);
         }
-        // Also what could go on: a long work is then heard of now and then.
+        // Handed out even if the next entries could continue it, so that each() is called now and then.
         if (!goOn || !parts.flush()) return;
     }
     const Failure pastMap = lun_.pastMap("");
@@ -127,8 +127,8 @@ void LunBytes::forEachPart(std::uint64_t offset, std::uint64_t length, const Eac
     }
 }
 
-/// Reads entries from `first` on, up to `last` at most, some of them at once: none where the file has ended. After a
-/// failure, which concerns those from `first` on, `entries` are as many as are lost.
+/// Reads some of the entries from `first` to `last`; none where the file has ended. After a failure `entries` has the
+/// size of what is lost, from `first` on.
 int LunBytes::readEntries(std::uint64_t first, std::uint64_t last, std::vector<MapEntry>& entries) {
     const std::uint64_t wanted = std::min(last - first + 1, entriesAtOnce);
     entries.clear();
@@ -166,7 +166,8 @@ bool LunBytes::addRun(Parts& parts, const MapRun& run) {
 
 /// Of extents in one data file, `length` bytes from `offset` in the first one.
 bool LunBytes::addExtents(Parts& parts, const ExtentPlace& place, std::uint64_t offset, std::uint64_t length) {
-    const DataFile& data = files_.at(place.dataFile);  // until a part is added: reading one may look for the file again
+    const DataFile& data =
+        files_.at(place.dataFile);  // holds until a part is added: reading it may open the file again
     if (data.failure) return parts.addUnreadable(length, *data.failure);
     std::uint64_t ambiguous = 0;
     auto counting = countingOf(place, lun_.extentSize, offset, data.dataSize, choice_);

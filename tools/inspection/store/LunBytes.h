@@ -19,7 +19,7 @@ struct LunPart {
     enum class Kind {
         data,       ///< lie together in a data file
         hole,       ///< not mapped: they read as zeros
-        unreadable  ///< nobody knows them
+        unreadable  ///< cannot be read, or their place is ambiguous
     };
 
     Kind kind;
@@ -40,9 +40,9 @@ struct LunPart {
     bool continuesWith(const LunPart& next) const;
 };
 
-/// Reads a LUN in constant memory. Nothing is held open, and what changed under it since an earlier call is seen: a
-/// failure concerns only the bytes that cannot be had. Used by one thread at a time, with a Context and a LunMap that
-/// no other thread uses: for each thread one of each.
+/// Reads a LUN in constant memory. No file is held open, so each call sees the files as they are then. A failure
+/// concerns only the bytes that cannot be read. Used by one thread at a time; each thread needs a Context and a LunMap
+/// of its own.
 class LunBytes {
 public:
     /// Takes parts in their order; returns whether to go on.
@@ -51,7 +51,7 @@ public:
     /// `lun` must live as long as this.
     LunBytes(Context& context, const LunMap& lun, const PlaceChoice& choice);
 
-    /// Calls each() for the parts of the `length` bytes from `offset` on, which lie inside the LUN. They are told from
+    /// Calls each() for the parts of the `length` bytes from `offset` on, which lie inside the LUN. These follow from
     /// the map and from the sizes of the data files; no byte of the LUN is read. Neighbouring parts may be alike.
     void forEachPart(std::uint64_t offset, std::uint64_t length, const Each& each);
 

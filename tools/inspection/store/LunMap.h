@@ -17,7 +17,7 @@ namespace inspection {
 
 struct LunMap {
     std::vector<std::uint32_t> lids;  ///< of the LUNs whose map it is, as far as they are known
-    std::string file;                 ///< the map file as the user typed it, or as the configuration tells it
+    std::string file;                 ///< the map file as the user typed it, or as the configuration names it
     std::string targetPath;           ///< the same on the target
     std::unique_ptr<ISCSI::TOOL::ISCSIEPFileMAP> map;  ///< its HEAD[0] is decoded
     std::uint32_t extentSize = 0;                      ///< never 0
@@ -34,7 +34,7 @@ struct LunMap {
     /// How messages name a part of the LUN, "byte 5": with the first id where one is known, else with the file.
     Subject subject(const std::string& part) const;
 
-    /// The failure of `part`, which lies past the end of the LUN, and past the last entry of the map.
+    /// The failures to find `part` past the end of the LUN, and past the last entry of the map.
     Failure pastEnd(const std::string& part) const;
     Failure pastMap(const std::string& part) const;
 };

@@ -35,7 +35,7 @@ std::optional<Miss> tryLun(Context& context, std::uint64_t lid, Lun& lun) {
 
 Failure failureOf(const Miss& miss) { return {subjectOf({miss.lid, miss.lid}), miss.error, miss.reason, {}, miss.log}; }
 
-/// ": " and what the platform's library says of its code, where it says anything.
+/// ": " and the platform's library's text for its code; empty where it has none.
 std::string textOf(int error) {
     const std::string text = tool::ISCSILUNConfInfo::getErrorText(error);
     return text.empty() ? text : ": " + text;

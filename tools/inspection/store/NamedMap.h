@@ -25,7 +25,7 @@ struct NamedMap {
     NamedBy by;              ///< which of the two `file` is
     std::string targetPath;  ///< on the target, in plain form
     std::vector<Lun> luns;   ///< whose map it is: the LUN named by its id, or all that are known, lowest id first
-    std::vector<Failure> failures;  ///< why more LUNs may be of this map; not reported
+    std::vector<Failure> failures;  ///< of LUNs that may have this map too; not reported yet
 
     std::vector<std::uint32_t> lids() const;
 };

@@ -19,7 +19,7 @@ struct OpenedMap {
     std::optional<ChangeWatch> watch;                   ///< from before it was opened; to be asked after the walk
 };
 
-/// Opens the map file that messages call `name` and says what is doubtful about it. Reports failures.
+/// Opens the map file that messages call `name` and remarks on what is doubtful about it. Reports failures.
 OpenedMap openMap(Context& context, const std::string& name, NamedBy by);
 
 /// Calls each(run) for all `entries` entries of the map file that messages call `name`, and shows the progress. Returns

@@ -21,9 +21,9 @@ struct PathEnd {
     std::string link;  ///< LastLink::keep: what is stored in the link that lies there
 };
 
-/// Walks `path`, which is taken as absolute, below `folder`. Each step is one of the system, so that the length of the
-/// way does not matter; as in the system more than 40 links are too many (ELOOP). `..` in the folder itself stays
-/// there, in `path` and in an absolute link; a relative link that climbs above it leads out.
+/// Walks `path`, which is taken as absolute, below `folder`. Each step is a call of the system by itself, so the way
+/// may be of any length. As in the system, more than 40 links are too many (ELOOP). In `path` and in an absolute link,
+/// `..` in the folder itself stays there; a relative link that climbs above the folder leads out.
 PathEnd walkPath(const std::string& folder, const std::string& path, LastLink last);
 
 }  // namespace inspection

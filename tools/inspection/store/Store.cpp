@@ -20,8 +20,8 @@ namespace {
 constexpr std::uint64_t journalPlace = 0;
 constexpr std::uint64_t noVolumePlace = std::numeric_limits<std::uint64_t>::max();
 
-/// The order of files in a folder: the table first, data files last and by number, what is only called like them behind
-/// them, the others by name.
+/// The order of files in a folder: the table first, then the others by name, then data files by number, and last what
+/// is only named like them.
 bool precedes(const std::string& one, const std::string& other) {
     const auto rank = [](const std::string& name) -> std::size_t {
         if (name == tool::EP_TBL_FILE_NAME) return 0;
@@ -78,8 +78,9 @@ Store::Store(Context& context, std::vector<Lun> luns) : context_(context), luns_
     for (const std::string& name : namesIn("/")) {
         const std::uint32_t volume = volumeIn(name);
         if (volume == 0) continue;
-        folders_[{volume, "/" + name + "/@iSCSI/EP"}];
-        folders_[{volume, "/" + name + "/@iSCSI/LUN"}];
+        for (const std::string_view folder : {tool::EP_VOLUME_FOLDER, tool::EP_MAP_FOLDER}) {
+            folders_[{volume, "/" + name + std::string(folder.substr(0, folder.size() - 1))}];
+        }
     }
 }
 
@@ -93,7 +94,7 @@ void Store::reportOnce(const Failure& failure) {
     if (reported_.insert(failure.subject.file).second) context_.failed(failure);
 }
 
-/// What could be listed of a folder.
+/// The names in a folder, as far as it could be listed.
 std::vector<std::string> Store::namesIn(const std::string& folder) {
     Listing listing = listFolder(context_, folder);
     if (listing.failure) reportOnce(*listing.failure);
@@ -110,7 +111,7 @@ std::vector<std::string> Store::storeFilesIn(const std::string& folder, std::set
 }
 
 /// The file at `path` of the target. Nothing when it may not be opened, which is reported, or when it is a folder that
-/// merely happens to lie there.
+/// no LUN is expected to have there.
 std::optional<StoreFile> Store::fileAt(const std::string& path, bool isExpected) {
     const Located located = context_.root.locate(path);
     if (located.isFolder() && !isExpected && mayHaveAnyName(path)) return std::nullopt;
@@ -137,7 +138,7 @@ std::optional<StoreFile> Store::fileAt(const std::string& path, bool isExpected)
     return file;
 }
 
-/// What the names and the configuration tell of a file.
+/// Fills in what follows from the file's name and from the configuration.
 void Store::describe(StoreFile& file) {
     file.luns = lunsByMap_.at(file.targetPath);
     const Lun* lun = file.lun();

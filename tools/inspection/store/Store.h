@@ -29,15 +29,15 @@ void failEmptyStore(Context& context);
 /// A file of the store.
 struct StoreFile {
     const FileKind* kind = nullptr;  ///< what its name tells; null where it tells none, as a file named by the user may
-    std::string path;                ///< what messages call it; of a file that was not named by the user on the target
-    NamedBy by = NamedBy::target;    ///< whose name `path` is
+    std::string path;                ///< what messages call it: its path on the target, unless the user named it
+    NamedBy by = NamedBy::target;    ///< where `path` comes from
     std::string targetPath;          ///< on the target, in plain form
     std::string hostPath;            ///< where it is to be opened here
     std::uint64_t size = 0;
     std::optional<FileIdentity> identity;  ///< nothing where it is missing
     bool missing = false;                  ///< nothing is there, though a LUN should have it or a link leads there
     std::uint32_t volume = 0;              ///< 0: on no volume
-    bool misnamed = false;                 ///< called like a data file, but not as the target calls one
+    bool misnamed = false;                 ///< named like a data file, but not as the target names one
     std::optional<std::string> link;       ///< what is stored in the link that lies there, if it is one
     std::string sameAs;                    ///< the path of an earlier file that is the same one, under another name
     std::vector<const Lun*> luns;          ///< of a map file: whose it is by the configuration, lowest id first
@@ -62,7 +62,7 @@ public:
     /// Calls each() for the files, whose bytes are not read: journal, then volume by volume table, free-index, data and
     /// map files, then map files on no volume. Those that a configured LUN should have (its map file, the table and
     /// free-index file of its volume, the journal) are among them when they are missing. What may not be opened or
-    /// cannot be looked at is reported and left out; a folder that is closed is reported once, whatever lies in it.
+    /// cannot be looked at is reported and skipped; a folder that is closed is reported once, whatever lies in it.
     void forEachFile(const std::function<void(const StoreFile&)>& each);
 
 private:

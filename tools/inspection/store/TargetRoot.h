@@ -15,8 +15,8 @@ struct Located {
     std::string hostPath;        ///< where to open it; below a root folder a path without links
     int error = 0;               ///< the errno value of the look at it
     bool leadsOut = false;       ///< a link leads out of the root folder
-    bool dangling = false;       ///< `error` was met on the way of a link; of paths of the target
-    std::string closed;          ///< the folder of the target that may not be looked into; of paths of the target
+    bool dangling = false;       ///< `error` was met while a link was followed; set for paths of the target only
+    std::string closed;          ///< the folder that may not be looked into; set for paths of the target only
     unsigned int mode = 0;       ///< st_mode, 0 after an error
     FileIdentity identity = {};  ///< set where there is no error
 
@@ -58,7 +58,7 @@ public:
     /// What is stored in the link that lies at `path` of the target; nothing when that is no link.
     std::optional<std::string> linkAt(const std::string& path) const;
 
-    /// What is at `path` of the target below the root folder, links aside. May not be opened just so.
+    /// Where `path` of the target is here, links not followed. Not to be opened: a link there may lead out.
     std::string hostPath(const std::string& path) const { return root_ + path; }
 
 private:

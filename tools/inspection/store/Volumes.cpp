@@ -30,6 +30,7 @@ Volumes::Volumes(Context& context, const VolumesChoice& choice)
     } else {
         chosen_.forEach([this](const StoreFile& file) { addFile(file); });
     }
+    for (const VolumeMap& map : maps_) volumeOf(map.file).maps.push_back(map);
     const bool complete = context.failures() == failuresBefore_;
     for (auto& [key, volume] : volumes_) {
         volume.complete = complete;
@@ -60,15 +61,15 @@ Volume& Volumes::volumeOf(const StoreFile& file) {
 void Volumes::findNamed() {
     chosen_.forEach([this](const StoreFile& file) {
         if (file.identity) notYetListed_.insert(*file.identity);
-        volumeOf(file).maps.push_back({file, {}, true});
+        volumeOf(file);
+        addMap(file, true);
     });
     store_.emplace(context_, chosen_.luns());
     store_->forEachFile([this](const StoreFile& file) {
         if (volumes_.count(keyOf(file)) > 0) addFile(file);
     });
-    for (const auto& [key, volume] : volumes_) {
-        for (const VolumeMap& map : volume.maps) {
-            if (volume.number != 0 || !map.file.identity || notYetListed_.count(*map.file.identity) == 0) continue;
+    for (const VolumeMap& map : maps_) {
+        if (map.file.volume == 0 && map.file.identity && notYetListed_.count(*map.file.identity) > 0) {
             context_.fail({map.file.path, ""},
                           "its path names no volume: which other maps share its extents is not known",
                           tool::EP_ERR_NO_PATH);
@@ -84,16 +85,34 @@ void Volumes::addFile(const StoreFile& file) {
         return;
     }
     if (!isOfType(file, tool::EP_FILE_TYPE_MAP)) return;
-    std::vector<VolumeMap>& maps = volumeOf(file).maps;
-    if (!file.sameAs.empty()) {
-        context_.remark(file.path, "the same file as " + file.sameAs + ", which counts once");
-        return;
+    const auto place = file.identity ? places_.find(*file.identity) : places_.end();
+    if (place != places_.end()) return addName(maps_[place->second], file);
+    const bool isNamed = file.missing && std::any_of(maps_.begin(), maps_.end(), [&file](const VolumeMap& map) {
+                             return map.file.targetPath == file.targetPath;
+                         });
+    if (!isNamed) addMap(file, !chosen_.areNamed());
+}
+
+void Volumes::addMap(const StoreFile& file, bool asked) {
+    if (file.identity) places_.emplace(*file.identity, maps_.size());
+    maps_.push_back({file, {}, asked});
+}
+
+/// Takes what another name of a map tells of its LUNs. By which name the map goes: the one that the user typed, else
+/// one that a LUN has.
+void Volumes::addName(VolumeMap& map, const StoreFile& file) {
+    if (notYetListed_.erase(*file.identity) == 0) {
+        context_.remark(file.path, "the same file as " + map.file.path + ", which counts once");
     }
-    const bool isNamed = file.identity ? notYetListed_.erase(*file.identity) > 0
-                                       : std::any_of(maps.begin(), maps.end(), [&file](const VolumeMap& map) {
-                                             return map.file.targetPath == file.targetPath;
-                                         });
-    if (!isNamed) maps.push_back({file, {}, !chosen_.areNamed()});
+    std::vector<const Lun*> luns = map.file.luns;
+    for (const Lun* lun : file.luns) {
+        const auto place = std::lower_bound(luns.begin(), luns.end(), lun, [](const Lun* one, const Lun* other) {
+            return one->record.lid < other->record.lid;
+        });
+        if (place == luns.end() || (*place)->record.lid != lun->record.lid) luns.insert(place, lun);
+    }
+    if (map.file.luns.empty() && !file.luns.empty() && !chosen_.areNamed()) map.file = file;
+    map.file.luns = std::move(luns);
 }
 
 /// A map whose extent size is not known cannot be held against the others.

@@ -1,6 +1,7 @@
 // The volumes of a store: their map files, with the bytes of an extent of each, and their data files.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <map>
 #include <optional>
@@ -62,6 +63,8 @@ private:
 
     static Key keyOf(const StoreFile& file);
     Volume& volumeOf(const StoreFile& file);
+    void addMap(const StoreFile& file, bool asked);
+    void addName(VolumeMap& map, const StoreFile& file);
     void findNamed();
     void addFile(const StoreFile& file);
     void settleSizes(Volume& volume);
@@ -71,9 +74,11 @@ private:
     const VolumesChoice& choice_;
     std::uint64_t failuresBefore_;
     ChosenFiles chosen_;
-    std::optional<Store> store_;           ///< beside named maps
-    std::set<FileIdentity> notYetListed_;  ///< named maps that the store has not listed
+    std::optional<Store> store_;  ///< beside named maps
     std::map<Key, Volume> volumes_;
+    std::vector<VolumeMap> maps_;                 ///< of all volumes, until all are known
+    std::map<FileIdentity, std::size_t> places_;  ///< of files among them
+    std::set<FileIdentity> notYetListed_;         ///< named maps that the store has not listed
     bool any_ = false;
 };
 
