@@ -64,7 +64,7 @@ const Case cases[] = {
      says({"LUN 9" + noSuchLun, "LUN 3-5: none is known: No such LUN (code 9001)"})},
     {"says which LUNs of a range are broken", "KELPISCSIEP_LUNS=luns.json epinspect lun 8-10 --json", 1,
      R"(…,"lid":8,…,"type":0,…}…{"kind":"error","file":null,"lid":9,"error":null,"code":…,"message":"LUN 9: …"})" "\n",
-     says({"LUN 9" + noLun + "The LUN list holds a value of the wrong type,…"})},
+     says({"LUN 9" + noLun + "The LUN list luns.json holds a value of the wrong type,…"})},
 
     {"tells where files lie", "for a in 'tbl /volume1/x' 'fri /volume2/@iSCSI/LUN/x' jnl 'jnl x' 'map 2 --root store' "
      "'dat /volume3/x --extent-size 1M --extent-address 4194303' 'dat /volume3/x --extent-size 1M --extent-address "
@@ -74,7 +74,7 @@ const Case cases[] = {
     {"takes the volume from the path on the target", "epinspect --root store path tbl store/./volume1/x; "
      "epinspect path fri store/volume1/x; epinspect path map 1 --root .", 1, "/volume1/@iSCSI/EP/EP_TBL\n",
      says({"store/volume1/x: path names no volume (EP_ERR_NO_PATH, 18990401)",
-           "LUN 1" + noLun + "The LUN list is missing or cannot be read: No such file or directory (code 9002)"})},
+           "LUN 1" + noLun + "The LUN list ./var/db/iscsi/luns.json is missing or cannot be read: No such file or directory (code 9002)"})},
     {"refuses extent addresses without a position", "for a in '8796093022207 --extent-size 1M' "
      "'8796093022208 --extent-size 1M' '9223372036854775808 --extent-size 1'; do "
      "epinspect path dat /volume1/x --extent-address $a; done", 1,
@@ -86,7 +86,7 @@ const Case cases[] = {
     {"looks for the LUN list below root only", "mkdir -p r/var/db/iscsi; ln -s ../../../../luns.json r/var/db/iscsi; "
      "epinspect --root r/ lun 7 8", 1, "",
      says({"/var/db/iscsi/luns.json" + leadsOut,
-           "LUN 7" + noLun + "The LUN list is missing or cannot be read: Invalid argument (code 9002)", "LUN 8…"})},
+           "LUN 7" + noLun + "The LUN list /dev/null is missing or cannot be read: Invalid argument (code 9002)", "LUN 8…"})},
     {"refuses links out of root", "mkdir r; cp data r/EP_DAT_1; ln -s EP_DAT_1 r/EP_DAT_2; ln -s ../data r/out; "
      "ln -s out r/in; cp data r2; ln -s ../r2 r/beside; epinspect --root r dump --json EP_DAT_1 EP_DAT_2 out in beside",
      1, "{\"kind\":\"dat\",…\n{\"kind\":\"dat\",…\n{\"kind\":\"error\",…{\"kind\":\"error\",…{\"kind\":\"error\",…\n",
@@ -103,7 +103,7 @@ const Case cases[] = {
     usage("map -- x --y", "unexpected argument: '--y'", " map"),
     usage("map x --chart --json", "--chart excludes --json", " map"),
     usage("dump --as foo x", "--as: 'foo': not one of tbl, dat, fri, jnl, map, head", " dump"),
-    usage("dump x ''", "FILE: '': must not be empty", " dump"),
+    usage("dump x ''", "FILE: '': must not be empty", " dump"), usage("map ''", "MAP: '': must not be empty", " map"),
     usage("entry x -1", "INDEX: '-1': not a number, nor FIRST-LAST", " entry"),
     usage("lun 9-8", "LID: '9-8': range runs backwards", " lun"),
     usage("locate 1 5X", "OFFSET: '5X': not a size; K, M, G, T, KiB, MiB, GiB or TiB may follow a number", " locate"),

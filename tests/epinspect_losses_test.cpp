@@ -39,11 +39,14 @@ const Case cases[] = {
      "epinspect: --root: 'none': No such file or directory. Try …\n"
      "epinspect: LUN 0-255: none is known: …\nepinspect: none: no EP files found (EP_ERR_NO_PATH, 18990401)\n"},
     {"the table of a map that is named, which another file replaces or which is gone",
-     "cd own; E=volume2/@iSCSI/EP M=volume2/@iSCSI/LUN; cp $M/* $E/EP_TBL;"
+     "cd own; E=volume2/@iSCSI/EP M=volume2/@iSCSI/LUN; cp $E/EP_TBL EP; cp $M/* $E/EP_TBL;"
      "epinspect --root . check $E/EP_TBL $M/* | head -n 1; rm $E/EP_TBL; epinspect --root . check $M/* | head -n 1; "
+     "printf '\\3' | dd of=EP bs=1 seek=16 conv=notrunc status=none; mv EP $E/EP_TBL; epinspect --root . check 2; rm $E/EP_TBL; "
      "cp var/db/iscsi/EP_JNL $E/EP_DAT_00000; epinspect --root . check $M/*", 1,
      "volume2/@iSCSI/EP/EP_TBL: kind: type 4, a map file, but named like a table file\n"
-     "/volume2/@iSCSI/EP/EP_TBL: LUN 2: missing-file: no file, but this LUN needs it\n…",
+     "/volume2/@iSCSI/EP/EP_TBL: LUN 2: missing-file: no file, but this LUN needs it\n"
+     "/volume2/@iSCSI/EP/EP_TBL: kind: type 3, a data file, but named like a table file\n"
+     "1 file, 256 entries, 1 finding: 1 kind\n" + uncompared + "/volume2/@iSCSI/EP/EP_TBL\n…",
      "epinspect: /volume2/@iSCSI/EP/EP_DAT_00000" + wrongType + "\n"},
     {"a table that a journal replaces",
      "cp own/var/db/iscsi/EP_JNL own/volume1/@iSCSI/EP/EP_TBL; epinspect --root own check", 3,

@@ -6,14 +6,17 @@
 #include "ProgramTest.h"
 
 // The platform's library, for the program as a function of the test: LUN 1 is fine, LUN 2 is damaged. Ids without a LUN
-// get -5, those above 65535 -6; with `down` every id gets -8.
-static bool down = false, rewritten = false;
+// get -5, those above 65535 -6; with `down` every id gets -8, with `comesAndGoes` -9 but for
+// LUN 1 and large ids right after it.
+static bool down = false, rewritten = false, comesAndGoes = false, isThere = false;
 static int reason = 0;  ///< errno for ids without a LUN
 static unsigned int loadsOfLun2 = 0, unused = 0;
 
 extern "C" __attribute__((visibility("default"))) int KELPiSCSILunGetByLid(unsigned int lid, int, void* record) {
     errno = lid == 2 ? EIO : reason;
     if (down) return -8;
+    isThere = lid == 1 || (isThere && lid > 65535);
+    if (comesAndGoes && !isThere) return -9;
     if (lid == 2) return ++loadsOfLun2 == 1 ? -7 : 0;
     if (lid == 1) std::memcpy(static_cast<char*>(record) + 118, "/volume1", 8);
     if (lid > 65535 && rewritten) return ++unused > 20 ? -9 : -6;
@@ -45,10 +48,12 @@ const std::string list = "store/var/db/iscsi/luns.json",
                       "s/volume2/volume1/; s/: 7/: 263/' " +
                       list + " >s/var/db/iscsi/luns.json; ";
 const std::string lun9 =
-    "LUN 9: configuration cannot be loaded: The LUN list holds a value of the wrong type, or one that does not fit its "
-    "field (code 9004)";
-const std::string none9003 = " is known: The LUN list is not a JSON array: Bad message (code 9003)\n";
-const std::string noList = "The LUN list is missing or cannot be read: ", notKnown = "LUN 0-255: none is known: ";
+    "LUN 9: configuration cannot be loaded: The LUN list s/var/db/iscsi/luns.json holds a value of the wrong type, or "
+    "one that does not fit its field: Bad message (code 9004)";
+const std::string none9003 =
+    " is known: The LUN list s/var/db/iscsi/luns.json is not a JSON array: Bad message (code 9003)\n";
+const std::string noList = "The LUN list s/var/db/iscsi/luns.json is missing or cannot be read: ",
+                  notKnown = "LUN 0-255: none is known: ";
 
 // clang-format off
 const Case cases[] = {
@@ -63,16 +68,20 @@ const Case cases[] = {
      "…\n", ""},
     {"takes a file of digits after a dot", "cp store" + map1 + " 7; epinspect map ./7 | tail -n 1; epinspect map 7", 1,
      "4096 entries in …\n",
-     says({"LUN 7: configuration cannot be loaded: " + noList + "No such file or directory (code 9002)"})},
+     says({"LUN 7: configuration cannot be loaded: The LUN list /var/db/iscsi/luns.json is missing or cannot be read: "
+     "No such file or directory (code 9002)"})},
     {"keeps all LUNs that have a map", twoLuns + "epinspect --root s find --extent 0 --luns 1-300 --json | head -n 2;"
      " epinspect --root s find --extent 0 --luns 1-300 | head -n 1;"
      "epinspect --root s list --luns 300 | grep LUN; epinspect --root s locate " + map1 +
-     " 0 | head -n 1; epinspect --root s diff 300 1 --json | tail -n 1", 0,
+     " 0 | head -n 1; epinspect --root s diff 300 1 --json | tail -n 1; "
+     "epinspect --root s check --luns 10-300 | grep -o 'LUN [0-9]*: [a-z]*-[a-z]*';"
+     " epinspect --root s check --luns 1-300 2>out | grep -o 'LUN 300: [a-z]*-[a-z]*'", 0,
      "{\"kind\":\"error\",\"file\":null,\"lid\":9,\"error\":null,\"code\":9004,…\n{\"kind\":\"match\",\"file\":\"" +
      map1 + "\",\"lid\":1,\"lids\":[1,300],\"first\":0,…\n" +
      map1 + ": LUNs 1, 300: 0: mapped…\nmap         57344  LUN 300 …\nLUN 1 byte 0: …\n"
      "{\"kind\":\"summary\",\"file\":\"" + map1 + "\",\"lid\":300,\"otherFile\":\"" + map1 +
-     "\",\"otherLid\":1,…\n", says({lun9, lun9})},
+     "\",\"otherLid\":1,…\nLUN 300: lun-size\nLUN 300: beyond-data\nLUN 300: extent-size\nLUN 300: lun-size\n"
+     "LUN 300: extent-size\nLUN 300: same-map\n", says({lun9, lun9})},
     {"reports a damaged LUN", twoLuns + "for c in 'lun 8-10' list check 'find --extent 7' 'check 1';"
      " do epinspect -v --root s $c | tail -n 1; done", 0, "…1 match of 1 entry\n…",
      "epinspect: iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig …lid: 9 ,…\nepinspect: " + lun9 + "\nepinspect: iSCSI:…" +
@@ -92,12 +101,24 @@ const Case cases[] = {
      "(EP_ERR_BAD_EXTENT_SIZE, 18990507)"})},
     {"fails on a LUN list of no use", "epsample s; L=s/var/db/iscsi/luns.json; echo [ >$L;"
      " for c in list check 'find --extent 0' 'find " + map1 + " --extent 0' 'locate " + map1 + " 0' 'map " + map1 +
-     "'; do epinspect --root s $c 2>err >out; echo $? $(sed 's/.*: none//' err); done; rm $L; mkdir $L;"
+     "'; do "
+     "epinspect --root s $c 2>err >out; echo $? $(sed 's/.*: none//' err); done; rm $L; mkdir $L;"
      " epinspect --root s check >out; echo $?; rmdir $L; echo '[]' >$L; epinspect --root s list >out; echo $?; "
      "epinspect --root s list --luns 3-4 >out", 1, "1" + none9003 + "1" + none9003 + "1" + none9003 + "1" + none9003 +
      "1 is known:…not known, give --extent-size…\n0\n1\n0\n",
      says({notKnown + noList + "Invalid argument (code 9002)", notKnown + "No such LUN (code 9001)",
      "LUN 3-4: none is known: No such LUN (code 9001)"})},
+    {"loses no LUN of a damaged LUN list without a word", "epsample s; cd s/var/db/iscsi; L=luns.json; cp $L good;"
+     " T='epinspect --root ../../..'; "
+     "t() { for c in check 'check " + map1 + "' 'lun 1-2'; do $T $c >out; echo -n $?; done; };"
+     " sed 's/^\\]/, {}]/' good >$L; t; echo '[{}]' >$L; t; "
+     "sed 's/name\": /&5, \"x\": /' good >$L; t; rm $L; ln -s none $L; t; "
+     "export KELPISCSIEP_LUNS=none; t", 0, "110111111111111", "…"},
+    {"looks for every map of a LUN", "epsample s; rm s/volume2/@iSCSI/LUN/*; epinspect --root s find --pool 16 |"
+     " tail -n 1; epinspect --root s find --pool 16 >out", 1,
+     "4096 entries in 1 map: 3 matches of 768 entries\n", says({
+     "/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000" + missing,
+     "/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000" + missing})},
 };
 // clang-format on
 
@@ -118,6 +139,11 @@ TEST_F(Luns, AreToldFromIdsWithoutOne) {
         says({damaged,
               "LUN 0-255: some may be missing, the answer for ids without a LUN has changed meanwhile (code -9)"}));
     rewritten = false;
+    comesAndGoes = true;
+    expectHere(
+        {"", "lun", "0-2"}, 1,
+        says({"LUN 0-2: some may be missing, the answer for ids without a LUN has changed meanwhile (code -6)"}));
+    comesAndGoes = false;
     down = true;
     const std::string noFiles = "…no EP files there…", none = "LUN 0-255: none is known: out of service";
     for (const int system : {0, ENOENT, EACCES}) {

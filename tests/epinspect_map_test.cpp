@@ -83,7 +83,8 @@ const Case cases[] = {
      "4095: unmapped, pool 2615, extent 2029926973911601\n", says({"many: entry 4096" +
      missing, "many: has changed while it was read"})},
     {"says where entries became unreadable", meanwhile("epinspect entry many 1-9999", "rm many"), 1,
-     "4096: pool number: 2615 ,…\n", says({"many: entry 4097" + missing})},
+     "4096: pool number: 2615 ,…\n", says({"many: entry 4097" + missing,
+     "many: has changed while it was read"})},
     {"says when a map became shorter", meanwhile("epinspect map many --json", "truncate -s 57344 many"), 1,
      "{\"kind\":\"error\",\"file\":\"many\",\"error\":\"EP_ERR_READ_FAILED\",\"code\":18990039,…",
      says({"many: entry 4096: the file has become shorter while it was read (EP_ERR_READ_FAILED, 18990039)",

@@ -99,12 +99,12 @@ TEST(Program, SaysThatMemoryRanOut) {
 }
 
 /// The exit status of a run in which memory lasts for so many pieces, and not for the next one.
-int statusOfList(const char* root, std::uint64_t pieces) {
+int statusOf(const std::vector<const char*>& words, std::uint64_t pieces) {
     const pid_t child = fork();
     if (child == 0) {
         dup2(open("/dev/null", O_WRONLY), STDOUT_FILENO);
         dup2(STDOUT_FILENO, STDERR_FILENO);
-        _exit(runHere({"epinspect", "--root", root, "list", "--luns", "1-2"}, [pieces] { memoryLeft = pieces; }));
+        _exit(runHere(words, [pieces] { memoryLeft = pieces; }));
     }
     int status = 0;
     EXPECT_EQ(child, waitpid(child, &status, 0));
@@ -118,9 +118,15 @@ TEST_F(ProgramOnStore, EndsInOrderWhereverMemoryRunsOut) {
     unsetenv("KELPISCSIEP_LUNS");
     std::uint64_t pieces = 0;
     int status = 1;
-    for (; status == 1; ++pieces) status = statusOfList(root.c_str(), pieces);
+    for (; status == 1; ++pieces) {
+        status = statusOf({"epinspect", "--root", root.c_str(), "list", "--luns", "1-2"}, pieces);
+    }
     EXPECT_EQ(0, status) << pieces;
     EXPECT_GT(pieces, 300U);
+    write("full/a name of some length", EPFileBuilder::table());
+    const std::string full = path("full");
+    for (pieces = 0; pieces < 300; ++pieces)
+        EXPECT_EQ(1, statusOf({"epinspect", "collect", full.c_str()}, pieces)) << pieces;
 }
 
 TEST(CommandLine, TakesNoShortOptionWithAValue) {

@@ -34,7 +34,8 @@ const std::string denied = ": cannot be opened: Permission denied" + openFailed;
 const std::string leadsOut = ": cannot be opened: a link leads out of the folder of --root" + openFailed;
 const std::string tooMany = ": cannot be opened: Too many levels of symbolic links" + openFailed;
 const std::string noList =
-    "LUN 3: configuration cannot be loaded: The LUN list is missing or cannot be read: Invalid argument (code 9002)";
+    "LUN 3: configuration cannot be loaded: The LUN list /dev/null is missing or cannot be read: Invalid argument "
+    "(code 9002)";
 const std::string ep = "/volume1/@iSCSI/EP/", table = ep + "EP_TBL", map = "/volume1/@iSCSI/LUN/THINun_00000";
 const std::string in = "tSize\":4369\n", refused = "\"error\":\"EP_ERR_OPEN_FAILED\n";
 const std::string abc = "map         24584  1 entry  /volume1/@iSCSI/LUN/a  b  c\n";
@@ -83,11 +84,12 @@ const Case cases[] = {
      "epinspect --root r $c; done | grep -ac 'LUN 3'", 0, "2\n",
      "…LUN 3 bytes 0-4095: path names no volume (EP_ERR_NO_PATH, 18990401)\n…"},
     {"a map is missing only where nothing is", lun + closed + "mkdir -p r/volume1/@iSCSI/LUN; cp map r" + map +
-     "; for p in /../../volume1 volume1 /volume1/@iSCSI/.. /volume3; do lun $p; epinspect --root r lun 3 --json; "
+     "; for p in /../../volume1 volume1 /volume1/@iSCSI/.. /volume3 $(printf %0256d 0); do lun $p; epinspect --root r lun 3 --json; "
      "done | grep -o 'missing.*'; lun /volume1; chmod 644 r/volume1/@iSCSI; "
      "(closed epinspect --root r lun 3 --json); s=$?; chmod 755 r/volume1/@iSCSI; exit $s", 1,
-     "missing\":false}\nmissing\":false}\nmissing\":false}\nmissing\":true}\n"
-     "{\"kind\":\"error\",\"file\":\"" + map + "\",…{\"kind\":\"lun\",…\"missing\":null}\n", says({map + denied})},
+     "missing\":false}\nmissing\":false}\nmissing\":false}\nmissing\":true}\nmissing\":null}\n"
+     "{\"kind\":\"error\",\"file\":\"" + map + "\",…{\"kind\":\"lun\",…\"missing\":null}\n",
+     "…0/@iSCSI/LUN/THINun_00000: cannot be opened: File name too long" + openFailed + "\n" + says({map + denied})},
     {"list shows links and files of several names", "cd r" + ep + "; large truncate -s 4294967299 EP_DAT_00000; "
      "ln -s /volume1/x EP_DAT_00001; ln -s EP_DAT_00000 EP_DAT_00002; ln EP_TBL EP_FRI; "
      "ln -s volume1 ../../../volume2; "

@@ -105,14 +105,14 @@ const Case cases[] = {
      file + ep.substr(0, ep.size() - 4) + R"(100000","fileKind":"dat","size":0,"missing":false})" "\n" +
      file + lun5 + R"(","fileKind":"map","size":24616,"missing":false,"entries":5,"typeName":"THIN","uuid":")" + uuid +
      R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-b" + same + "\n",
-     "epinspect: LUN 0-255: none is known: The LUN list is missing or cannot be read: No such file or directory (code "
-     "9002)\n"},
+     "epinspect: LUN 0-255: none is known: The LUN list ../../var/db/iscsi/luns.json is missing or cannot be read: No "
+     "such file or directory (code 9002)\n"},
     {"list says what may not be opened", "rm far/var/db/iscsi/*; cd far/volume91/@iSCSI; mv EP LUN/folder; "
      "ln -s ../../../usr EP; rm LUN/THIN*; mkfifo LUN/pipe; ln -s none LUN/link; ln -s self LUN/self; "
      "epinspect --root ../.. list --luns 7; epinspect --root LUN/folder list", 1,
      "map       missing  " + maps + "link  link to none\n",
-     "epinspect: LUN 7: configuration cannot be loaded: The LUN list is missing or cannot be read: No such file or "
-     "directory (code 9002)\n"
+     "epinspect: LUN 7: configuration cannot be loaded: The LUN list ../../var/db/iscsi/luns.json is missing or cannot "
+     "be read: No such file or directory (code 9002)\n"
      "epinspect: /volume91/@iSCSI/EP: cannot be opened: a link leads out of the folder of --root" + openFailed +
      "epinspect: " + maps + "pipe: cannot be opened: neither a regular file nor a block device (…)\n"
      "epinspect: " + maps + "self: cannot be opened: Too many levels of symbolic links (…)\n"
@@ -140,14 +140,17 @@ const Case cases[] = {
      ep + "0 position 2121728 (extent 2 of the file)\n" + assumed + "; extent 2, as --address-bits says\n…",
      "epinspect: LUN 5 byte 2097152: " + open2 +
      "epinspect: LUN 5 byte 2097152: position out of any file's range (EP_ERR_SEEK_FAILED, 18990041)\n"},
-    {"locate says what is not there", "epinspect --root far locate 5 3M --count-from volume 4718592 5M; "
+    {"locate says what is not there", "epinspect --root far locate 5 4718592 >o; echo $?;"
+     " epinspect --root far locate 5 3M --count-from volume 4718592 5M; "
      "epinspect --root far locate 5 1M --count-from file | tail -n 1; "
      "epinspect --root far locate 5 3M --count-from volume --json 2>/dev/null | grep -o '\"extent\":.*'", 0,
-     "…\n" + ep + "2 position unknown (extent 8388608 of the file)\n" + assumed + "; extents counted from the volume's "
+     "1\n…\n" + ep + "2 position unknown (extent 8388608 of the file)\n" + assumed +
+     "; extents counted from the volume's "
      "start, as --count-from says\n…\n" + ep + "0 position 3694592 (extent 3 of the file), past its end\n…\n" +
      assumed + "; extents counted within the data file, as --count-from says\n"
      R"("extent":8388608,"position":null,"inside":false}]})" "\n",
-     "epinspect: " + ep + "2: LUN 5 byte 3145728: " + notFound +
+     "epinspect: " + ep + "0: LUN 5 byte 4718592: " + beyond0 + "epinspect: " + ep + "2: LUN 5 byte 3145728: " +
+     notFound +
      "epinspect: " + ep + "0: LUN 5 byte 4718592: " + beyond0 + "…" + lun5 +
      ": LUN 5 byte 5242880: past the end, the map's entries stand for 5242880 bytes (…)\n"},
     {"read gets all that can be had", "epinspect --root far read 5 >image; echo $?; wc -c <image; "

@@ -76,9 +76,13 @@ TEST_F(OnTerminal, ProgressIsGoneAfterAnInterruptAndBeforeAMessage) {
     Terminal drawing(80, script("epinspect map endless --chart")),
         listing(80, script("trap '' INT; epinspect map endless >list"));
     Terminal reading(80, script("epinspect read endless --extent-size 1G --offset 90T --length 90T >/dev/null"));
+    Terminal entering(80, script("epinspect entry endless 5 0-99999999 >/dev/null"));
     Terminal trying(80, script("KELPISCSIEP_LUNS=none epinspect lun 0-4294967295 --json >none"));
     EXPECT_TRUE(fits(drawing.shownUntil(" left"), "  …%  … of 137438950400 entries, … s left"));
     EXPECT_TRUE(fits(reading.shownUntil(" left"), " …%  … of 98956046499840 bytes, … s left"));
+    const std::string entries = entering.shownUntil(" left");  // all that were read, and not the last block of them
+    EXPECT_TRUE(fits(entries, "  …%  … of 100000001 entries, … s left") &&
+                entries.find(" 4096 of") == std::string::npos);
     EXPECT_TRUE(fits(trying.shownUntil(" left"), "  …% …of 4294967296 LUN ids, … s left"));
     drawing.interrupt();
     EXPECT_TRUE(fits(drawing.shown(), "  …%…\r\033[K=130"));

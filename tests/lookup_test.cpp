@@ -143,7 +143,7 @@ TEST(MapEntry, RunsOfEntriesEndWithTheFile) {
     EPFileBuilder builder = EPFileBuilder::map();
     std::string content;
     for (std::uint64_t i = 0; i < total; ++i) content += epbuilder::littleEndian(i, 8);
-    ISCSIEPFileMAP file(folder.write("map", builder.bytes(blockSize, content + "rest")));
+    ISCSIEPFileMAP file(folder.write("map", builder.bytes(blockSize, content + "7 bytes")));
     using Case = std::array<std::uint64_t, 3>;
     // The last count once made the walk endless: eight times it is 0, modulo 2^64.
     for (const auto& [first, count, expected] :

@@ -93,9 +93,10 @@ TEST(StandIn, AnswersFromTheListAndRefusesClearly) {
         {malformed, list, {list.substr(1, list.find("}, ")), ""}}, {unknown, "7", {"8"}}, {0, "7", {"7"}}};
     const std::pair<int, const char*> texts[] = {
         {0, "Success"}, {1, "Unknown error"}, {9001, "No such LUN"},
-        {9002, "The LUN list is missing or cannot be read"}, {9003, "The LUN list is not a JSON array"},
-        {9004, "The LUN list holds a value of the wrong type, or one that does not fit its field"}};
+        {9002, "The LUN list L is missing or cannot be read"}, {9003, "The LUN list L is not a JSON array"},
+        {9004, "The LUN list L holds a value of the wrong type, or one that does not fit its field"}};
     // clang-format on
+    setenv("KELPISCSIEP_LUNS", "L", 1);
     for (const auto& [code, text] : texts) EXPECT_STREQ(text, KELPiSCSIStrError(code));
     std::ofstream(other) << "[]";
     for (const std::time_t time : {0, 3600})  // the list has just changed, and is read anew; or an hour ago

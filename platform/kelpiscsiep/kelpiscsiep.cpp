@@ -353,12 +353,17 @@ Result goThrough(KnownList& known, FileBytes& bytes, const FileState& file, std:
     return isList && finder.found() ? finder.fillRecord(record) : otherwise;
 }
 
+/// Where the list lies.
+const char* listPath() {
+    const char* path = std::getenv("KELPISCSIEP_LUNS");  // NOLINT(concurrency-mt-unsafe): nothing here sets it
+    return path != nullptr ? path : "/var/db/iscsi/luns.json";
+}
+
 Result findLun(std::uint32_t lid, void* record) {
     static std::mutex mutex;
     static KnownList& known = *new KnownList;  // never destroyed: threads may call for as long as the program runs
     const std::lock_guard<std::mutex> lock(mutex);
-    const char* path = std::getenv("KELPISCSIEP_LUNS");  // NOLINT(concurrency-mt-unsafe): nothing here sets it
-    FileBytes bytes(path != nullptr ? path : "/var/db/iscsi/luns.json");
+    FileBytes bytes(listPath());
     const std::optional<FileState> file = bytes.state();
     if (!file) return LIST_UNREADABLE;
     if (known.file == file) {
@@ -371,12 +376,23 @@ Result findLun(std::uint32_t lid, void* record) {
 /// Sets errno to the reason why the list cannot be used, and to 0 where it can be: that is how a list without the LUN
 /// is told from a list of no use.
 void setReason(Result result) {
-    if (result == LIST_MALFORMED) {
+    if (result == LIST_MALFORMED || result == BAD_VALUE) {
         errno = EBADMSG;
     } else if (result != LIST_UNREADABLE) {
         errno = 0;
     } else if (errno == 0) {  // no call has failed: it is no regular file
         errno = EINVAL;
+    }
+}
+
+/// "The LUN list /var/db/iscsi/luns.json" and `what` is wrong with it. Stays as it is until the thread asks again.
+const char* aboutList(const char* what) {
+    static thread_local std::string text;
+    try {
+        text = std::string("The LUN list ") + listPath() + " " + what;
+        return text.c_str();
+    } catch (...) {
+        return "There is no memory for a text";
     }
 }
 
@@ -404,11 +420,11 @@ __attribute__((visibility("default"))) const char* KELPiSCSIStrError(int code) {
         case NO_SUCH_LUN:
             return "No such LUN";
         case LIST_UNREADABLE:
-            return "The LUN list is missing or cannot be read";
+            return aboutList("is missing or cannot be read");
         case LIST_MALFORMED:
-            return "The LUN list is not a JSON array";
+            return aboutList("is not a JSON array");
         case BAD_VALUE:
-            return "The LUN list holds a value of the wrong type, or one that does not fit its field";
+            return aboutList("holds a value of the wrong type, or one that does not fit its field");
         default:
             return "Unknown error";
     }

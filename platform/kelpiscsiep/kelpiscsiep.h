@@ -19,7 +19,7 @@ extern "C" {
 
 /* Fills `record` (zeroed by the caller) with the configuration of the LUN `lid`; `reserved` is 0.
  * Returns 0, or an error code that KELPiSCSIStrError() has a text for. With the stand-in, errno is then the reason why
- * its list cannot be used, and 0 where it can be used. */
+ * its list cannot be used (EBADMSG: it is damaged), and 0 where it can be used. */
 int KELPiSCSILunGetByLid(unsigned int lid, int reserved, void* record);
 
 /* The text of an error code. What an unknown code gets is not documented: it may be null. */

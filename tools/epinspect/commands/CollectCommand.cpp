@@ -10,6 +10,7 @@
 #include "frame/Interruption.h"
 #include "frame/Output.h"
 #include "store/Collector.h"
+#include "store/Folder.h"
 #include "store/Luns.h"
 
 namespace epinspect {
@@ -44,9 +45,10 @@ bool makeFolder(Session& session, const std::string& name) {
     const fs::path folder = fs::absolute(name, error);
     if (fs::exists(folder, error)) {
         if (!fs::is_directory(folder, error)) return refuse("is not a folder", 0);
-        const bool empty = fs::is_empty(folder, error);
-        if (error) return refuse("cannot be looked into", error.value());
-        if (!empty) return refuse("is not empty, and nothing is overwritten; name a new folder or an empty one", 0);
+        const Listing there = listHere(folder.string(), name);
+        if (there.failure) return refuse("cannot be looked into", there.failure->reason);
+        if (!there.names.empty())
+            return refuse("is not empty, and nothing is overwritten; name a new folder or an empty one", 0);
     }
     if (isInsideStore(session, folder)) return refuse("lies inside the store, which is never written", 0);
     fs::create_directories(folder, error);

@@ -9,6 +9,7 @@
 #include "frame/Numbers.h"
 #include "frame/Output.h"
 #include "map/MapWalk.h"
+#include "store/ChangeWatch.h"
 #include "store/Doubts.h"
 
 namespace epinspect {
@@ -74,6 +75,10 @@ void run(const EntryOptions& options, Session& session) {
     const std::optional<NamedMap> named = findMap(session, options.map);
     const std::optional<std::string> path = named ? session.openablePath(named->file, named->by) : std::nullopt;
     if (!path) return;
+    const bool walks =
+        std::any_of(options.ranges.begin(), options.ranges.end(), [](Range range) { return range.first < range.last; });
+    std::optional<ChangeWatch> watch;
+    if (walks) watch.emplace(session, named->file, *path);
     tool::ISCSIEPFileMAP file(*path);
     if (!session.succeeded(file.parseHead0(), {named->file, ""})) return;
     remarkOnDataStart(session, file, named->file);
@@ -81,6 +86,7 @@ void run(const EntryOptions& options, Session& session) {
     Work work = {named->file, file};
     if (!countEntries(options, session, work)) return;
     for (const Range range : options.ranges) printRange(session, session.json ? &json : nullptr, work, range);
+    if (watch) watch->noticeChange();
 }
 
 }  // namespace

@@ -102,7 +102,7 @@ void run(const FindOptions& options, Session& session) {
     FindSummary summary;
     ChosenFiles(session, options.maps, options.lids).forEach([&](const StoreFile& file) {
         const bool isMap = file.kind != nullptr && file.kind->type == ISCSI::TOOL::EP_FILE_TYPE_MAP;
-        if (options.maps.empty() && (!isMap || file.missing)) return;
+        if (options.maps.empty() && !isMap) return;
         searchMap(options, session, file, summary);
     });
     if (session.json) {

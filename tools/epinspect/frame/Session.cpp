@@ -29,10 +29,8 @@ void Session::setRoot(const std::string& folder) {
 void Session::remarkOnCollection() {
     if (!collection) return;
     const auto time = static_cast<unsigned int>(collection->time);
-    std::string text = "a collection of " + ISCSI::TOOL::GetTimeInString(time) + ", without data, made by ";
-    text += collection->program;
-    if (!collection->complete) text += "; it is incomplete";
-    remark(root.hostPath(""), text);
+    remark(root.hostPath(""),
+           "a collection of " + ISCSI::TOOL::GetTimeInString(time) + ", without data, made by " + collection->program);
 }
 
 void Session::report(const Failure& failure) {

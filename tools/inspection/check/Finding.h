@@ -83,7 +83,8 @@ struct Finding {
     std::optional<PartialEntry> partial = {};
     std::uint64_t totalCount = 0;  ///< of lunSize, with the next
     std::uint64_t extentSize = 0;
-    std::uint64_t dataFile = 0;  ///< of beyondDataFile and missingDataFile: its number
+    std::uint64_t dataFile = 0;  ///< of beyondDataFile and missingDataFile: its number, and the path on the target
+    std::string dataFilePath = {};
     std::uint64_t moreLuns = 0;  ///< of missingFile: how many need it beside `lid`
     bool alike = false;    ///< of sharedExtents: all that the two maps share are the same entries, as in a snapshot
     bool passing = false;  ///< possibly so: a file that it is about has changed while it was read

@@ -40,6 +40,7 @@ void MapRules::add(const MapRun& run) {
 
 void MapRules::finish(bool complete) {
     for (Stretch* stretch : {&unmappedBits_, &addressBits_, &missingDataFile_, &beyondDataFile_}) end(*stretch);
+    if (concernsDataFiles_) dataFiles_->noticeChanges();
     report_.countEntries(summary_.entries);
     checkPoolCount();
     checkPartialEntry();
@@ -71,10 +72,18 @@ void MapRules::end(Stretch& stretch) {
     if (stretch.run.count > 0) (this->*stretch.report)(stretch);
 }
 
-void MapRules::addFinding(Rule rule, const Stretch& stretch, const Value& stored, const Value& found) const {
+Finding MapRules::findingOf(Rule rule, const Stretch& stretch, const Value& stored, const Value& found) const {
     Finding finding = {file_.path, rule, stored, found};
     finding.entries.emplace(stretch.run.first, stretch.run.count, stretch.run.entry);
+    return finding;
+}
+
+/// Adds one about a data file, which may change as the map may.
+void MapRules::addOfDataFile(Rule rule, const Stretch& stretch, const Value& found) {
+    Finding finding = findingOf(rule, stretch, Value::number(stretch.run.entry.extentAddress), found);
     finding.dataFile = stretch.dataFile;
+    if (stretch.dataFile != noDataFile) finding.dataFilePath = dataFiles_->at(stretch.dataFile).path;
+    concernsDataFiles_ = true;
     report_.add(std::move(finding));
 }
 
@@ -105,18 +114,19 @@ void MapRules::checkUnmappedBits(const MapRun& run) {
     if (!run.entry.mapped) take(unmappedBits_, run);
 }
 
-void MapRules::reportUnmappedBits(const Stretch& stretch) const {
-    addFinding(Rule::unmappedBits, stretch, Value::hexadecimal(bitsOf(stretch.run.entry)), Value::hexadecimal(0));
+void MapRules::reportUnmappedBits(const Stretch& stretch) {
+    report_.add(
+        findingOf(Rule::unmappedBits, stretch, Value::hexadecimal(bitsOf(stretch.run.entry)), Value::hexadecimal(0)));
 }
 
 void MapRules::checkAddressBits(const MapRun& run) {
     if (isAmbiguous(run.entry)) take(addressBits_, run);
 }
 
-void MapRules::reportAddressBits(const Stretch& stretch) const {
+void MapRules::reportAddressBits(const Stretch& stretch) {
     const MapEntry& entry = stretch.run.entry;
-    addFinding(Rule::addressBits, stretch, Value::hexadecimal(bitsOf(entry)),
-               Value::hexadecimal(ambiguousBitsOf(entry)));
+    report_.add(findingOf(Rule::addressBits, stretch, Value::hexadecimal(bitsOf(entry)),
+                          Value::hexadecimal(ambiguousBitsOf(entry))));
 }
 
 void MapRules::checkDataFiles(const MapRun& run) {
@@ -150,15 +160,14 @@ void MapRules::checkDataFile(const MapRun& part, const ExtentPlace& place) {
     }
 }
 
-void MapRules::reportMissingDataFile(const Stretch& stretch) const {
+void MapRules::reportMissingDataFile(const Stretch& stretch) {
     const std::string name = stretch.dataFile == noDataFile ? "data file" : dataFileName(stretch.dataFile);
-    addFinding(Rule::missingDataFile, stretch, Value::number(stretch.run.entry.extentAddress),
-               Value::text("no " + name));
+    addOfDataFile(Rule::missingDataFile, stretch, Value::text("no " + name));
 }
 
-void MapRules::reportBeyondDataFile(const Stretch& stretch) const {
-    addFinding(Rule::beyondDataFile, stretch, Value::number(stretch.run.entry.extentAddress),
-               Value::number(dataFiles_->at(stretch.dataFile).dataSize / extentSize_));
+void MapRules::reportBeyondDataFile(const Stretch& stretch) {
+    const std::uint64_t held = dataFiles_->at(stretch.dataFile).dataSize / extentSize_;
+    addOfDataFile(Rule::beyondDataFile, stretch, Value::number(held));
 }
 
 }  // namespace inspection

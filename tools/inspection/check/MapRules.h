@@ -35,14 +35,15 @@ public:
 private:
     /// Neighbouring entries that break a rule, as far as they have come, and how that is reported.
     struct Stretch {
-        void (MapRules::*report)(const Stretch& stretch) const;
+        void (MapRules::*report)(const Stretch& stretch);
         MapRun run = {};
         std::uint64_t dataFile = 0;  ///< the number of the one that they point into
     };
 
     void take(Stretch& stretch, const MapRun& part, std::uint64_t dataFile = 0);
     void end(Stretch& stretch);
-    void addFinding(Rule rule, const Stretch& stretch, const Value& stored, const Value& found) const;
+    Finding findingOf(Rule rule, const Stretch& stretch, const Value& stored, const Value& found) const;
+    void addOfDataFile(Rule rule, const Stretch& stretch, const Value& found);
 
     void checkCount(Rule rule, std::uint64_t stored, std::uint64_t found) const;
     void checkTotalCount() const;
@@ -55,10 +56,10 @@ private:
     void checkDataFiles(const MapRun& run);
     void checkDataFile(const MapRun& part, const ExtentPlace& place);
 
-    void reportUnmappedBits(const Stretch& stretch) const;
-    void reportAddressBits(const Stretch& stretch) const;
-    void reportMissingDataFile(const Stretch& stretch) const;
-    void reportBeyondDataFile(const Stretch& stretch) const;
+    void reportUnmappedBits(const Stretch& stretch);
+    void reportAddressBits(const Stretch& stretch);
+    void reportMissingDataFile(const Stretch& stretch);
+    void reportBeyondDataFile(const Stretch& stretch);
 
     const StoreFile& file_;
     const ISCSI::TOOL::ISCSIEPFileMAP& content_;
@@ -66,7 +67,8 @@ private:
     MapSummary summary_;
     DataFiles* dataFiles_ = nullptr;
     std::uint32_t extentSize_ = 0;
-    bool ambiguousBits_ = false;  ///< some entries were not compared with data files: bits 48 to 51 are set
+    bool concernsDataFiles_ = false;  ///< a finding does
+    bool ambiguousBits_ = false;      ///< some entries were not compared with data files: bits 48 to 51 are set
     std::map<std::uint64_t, Failure> unreadable_;  ///< data files, by number: nothing was compared with these
     Stretch unmappedBits_ = {&MapRules::reportUnmappedBits};
     Stretch addressBits_ = {&MapRules::reportAddressBits};

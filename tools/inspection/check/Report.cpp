@@ -70,7 +70,7 @@ std::optional<std::uint32_t> Report::lidOf(const std::string& path) const {
 
 /// Adds what follows from the files that the finding is about.
 void Report::complete(Finding& finding) const {
-    finding.passing = context_.hasChanged(finding.file);
+    finding.passing = context_.hasChanged(finding.file) || context_.hasChanged(finding.dataFilePath);
     if (!finding.lid) finding.lid = lidOf(finding.file);
     if (!finding.partner) return;
     finding.passing = finding.passing || context_.hasChanged(finding.partner->file);

@@ -208,8 +208,13 @@ std::optional<std::uint32_t> StoreCheck::tableExtentSize(const std::string& path
         checkMissingFile(missingAt(path, *hostPath), report_);
         return std::nullopt;
     }
+    StoreFile file;
+    file.path = path;
+    file.kind = kindByName(path);
     tool::ISCSIEPFileTBL table(*hostPath);
-    if (context_.succeeded(table.parseFile(), {path, ""})) row->second = table.extentSize;
+    if (context_.succeeded(table.parseFile(), {path, ""}) && checkKind(file, table, report_)) {
+        row->second = table.extentSize;
+    }
     return row->second;
 }
 

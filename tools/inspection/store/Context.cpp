@@ -10,6 +10,20 @@
 
 namespace inspection {
 
+namespace tool = ISCSI::TOOL;
+
+namespace {
+
+constexpr const char* listVariable = "KELPISCSIEP_LUNS";  // of the stand-in for the platform's library
+
+/// The list that was set for a store: what another store has set is no choice of the user's.
+std::string& listOfStore() {
+    static std::string path;
+    return path;
+}
+
+}  // namespace
+
 std::error_code Context::setRoot(const std::string& folder) {
     const std::error_code error = root.set(folder);
     if (error) return error;
@@ -55,23 +69,27 @@ std::optional<std::string> Context::openablePath(const std::string& name, NamedB
     return std::nullopt;
 }
 
+bool Context::isListNamed() {
+    const char* set = std::getenv(listVariable);
+    return set != nullptr && set != listOfStore();
+}
+
 void Context::prepareLuns() {
-    static constexpr const char* variable = "KELPISCSIEP_LUNS";  // of the stand-in for the platform's library
-    static std::string ours;  // a value set here for another store is not the user's choice
-    if (!root.isFolder()) return;
-    const char* set = std::getenv(variable);
-    if (set != nullptr && set != ours) return;
+    if (!root.isFolder() || isListNamed()) return;
     if (!lunList_) {
         Located list = root.locate(lunListPath);
         const auto obstacle = list.obstacle(lunListPath);
         if (obstacle && list.error != EACCES) {  // the stand-in meets that too, and before any link
             failed(*obstacle);
             list.hostPath = "/dev/null";
+        } else if (list.isMissing() && list.dangling) {  // one that is not there at all is no failure
+            failed({{lunListPath, ""}, tool::EP_ERR_OPEN_FAILED, list.error, {}});
         }
         lunList_ = std::move(list.hostPath);
     }
-    if (set == nullptr || *lunList_ != set) setenv(variable, lunList_->c_str(), 1);
-    ours = *lunList_;
+    if (listOfStore() == *lunList_ && std::getenv(listVariable) != nullptr) return;
+    setenv(listVariable, lunList_->c_str(), 1);
+    listOfStore() = *lunList_;
 }
 
 }  // namespace inspection

@@ -93,6 +93,9 @@ public:
     /// environment names another.
     void prepareLuns();
 
+    /// Whether the environment names the list of LUNs: the user's choice, which is to be there.
+    static bool isListNamed();
+
 protected:
     /// Lets the user know of a failure.
     virtual void report(const Failure& failure) = 0;

@@ -33,8 +33,9 @@ const DataFile& DataFiles::at(std::uint64_t number) {
 }
 
 void DataFiles::noticeChanges() const {
-    for (const auto& file : files_) {
-        if (file.second.watch) file.second.watch->noticeChange();
+    for (const auto& [number, file] : files_) {
+        if (file.watch) file.watch->noticeChange();
+        if (file.missing && context_.root.locate(file.path).isThere()) context_.changed(file.path);
     }
 }
 
@@ -81,7 +82,7 @@ DataFile DataFiles::open(std::uint64_t number) {
         data.missing = true;
         return failed(tool::EP_ERR_OPEN_FAILED, ENOENT);
     }
-    if (remarks_) data.watch.emplace(context_, data.path, located.hostPath);
+    data.watch.emplace(context_, data.path, located.hostPath);
     data.state = stateOf(located.hostPath);
     data.file = std::make_unique<tool::ISCSIEPFileDAT>(located.hostPath);
     // Nothing is read yet: this finds out whether there can be extents at all.

@@ -26,7 +26,7 @@ struct DataFile {
     bool missing = false;                               ///< nothing lies there
     std::optional<Failure> failure;                     ///< without a part; `file` is then null
 
-    std::optional<ChangeWatch> watch;  ///< where somebody asks for changes
+    std::optional<ChangeWatch> watch;  ///< nothing where it is missing
 
     FileState state;         ///< of what lay there when it was opened
     unsigned int looks = 0;  ///< how many calls of lookAgain() there had been
@@ -36,7 +36,7 @@ struct DataFile {
 class DataFiles {
 public:
     /// Of the volume on which the file at `path` of the target lies. With `remarks` there is a remark about each data
-    /// file whose data start is doubtful, and about each that changes.
+    /// file whose data start is doubtful.
     DataFiles(Context& context, const std::string& path, bool remarks);
 
     /// The data file `number`. The reference holds until the next call.
@@ -45,7 +45,7 @@ public:
     /// From now on at() looks at each file once more, and gives it as it is then.
     void lookAgain() { ++looks_; }
 
-    /// Tells the context which of those that were opened have changed since.
+    /// Tells the context which of those that were asked for have changed since.
     void noticeChanges() const;
 
     /// Lists the volume's folder, once. From then on at() does not look for a data file that is not in it. False when

@@ -28,19 +28,24 @@ Failure failureOf(const Located& located, const std::string& path) {
     return located.obstacle(path).value_or(cannotBeOpened(path, located.error));
 }
 
+// By the system's own calls: the standard library's iterator ends the program where memory does not last for a name.
+Listing listHere(const std::string& hostPath, const std::string& name) {
+    Listing listing;
+    const std::unique_ptr<DIR, CloseFolder> folder(opendir(hostPath.c_str()));
+    if (folder == nullptr) return {{}, cannotBeOpened(name, errno)};
+    for (errno = 0; const dirent* entry = readdir(folder.get()); errno = 0) {  // NOLINT(concurrency-mt-unsafe)
+        const std::string_view found = static_cast<const char*>(entry->d_name);
+        if (found != "." && found != "..") listing.names.emplace_back(found);
+    }
+    if (errno != 0) listing.failure = cannotBeOpened(name, errno);
+    return listing;
+}
+
 Listing listFolder(const Context& context, const std::string& path) {
     const Located located = context.root.locate(path);
     if (located.error == ENOENT && !located.dangling) return {};
     if (!located.isThere()) return {{}, failureOf(located, path)};
-    Listing listing;
-    const std::unique_ptr<DIR, CloseFolder> folder(opendir(located.hostPath.c_str()));
-    if (folder == nullptr) return {{}, cannotBeOpened(path, errno)};
-    for (errno = 0; const dirent* entry = readdir(folder.get()); errno = 0) {  // NOLINT(concurrency-mt-unsafe)
-        const std::string_view name = static_cast<const char*>(entry->d_name);
-        if (name != "." && name != "..") listing.names.emplace_back(name);
-    }
-    if (errno != 0) listing.failure = cannotBeOpened(path, errno);
-    return listing;
+    return listHere(located.hostPath, path);
 }
 
 }  // namespace inspection

@@ -14,6 +14,9 @@ struct Listing {
     std::optional<Failure> failure;  ///< why there may be more; it names the folder that is closed
 };
 
+/// The names in the folder at `hostPath`; a failure calls it `name`.
+Listing listHere(const std::string& hostPath, const std::string& name);
+
 /// The names in the folder at `path` of the target, none where no such folder is there. A link that leads nowhere is a
 /// failure.
 Listing listFolder(const Context& context, const std::string& path);

@@ -22,6 +22,9 @@ struct Miss {
     int error;
     int reason;
     std::vector<std::string> log;
+
+    /// Whether the configuration is damaged: nothing else is said that way.
+    bool isDamage() const { return reason == EBADMSG; }
 };
 
 /// Nothing when the LUN could be loaded.
@@ -54,6 +57,7 @@ public:
             std::optional<Miss> miss = tryLun(context_, lid, lun);
             if (!miss) continue;
             codes_.insert(miss->error);
+            if (miss->isDamage()) damage_ = miss;
             const auto [before, isFirst] = answers_.emplace(lid, *miss);
             if (!isFirst && before->second.error != miss->error && !changed_) changed_ = std::move(miss);
         }
@@ -64,20 +68,23 @@ public:
     /// An answer that differs from the one before.
     const std::optional<Miss>& changed() const { return changed_; }
 
+    /// An answer that says that any number of LUNs may be lost.
+    const std::optional<Miss>& damage() const { return damage_; }
+
 private:
     Context& context_;
     std::set<int> codes_;
     std::map<std::uint64_t, Miss> answers_;  ///< the first ones, by id
-    std::optional<Miss> changed_;
+    std::optional<Miss> changed_, damage_;
 };
 
-/// The code that more than half of the ids got, where they are many enough to rely on that.
+/// The code that more than half of the ids got, where they are many enough to rely on that, and not for damage.
 std::optional<int> usualCode(const std::vector<Miss>& misses, std::uint64_t tried) {
     constexpr std::uint64_t enough = 256;
     std::map<int, std::uint64_t> counts;
     if (tried < enough) return std::nullopt;
     for (const Miss& miss : misses) {
-        if (++counts[miss.error] > tried / 2) return miss.error;
+        if (!miss.isDamage() && ++counts[miss.error] > tried / 2) return miss.error;
     }
     return std::nullopt;
 }
@@ -129,6 +136,7 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
     for (std::uint64_t id = lids.first; id <= lids.last; ++id) {
         std::optional<Miss> miss = tryLun(context, id, lun);
         if (!miss) {
+            if (!met) unused.ask();  // an answer that does not change with the first LUN stands for all of them
             met = true;
             each(lun);
         } else {
@@ -145,11 +153,15 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
     for (const Miss& miss : misses) {
         if (miss.error != usual && !unused.haveCode(miss.error)) trial.failures.push_back(failureOf(miss));
     }
-    if (const std::optional<Miss>& changed = unused.changed()) {
-        trial.failures.push_back(failureOf(*changed));
+    const auto addDoubt = [&](const Miss& miss, const std::string& why) {
+        trial.failures.push_back(failureOf(miss));
         trial.failures.back().subject = subjectOf(lids);
-        trial.failures.back().what =
-            "some may be missing, the answer for ids without a LUN has changed meanwhile" + textOf(changed->error);
+        trial.failures.back().what = "some may be missing" + why + textOf(miss.error);
+    };
+    if (const auto& changed = unused.changed()) {
+        addDoubt(*changed, ", the answer for ids without a LUN has changed meanwhile");
+    } else if (const auto& damage = unused.damage(); damage && first && (met || !trial.failures.empty())) {
+        addDoubt(*damage, "");
     }
     if (met || !trial.failures.empty()) return trial;
     trial.none = failureOf(*first);
@@ -158,7 +170,10 @@ LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(co
     return trial;
 }
 
-bool isUnreadable(const Failure& none) { return none.reason != 0 && none.reason != ENOENT && none.reason != ENOTDIR; }
+bool isUnreadable(const Failure& none) {
+    const bool isAbsent = none.reason == ENOENT || none.reason == ENOTDIR;
+    return none.reason != 0 && (!isAbsent || Context::isListNamed());
+}
 
 void forEachLun(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each) {
     const LunTrial trial = tryLuns(context, lids, each);

@@ -61,7 +61,8 @@ struct LunTrial {
 /// Calls each() for the LUNs whose ids are in `lids`, lowest id first. Every id is loaded once.
 LunTrial tryLuns(Context& context, const Lids& lids, const std::function<void(const Lun&)>& each);
 
-/// Whether there is no LUN because the configuration cannot be read; an empty one, or none at all, is no failure.
+/// Whether there is no LUN because the configuration cannot be read; an empty one is no failure, nor is none at all
+/// unless the user has named one.
 bool isUnreadable(const Failure& none);
 
 /// The same as tryLuns(), and reports what went wrong. That there is no LUN is a failure where the user asked for these

@@ -8,7 +8,8 @@
 namespace inspection {
 
 Typed<LunName> lunNameIn(const std::string& text) {
-    const bool isId = !text.empty() && text.find_first_not_of("0123456789") == std::string::npos;
+    if (text.empty()) return "must not be empty";
+    const bool isId = text.find_first_not_of("0123456789") == std::string::npos;
     if (!isId) return LunName{std::nullopt, text};
     const auto lid = numberIn(text, most32Bits);
     if (lid.fault != nullptr) return lid.fault;

@@ -60,6 +60,9 @@ void failEmptyStore(Context& context) {
 Store::Store(Context& context, const Lids& lids) : Store(context, findLuns(context, lids)) {}
 
 Store::Store(Context& context, std::vector<Lun> luns) : context_(context), luns_(std::move(luns)) {
+    if (context.collection && !context.collection->complete) {
+        context.fail({context.root.hostPath(""), ""}, "files may be missing, the collection is incomplete", 0);
+    }
     std::string journal;
     tool::ISCSIEPFile("").getJNLFilePath(journal);
     const std::string journalFolder = fs::path(journal).parent_path().string();

@@ -50,7 +50,8 @@ struct StoreFile {
 /// The store below the root folder.
 class Store {
 public:
-    /// Loads the LUNs whose ids are in `lids`, as forEachLun() does.
+    /// Loads the LUNs whose ids are in `lids`, as forEachLun() does. That the store is an incomplete collection is a
+    /// failure.
     Store(Context& context, const Lids& lids);
 
     /// With these LUNs, lowest id first.
