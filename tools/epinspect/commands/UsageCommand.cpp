@@ -32,7 +32,11 @@ void showVolume(const UsageOptions& options, Session& session, const Volume& vol
     if (sizes.empty()) sizes.insert(options.volumes.extentSize);
     for (const auto& size : sizes) {
         ExtentsInUse use(session, volume, size, options.addressBits);
-        if (use.count()) output.print(use);
+        if (use.count()) {
+            output.print(use);
+        } else {
+            output.leaveOut();
+        }
     }
 }
 

@@ -196,16 +196,18 @@ void UsageOutput::printSummary() const {
             .number("mapped", mapped_)
             .number("extents", extents_)
             .number("shared", shared_)
-            .texts("changed", session_.changedFiles())
-            .end();
+            .texts("changed", session_.changedFiles());
+        if (!isAll_) json.boolean("incomplete", true);
+        json.end();
         return;
     }
     if (chart_) epinspect::print(Chart::legend(outputIsUnicode(), outputWidth(), "In use", "some shared"));
-    epinspect::print(
-        wrapped(counted(maps_, "map", "maps") + ", " + counted(dataFiles_.size(), "data file", "data files") + ": " +
-                    counted(mapped_, "entry", "entries") + " mapped, " + counted(extents_, "extent", "extents") +
-                    " in use, " + std::to_string(shared_) + " shared by several maps",
-                outputWidth(), 0));
+    epinspect::print(wrapped((isAll_ ? "" : "without what could not be counted: ") + counted(maps_, "map", "maps") +
+                                 ", " + counted(dataFiles_.size(), "data file", "data files") + ": " +
+                                 counted(mapped_, "entry", "entries") + " mapped, " +
+                                 counted(extents_, "extent", "extents") + " in use, " + std::to_string(shared_) +
+                                 " shared by several maps",
+                             outputWidth(), 0));
 }
 
 }  // namespace epinspect

@@ -19,6 +19,9 @@ public:
     /// Shows what uses extents of one size on one volume.
     void print(const ExtentsInUse& use);
 
+    /// There is a volume whose use could not be counted: the totals are then not those of all.
+    void leaveOut() { isAll_ = false; }
+
     /// Totals of all that was printed.
     void printSummary() const;
 
@@ -30,6 +33,7 @@ private:
 
     const Session& session_;
     bool chart_;
+    bool isAll_ = true;
     std::set<std::string> dataFiles_;
     std::uint64_t maps_ = 0, mapped_ = 0, extents_ = 0, shared_ = 0;
 };

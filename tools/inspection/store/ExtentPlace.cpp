@@ -1,5 +1,7 @@
 #include "store/ExtentPlace.h"
 
+#include <algorithm>
+
 namespace inspection {
 
 namespace {
@@ -48,7 +50,7 @@ std::optional<ExtentPlace> placeOf(std::uint64_t extentAddress, std::uint32_t ex
     if (extentSize == 0 || extentAddress >= limit / extentSize) return std::nullopt;
     const std::uint64_t number = extentAddress * extentSize / dataFileSize;
     return ExtentPlace{number, extentAddress - firstExtentOf(number, extentSize), extentAddress,
-                       firstExtentOf(number + 1, extentSize)};
+                       std::min(firstExtentOf(number + 1, extentSize), limit / extentSize)};
 }
 
 std::uint64_t firstExtentOf(std::uint64_t number, std::uint32_t extentSize) {

@@ -11,14 +11,17 @@ namespace {
 /// About what a far page takes beside its bits: itself, its number, and the table's and the allocator's own.
 constexpr std::uint64_t farOverhead = 64;
 
-}  // namespace
-
-ExtentMemory::ExtentMemory() : left_(std::uint64_t{1} << 30U) {
+std::uint64_t usualLimit() {
+    constexpr std::uint64_t most = std::uint64_t{1} << 30U;
     const auto pages = sysconf(_SC_PHYS_PAGES);
     const auto pageSize = sysconf(_SC_PAGESIZE);
-    if (pages <= 0 || pageSize <= 0) return;
-    left_ = std::min(left_, static_cast<std::uint64_t>(pages) * static_cast<std::uint64_t>(pageSize) / 4);
+    if (pages <= 0 || pageSize <= 0) return most;
+    return std::min(most, static_cast<std::uint64_t>(pages) * static_cast<std::uint64_t>(pageSize) / 4);
 }
+
+}  // namespace
+
+ExtentMemory::ExtentMemory() : ExtentMemory(usualLimit()) {}
 
 void ExtentMemory::take(std::uint64_t bytes) {
     if (bytes > left_) throw std::bad_alloc();
@@ -107,6 +110,28 @@ void ExtentSet::addPage(std::uint64_t number, const Page& page, ExtentSet* repea
         const Word bits = (*page.bits)[word];
         if (bits != 0) addWord(number, pageAt(number), word, bits, repeated);
     }
+}
+
+std::uint64_t ExtentSet::countCommon(const Page& one, const Page& other) {
+    if (one.count == pageExtents) return other.count;
+    if (other.count == pageExtents) return one.count;
+    std::uint64_t count = 0;
+    if (one.bits == nullptr || other.bits == nullptr) return count;
+    for (std::size_t word = 0; word < one.bits->size(); ++word) {
+        count += static_cast<std::uint64_t>(__builtin_popcountll((*one.bits)[word] & (*other.bits)[word]));
+    }
+    return count;
+}
+
+std::uint64_t ExtentSet::countCommon(const ExtentSet& other) const {
+    std::uint64_t count = 0;
+    const std::size_t both = std::min(near_.size(), other.near_.size());
+    for (std::size_t number = 0; number < both; ++number) count += countCommon(near_[number], other.near_[number]);
+    for (const auto& [number, page] : other.far_) {
+        const auto own = far_.find(number);
+        if (own != far_.end()) count += countCommon(own->second, page);
+    }
+    return count;
 }
 
 void ExtentSet::clear() {

@@ -20,13 +20,17 @@ class ExtentMemory {
 public:
     /// A quarter of the machine's memory, at most 1 GiB.
     ExtentMemory();
-    explicit ExtentMemory(std::uint64_t bytes) : left_(bytes) {}
+    explicit ExtentMemory(std::uint64_t bytes) : all_(bytes), left_(bytes) {}
 
     /// Throws std::bad_alloc when not as much is left.
     void take(std::uint64_t bytes);
     void give(std::uint64_t bytes) { left_ += bytes; }
 
+    /// What is taken.
+    std::uint64_t taken() const { return all_ - left_; }
+
 private:
+    std::uint64_t all_;
     std::uint64_t left_;
 };
 
@@ -53,6 +57,9 @@ public:
 
     /// How many there are.
     std::uint64_t size() const { return size_; }
+
+    /// How many of another set's extents are in this one too.
+    std::uint64_t countCommon(const ExtentSet& other) const;
 
     /// Calls visit(first, count) for the runs of those of the set among the `count` extents from `first` on, in their
     /// order. A run may come in several parts.
@@ -92,6 +99,8 @@ private:
     void addPage(std::uint64_t number, const Page& page, ExtentSet* repeated);
     void makeBits(Page& page);
     void dropBits(Page& page);
+
+    static std::uint64_t countCommon(const Page& one, const Page& other);
 
     template <typename Visit>
     static void visitWord(std::uint64_t start, Word bits, Visit& visit);

@@ -43,50 +43,57 @@ void ExtentsInUse::countMaps() {
         if (map.extentSize == extentSize_) maps_.push_back({&map});
     }
     const std::uint64_t before = context_.failures();
-    for (MapUse& use : maps_) countMap(use);
-    for (MapUse& use : maps_) {
-        if (shared_.size() > 0 && use.map->asked) countShared(use);
+    kept_.resize(maps_.size());
+    for (std::size_t map = 0; map < maps_.size(); ++map) countMap(map);
+    for (std::size_t map = 0; map < maps_.size(); ++map) {
+        if (maps_[map].map->asked && maps_[map].read) maps_[map].shared = countShared(map);
     }
+    kept_.clear();
     complete_ = complete_ && context_.failures() == before;
 }
 
 /// Counts all but what other maps share, who are not known yet.
-void ExtentsInUse::countMap(MapUse& use) {
+void ExtentsInUse::countMap(std::size_t map) {
+    constexpr std::uint64_t mostKept = std::uint64_t{48} << 20U;  // with what else is in memory
+    MapUse& use = maps_[map];
     const StoreFile& file = use.map->file;
-    const OpenedMap map = openMap(context_, file.path, file.by);
-    if (map.file == nullptr) return;
-    ExtentSet own(memory_);
-    ExtentAdder adder(own, nullptr);
-    use.read = walkAllRuns(context_, file.path, *map.file, map.entries, [&](const MapRun& run) {
+    const OpenedMap opened = openMap(context_, file.path, file.by);
+    if (opened.file == nullptr) return;
+    auto own = std::make_unique<ExtentSet>(memory_);
+    ExtentAdder adder(*own, nullptr);
+    use.read = walkAllRuns(context_, file.path, *opened.file, opened.entries, [&](const MapRun& run) {
         use.entries += run.count;
         if (!run.entry.mapped) return;
         use.mapped += run.count;
-        if (const auto address = extentAddressOf(run.entry, choice_)) {
-            adder.add(*address, run.count);
-        } else {
-            use.ambiguous += run.count;
-        }
+        if (isAmbiguous(run.entry) && !choice_.addressBits) use.ambiguous += run.count;
+        addExtents(run, adder);
     });
-    map.watch->noticeChange();
+    opened.watch->noticeChange();
     adder.finish();
-    use.extents = own.size();
-    used_.add(own, &shared_);
-    if (use.map->asked && !allAsked_) asked_.add(own, nullptr);
+    use.extents = own->size();
+    used_.add(*own, &shared_);
+    if (use.map->asked && !allAsked_) asked_.add(*own, nullptr);
+    if (use.map->asked && memory_.taken() <= mostKept) kept_[map] = std::move(own);
     if (use.ambiguous == 0 || !use.map->asked) return;
     context_.remark(file.path, std::to_string(use.ambiguous) + " mapped " + (use.ambiguous == 1 ? "entry" : "entries") +
                                    " left out: bits 48 to 51 are set, --address-bits decides");
 }
 
-void ExtentsInUse::countShared(MapUse& use) {
-    if (use.extents == 0) return;
+void ExtentsInUse::addExtents(const MapRun& run, ExtentAdder& adder) const {
+    const auto address = extentAddressOf(run.entry, choice_);
+    if (run.entry.mapped && address) adder.add(*address, run.count);
+}
+
+/// How many extents of a map others use too. Walks it again where its extents have not been kept.
+std::uint64_t ExtentsInUse::countShared(std::size_t map) {
+    const MapUse& use = maps_[map];
+    if (shared_.size() == 0 || use.extents == 0) return 0;
+    if (kept_[map] != nullptr) return shared_.countCommon(*kept_[map]);
     ExtentSet own(memory_);
-    walkAgain(context_, use.map->file.path, use.map->file.hostPath, [&](const MapRun& run) {
-        const auto address = extentAddressOf(run.entry, choice_);
-        if (!run.entry.mapped || !address) return;
-        shared_.forEachIn(*address, run.count,
-                          [&own](std::uint64_t first, std::uint64_t count) { own.add(first, count, nullptr); });
-    });
-    use.shared = std::min(own.size(), use.extents);
+    ExtentAdder adder(own, nullptr);
+    walkAgain(context_, use.map->file.path, use.map->file.hostPath, [&](const MapRun& run) { addExtents(run, adder); });
+    adder.finish();
+    return std::min(shared_.countCommon(own), use.extents);
 }
 
 std::uint64_t ExtentsInUse::askedShared() const {

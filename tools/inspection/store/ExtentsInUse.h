@@ -4,10 +4,12 @@
 
 #include <cstdint>
 #include <map>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
+#include "map/MapRuns.h"
 #include "store/DataFiles.h"
 #include "store/ExtentPlace.h"
 #include "store/ExtentSet.h"
@@ -73,8 +75,9 @@ private:
     using Rows = std::map<std::uint64_t, DataFileUse>;
 
     void countMaps();
-    void countMap(MapUse& use);
-    void countShared(MapUse& use);
+    void countMap(std::size_t map);
+    void addExtents(const MapRun& run, ExtentAdder& adder) const;
+    std::uint64_t countShared(std::size_t map);
     void countDataFiles();
     DataFileUse& rowAt(Rows& rows, DataFiles& files, std::uint64_t number);
     void addUse(Rows& rows, DataFiles& files, std::uint64_t first, std::uint64_t count, bool isShared);
@@ -91,6 +94,7 @@ private:
     bool allAsked_ = true;
     bool otherSizes_ = false;
     std::vector<MapUse> maps_;
+    std::vector<std::unique_ptr<ExtentSet>> kept_;  ///< the extents of each map; null where memory did not last for it
     std::vector<DataFileUse> dataFileUses_;
     std::uint64_t withoutPlace_ = 0;  ///< extents in use that no data file can hold
 };

@@ -157,18 +157,31 @@ bool Owners::reportAmbiguous(const VolumeMap& map, const std::vector<Way>& ways,
 void Owners::forEachPart(const Range& positions, const std::function<void(const OwnedRange&)>& each) const {
     using Where = OwnedRange::Where;
     const std::uint64_t start = data_.file->head0DataStartOffset;
+    std::optional<OwnedRange> last;
+    const auto finish = [&] {
+        if (last) each(*last);
+    };
+    const auto take = [&](const OwnedRange& part) {  // neighbours without owners are one
+        if (last && last->where == part.where && last->owners.empty() && part.owners.empty()) {
+            last->length += part.length;
+        } else {
+            finish();
+            last = part;
+        }
+    };
     const auto withoutOwners = [&](Where where, std::uint64_t from, std::uint64_t to) {
         const Range part = {std::max(positions.first, from), std::min(positions.last, to - 1)};
-        if (to > from && part.first <= part.last) each({where, part.first, part.last - part.first + 1});
+        if (to > from && part.first <= part.last) take({where, part.first, part.last - part.first + 1});
     };
     withoutOwners(Where::header, 0, std::min(start, data_.size));
     withoutOwners(Where::pastEnd, data_.size, start);
-    if (positions.last < start) return;
+    if (positions.last < start) return finish();
     const Range bytes = {std::max(positions.first, start) - start, positions.last - start};
     const auto target =
         std::lower_bound(targets_.begin(), targets_.end(), bytes.first,
                          [](const Target& one, std::uint64_t position) { return one.bytes.last < position; });
-    if (target != targets_.end()) addParts(*target, bytes, each);
+    if (target != targets_.end()) addParts(*target, bytes, take);
+    finish();
 }
 
 /// Bytes of the owner's extents before this one would lie inside the data file by the other way of counting too.
@@ -194,6 +207,8 @@ void Owners::addParts(const Target& target, Range bytes, const std::function<voi
         if (inside) end = std::min(end, data_.dataSize);
         OwnedRange part = {inside ? OwnedRange::Where::extent : OwnedRange::Where::pastEnd, start + position, 0};
         for (const Owner* owner : here) {
+            const bool onlyInside = owner->countFrom == CountFrom::volume && !choice_.countFrom;
+            if (!inside && onlyInside) continue;
             end = std::min(end, owner->end());
             part.owners.push_back(partFrom(*owner, position));
             const std::uint64_t undecidedEnd = undecidedBefore(*owner);
