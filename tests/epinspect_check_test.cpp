@@ -98,7 +98,7 @@ const Case cases[] = {
      "epinspect --root store find --pool 32 --json | grep -om1 '\"lid.*first\":[0-9]*'", 0,
      "/volume1/@iSCSI/LUN/BLUN…lun1_00000: LUN 1: 63-64: mapped synced, pool 0, extents 63-64\n"
      "/volume2/@iSCSI/LUN/THIN…lun2_00000: LUN 2: 47-48: mapped synced, pool 32, extents 63-64\n"
-     "4352 entries in 2 maps: 2 matches of 4 entries\n\"lid\":2,\"first\":0\n", ""},
+     "5376 entries in 3 maps: 2 matches of 4 entries\n\"lid\":2,\"first\":0\n", ""},
     {"find counts one", "epinspect find one --extent 0x3; epinspect find x --extent 13", 0,
      "1 entry in 1 map: 0 matches of 0 entries\nx: 3: mapped, …\n7 entries in 1 map: 1 match of 1 entry\n", ""},
     {"find reads addresses both ways and passes over holes",
@@ -114,7 +114,8 @@ const Case cases[] = {
 {"kind":"error","file":"gone",…}
 {"kind":"summary","file":null,"summary":true,"files":1,"entries":7,"matches":2,"matchedEntries":2,"changed":[]}
 )", "epinspect: gone: …\n"},
-    {"check is silent on a sound store", "epinspect check --root store", 0, "10 files, 4352 entries, 0 findings\n", ""},
+    {"check is silent on a sound store", "epinspect check --root store", 0, "11 files, 5376 entries, 0 findings\n"
+     "Snapshot: …: LUN 3: shares 160 entries with its parent LUN 1, …\n", ""},
     {"check finds every fault once", "epsample --broken broken; epinspect check --root broken --json >all; status=$?;"
      R"(sed -E 's/^.*"rule"/"rule"/; s,/[^ "]*/(THIN.{36})?,,g; s/,"message/\n&/' all; exit $status)", 3,
 R"("rule":"kind","stored":3,"found":"fri"
@@ -169,7 +170,7 @@ R"("rule":"kind","stored":3,"found":"fri"
      R"("notCompared":["missing-data-file, beyond-data-file: entries with bits 48 to 51 set: address-bits_00000"],)"
      R"("changed":[],"snapshots":[]}
 )", ""},
-    {"check multiplies in 64 bits", "epsample s; printf '\\0\\20\\0\\0\\0\\20' | dd of=$(echo s/volume1/*/LUN/*) bs=1 "
+    {"check multiplies in 64 bits", "epsample s; printf '\\0\\20\\0\\0\\0\\20' | dd of=$(echo s/volume1/*/LUN/*lun1_00000) bs=1 "
      "seek=76 conv=notrunc status=none; epinspect check --root s", 3,
      "…: lun-size: 17592186048512 entries of 1048576 bytes are more than 18446744073709551615 bytes, the LUN has …\n"
      "…: total-count: 17592186048512 stored, 4096 entries found\n…2 findings: …\n", ""},
@@ -207,15 +208,15 @@ R"("rule":"kind","stored":3,"found":"fri"
     {"check writes findings as JSON", "epinspect check x y --json | sed -n 3p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","entries":1,"runs":1,"first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
 )", ""},
     {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,;"
-     " s/lun1/new/' var/db/iscsi/luns.json;"
+     " s/lun1\"/new\"/' var/db/iscsi/luns.json;"
      "rm volume1/*/EP/EP_TBL volume2/*/EP/EP_DAT*; truncate -s 99 volume1/*/EP/EP_DAT_00001;"
      " mkfifo volume2/@iSCSI/EP/EP_DAT_00000; epinspect check --root . --extent-size 1M", 1,
-     "/volume1/@iSCSI/EP/EP_TBL: LUN 1: missing-file: no file, but this LUN needs it\n"
+     "/volume1/@iSCSI/EP/EP_TBL: LUN 1: missing-file: no file, but this LUN and 1 other need it\n"
      "/volume1/@iSCSI/LUN/BLUN…new_00000: LUN 1: missing-map: no file, but this LUN needs it\n"
      "/share/@iSCSI/LUN/THIN…lun2_00000: LUN 2: missing-map: no file, but this LUN needs it\n"
-     "7 files, 4352 entries, 3 findings: 2 missing-map, 1 missing-file\n"
-     "Not compared: beyond-data-file: a data file cannot be read: /volume1/… and 1 more\n"
-     "Not compared: extent-size: no table file that can be compared: /volume1/@iSCSI/EP/EP_TBL\n"
+     "8 files, 5376 entries, 3 findings: 2 missing-map, 1 missing-file\nSnapshot: …\n"
+     "Not compared: beyond-data-file: a data file cannot be read: /volume1/… and 2 more\n"
+     "Not compared: extent-size: no table file that can be compared: /volume1/@iSCSI/EP/EP_TBL and 1 more\n"
      "Not compared: extent-size: the path of the LUN's map file names no volume: /share/…\n"
      "Not compared: lun-size, extent-size: no LUN with an id from 0 to 255 is known for this map: /volume1/… and 1 "
      "more\n",

@@ -47,7 +47,7 @@ Case damaged(const std::string& how, const std::string& edit, const std::string&
 // clang-format off
 const Case cases[] = {
     {"collects all but the data", "epinspect --root own collect c; find c -type f -size +60k; diff -r own c", 1,
-     "10 files and 2 LUNs collected, 280576 bytes: c\nOnly in c: collection.json\n"
+     "11 files and 3 LUNs collected, 313344 bytes: c\nOnly in c: collection.json\n"
      "diff -r own/var/db/iscsi/luns.json c/var/db/iscsi/luns.json\n…Binary files…EP_DAT_00000 differ\n"
      "Binary files…EP_DAT_00001 differ\nBinary files own" + data2 + " and c" + data2 + " differ\n", ""},
     {"answers on a collection as on the store", "printf x >>own" + map2 + "; rm own" + table2 + "; "
@@ -58,9 +58,9 @@ const Case cases[] = {
      "'map " + map2 + "' 'find --pool 32' 'entry " + map2 + " 0' 'lun 1-2' 'dump /var/db/iscsi/EP_JNL'; do "
      "for root in own c; do epinspect --root $root $what 2>&1 | grep -v 'a collection of' >$root.out; done; "
      "cmp own.out c.out; done; stat -c %h c/volume2/*/EP/EP_DAT_00001", 0,
-     "12 files and 2 LUNs collected, …: c\n2\n", ""},
+     "13 files and 3 LUNs collected, …: c\n2\n", ""},
     {"keeps a configuration without LUNs", "echo '[]' >own/var/db/iscsi/luns.json; epinspect --root own collect c; "
-     "epinspect --root c check | tail -n 0", 0, "10 files and 0 LUNs …",
+     "epinspect --root c check | tail -n 0", 0, "11 files and 0 LUNs …",
      "epinspect: LUN 0-255: none is known: No such LUN (code 9001)\nepinspect: c: a collection of …\n"
      "epinspect: LUN 0-255: none is known: No such LUN (code 9001)\n"},
     {"keeps holes and times", "large truncate -s 40M own" + map2 + "; touch -d @1000000000.5 own" + map2 + "; "
@@ -75,8 +75,8 @@ const Case cases[] = {
      "epinspect: c: a collection of … UTC 20…, without data, made by epinspect 1.0.0\n"},
     {"collects a collection", "epinspect --root own collect c; epinspect --root c collect d; "
      "diff -r c/volume1 d/volume1; epinspect diff own d", 0,
-     "…: c\n…: d\n10 files: 0 only in the first, 0 only in the second; no field differs; "
-     "4352 entries: no difference\n", ""},
+     "…: c\n…: d\n11 files: 0 only in the first, 0 only in the second; no field differs; "
+     "5376 entries: no difference\n", ""},
     {"writes into a new or empty folder only", "mkdir full; >full/x; >file; for f in full file own/c own ''; do "
      "epinspect --root own collect \"$f\"; echo $?; done; ls own; mkdir -p s/volume1/@iSCSI/EP; "
      "epinspect collect s/volume1/@iSCSI/EP", 1, "1\n1\n1\n1\n2\nvar\nvolume1\nvolume2\n",
@@ -89,7 +89,7 @@ const Case cases[] = {
      "epinspect --root own collect c; epinspect --root c list --json | head -n 1; rm c/volume1/@iSCSI/EP/*; "
      "for what in list check; do epinspect --root c $what >/dev/null; echo $?; done; "
      "epinspect diff c c", 1,
-     "0 files and 2 LUNs collected, 0 bytes: c\n1\n7\n9 files and 2 LUNs …: c\n"
+     "0 files and 3 LUNs collected, 0 bytes: c\n1\n8\n10 files and 3 LUNs …: c\n"
      R"({"kind":"error","file":"c","error":null,"code":0,"message":"c: files may be missing, the collection is )"
      "incomplete\"}\n1\n1\n…", "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
      "epinspect: c: a collection of …\n" + mayMiss + "…epinspect: " + table2 + ": cannot be opened: neither …)\n" +
@@ -126,13 +126,13 @@ const Case cases[] = {
      "/var/db/iscsi/EP_JNL: head0Version: 33752069 -> 33752319\n"
      "/volume1/@iSCSI/EP/EP_DAT_00009: only in the second: data file, 0 bytes\n" + table2 +
      ": only in the first: table file, 24576 bytes\n" + data2 + ": size: 16801792 -> 99999\n"
-     "11 files: 1 only in the first, 1 only in the second; 2 fields differ; 4352 entries: no difference\n"
+     "12 files: 1 only in the first, 1 only in the second; 2 fields differ; 5376 entries: no difference\n"
      R"({"kind":"field","file":")" + data2 + R"(","otherFile":")" + data2 + R"(","field":"size","a":16801792,"b":99999}
-{"kind":"summary","file":"own","otherFile":"b","summary":true,"files":11,"fields":2,"same":4352,…})" "\n",
+{"kind":"summary","file":"own","otherFile":"b","summary":true,"files":12,"fields":2,"same":5376,…})" "\n",
      "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"},
     {"an empty store is no success", "mkdir e; epinspect --root e collect c; echo $?; epinspect diff own e/ | tail -n 1; "
      "epinspect diff $PWD/e e", 1, "0 files and 0 LUNs collected, 0 bytes: c\n1\n"
-     "10 files: 10 only in the first, …\n0 files: …\n",
+     "11 files: 11 only in the first, …\n0 files: …\n",
      "epinspect: LUN 0-255: …\nepinspect: e: no EP files found (EP_ERR_NO_PATH, 18990401)\n" + incomplete +
      "epinspect: e: LUN 0-255: none is known: …\nepinspect: e: no EP files found …\nepinspect: …/e: LUN 0-255: …\n"
      "epinspect: e: LUN 0-255: …\nepinspect: /…/e: no EP files found …\nepinspect: e: no EP files found …\n"},

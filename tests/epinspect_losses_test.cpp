@@ -21,6 +21,9 @@ const std::string lun1 = volume1 + "LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11
 const std::string lun2 = volume2 + "LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000";
 
 const std::string gone1 = lun1 + ": LUN 1: missing-data-file: ", no1 = " and others, but there is no EP_DAT_00001\n";
+const std::string gone3 = volume1 + "LUN/BLUN91e80b7c-2d46-4f3a-a6c5-18d07f2b6e33lun1-snapshot_00000: LUN 3: "
+                          "missing-data-file: ";
+const std::string snapshot = "Snapshot: …: LUN 3: shares 160 entries with its parent LUN 1, …\n";
 const std::string uncompared = "Not compared: extent-size: no table file that can be compared: ";
 const std::string table1 = volume1 + "EP/EP_TBL";
 
@@ -29,9 +32,11 @@ const Case cases[] = {
     {"a data file is one finding for each map, or all its runs",
      "rm own/volume1/*/EP/*1; epinspect --root own check; epinspect --root own check --each", 3,
      gone1 + "768 entries in 3 runs, first entries 512-767: extent 4194816" + no1 +
-     "9 files, 4352 entries, 1 finding: 1 missing-data-file\n" +
+     gone3 + "entries 640-767: extent 4194944" + no1 +
+     "10 files, 5376 entries, 2 findings: 2 missing-data-file\n" + snapshot +
      gone1 + "entries 512-767: extent 4194816" + no1 + gone1 + "entries 1536-1791: extent 4195840" + no1 +
-     gone1 + "entries 3584-3839: extent 4197888" + no1 + "9 files, 4352 entries, 3 findings: 3 missing-data-file\n",
+     gone1 + "entries 3584-3839: extent 4197888" + no1 +
+     gone3 + "entries 640-767: extent 4194944" + no1 + "10 files, 5376 entries, 4 findings: 4 missing-data-file\n" + snapshot,
      ""},
     {"all there is", "epinspect check --root none; mkdir none; epinspect check --root none", 1,
      "0 files, 0 entries, 0 findings\n"
@@ -51,28 +56,28 @@ const Case cases[] = {
     {"a table that a journal replaces",
      "cp own/var/db/iscsi/EP_JNL own/volume1/@iSCSI/EP/EP_TBL; epinspect --root own check", 3,
      table1 + ": kind: type 5, which the journal " + journal + " has too, but named like a table file\n"
-     "10 files, 4352 entries, 1 finding: 1 kind\n" + uncompared + table1 + "\n", ""},
+     "11 files, 5376 entries, 1 finding: 1 kind\n" + snapshot + uncompared + table1 + " and 1 more\n", ""},
     {"one of two kinds with one type",
      "cd own; rm -r volume2; sed -i '/lid.: 2/,$d; s/},$/}]/' var/db/iscsi/luns.json; "
      "cp volume1/@iSCSI/EP/EP_FRI var/db/iscsi/EP_JNL; epinspect --root . check", 3,
      journal + ": kind: type 2, which the free-index file " + volume1 + "EP/EP_FRI has too, but named like a "
      "journal\n" +
      volume1 + "EP/EP_FRI: kind: type 2, which the journal " + journal + " has too, but named like a free-index file\n"
-     "6 files, 4096 entries, 2 findings: 2 kind\n", ""},
+     "7 files, 5120 entries, 2 findings: 2 kind\nSnapshot: …", ""},
     {"a table with a type of its own, beside two that agree",
      "cd own; mkdir -p volume3/@iSCSI/EP; cp volume2/@iSCSI/EP/EP_TBL volume3/@iSCSI/EP; "
      "printf '\\11' | dd of=volume1/@iSCSI/EP/EP_TBL bs=1 seek=16 conv=notrunc status=none; "
      "epinspect --root . check; epinspect --root . check --json | grep -o 'stored.*otherFile\\|rules.:{[^}]*'", 0,
      table1 + ": kind: type 9, the table file /volume2/@iSCSI/EP/EP_TBL has 1\n"
-     "11 files, 4352 entries, 1 finding: 1 kind\n" + uncompared + table1 + "\n"
+     "12 files, 5376 entries, 1 finding: 1 kind\n" + snapshot + uncompared + table1 + " and 1 more\n"
      R"(stored":9,"found":1,"otherFile)" "\n" R"(rules":{"kind":1)" "\n", ""},
     {"a name of four digits",
      "cd own/volume2/@iSCSI/EP; mv EP_DAT_00000 EP_DAT_0000; epinspect --root ../../.. check", 3,
      lun2 + ": LUN 2: missing-data-file: 128 entries in 2 runs, first entries 0-63: extent 16 and others, but there is "
-     "no EP_DAT_00000\n10 files, …\nNot compared: serial-number: not a name that the target gives to a data file: "
+     "no EP_DAT_00000\n11 files, …\nNot compared: serial-number: not a name that the target gives to a data file: "
      "/volume2/@iSCSI/EP/EP_DAT_0000\n", ""},
     {"nothing, whatever extent size is given beside the LUNs' own", "epinspect --root own check --extent-size 1G", 0,
-     "10 files, 4352 entries, 0 findings\n", ""},
+     "11 files, 5376 entries, 0 findings\n" + snapshot, ""},
 };
 // clang-format on
 
@@ -120,7 +125,7 @@ TEST_F(Losses, AreNamedWhateverHappensToAFile) {
             expect({"", command, fault.status, "…" + named + "…", ""});
         }
     }
-    expect({"", "epinspect --root own check", 0, "10 files, 4352 entries, 0 findings\n", ""});
+    expect({"", "epinspect --root own check", 0, "11 files, 5376 entries, 0 findings\n" + snapshot, ""});
 }
 
 }  // namespace

@@ -116,7 +116,7 @@ const Case cases[] = {
      "export KELPISCSIEP_LUNS=none; t", 0, "110111111111111", "…"},
     {"looks for every map of a LUN", "epsample s; rm s/volume2/@iSCSI/LUN/*; epinspect --root s find --pool 16 |"
      " tail -n 1; epinspect --root s find --pool 16 >out", 1,
-     "4096 entries in 1 map: 3 matches of 768 entries\n", says({
+     "5120 entries in 2 maps: 4 matches of 896 entries\n", says({
      "/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000" + missing,
      "/volume2/@iSCSI/LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000" + missing})},
 };

@@ -53,6 +53,7 @@ const Case cases[] = {
     {"sums up the maps of the sample store", "for m in store/volume*/@iSCSI/LUN/*; do "
      "epinspect map $m | tail -n 1; done", 0,
      "4096 entries in 402 runs: 2256 mapped, 0 unmapped, 1840 holes; 96 vpushed, 48 vpulled, 1200 synced\n"
+     "1024 entries in 7 runs: 176 mapped, 0 unmapped, 848 holes; 32 vpushed, 16 vpulled, 0 synced\n"
      "256 entries in 20 runs: 128 mapped, 0 unmapped, 128 holes; 48 vpushed, 16 vpulled, 112 synced\n", ""},
     {"takes a part, however small or large", "epinspect map seven --first=3 --count=1; epinspect map none; "
      "epinspect map holes --first 4095 --count 5000; epinspect map holes --first 19998 --count 18446744073709551615", 0,

@@ -87,7 +87,7 @@ const Case cases[] = {
      "jnl         24576  /var/db/iscsi/EP_JNL\ntbl         24576  /volume1/@iSCSI/EP/EP_TBL\nfri  …00000\n"
      "dat    6442475520  /volume1/@iSCSI/EP/EP_DAT_00001\nmap         57344  LUN 1  4096 entries\n"
      "      BLUN 6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11 lun1\n"
-     "      /volume1/@iSCSI/LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11lun1_00000\n"
+     "      /volume1/@iSCSI/LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11lun1_00000\nmap         32768  LUN 3  …\n"
      "tbl   …2/@iSCSI/EP/EP_TBL\nfri   …2/@iSCSI/EP/EP_FRI\ndat      16801792  /volume2/@iSCSI/EP/EP_DAT_00000\n"
      "map         26624  LUN 2  256 entries\n…lun2_00000\n", ""},
     {"list tells what LUNs lack", "mkdir far/volume3; for v in 091 -91 91x; do ln -s volume91 far/volume$v; "

@@ -5,6 +5,8 @@
 #include <cerrno>
 #include <fstream>
 #include <system_error>
+#include <utility>
+#include <vector>
 
 #include "StoreFiles.h"
 
@@ -16,6 +18,9 @@ constexpr std::uint32_t extentSize1 = 1048576;
 constexpr std::uint32_t extentSize2 = 65536;
 constexpr std::uint64_t entries2 = 256;
 constexpr std::uint64_t extentsPerDataFile = dataFileSpan / extentSize1;
+
+/// LUN 3 has as many as LUN 1 once had.
+std::uint64_t entriesOfLun3(std::uint64_t entriesOfLun1) { return std::min<std::uint64_t>(entriesOfLun1, 1024); }
 
 /// The entries of LUN 1 repeat after as many, but for extent addresses, which go on.
 constexpr std::uint64_t cycle = 4096;
@@ -82,8 +87,20 @@ void writeEntriesOfLun1(const std::string& path, std::uint64_t entries) {
     if (!file) throw std::system_error(errno, std::generic_category(), path);
 }
 
-/// Writes volume 1, all for LUN 1.
-void writeVolume1(const std::string& root, const Lun& lun, std::uint64_t entries) {
+/// Of LUN 3, as a snapshot of LUN 1 would be: entries 640 to 799 are those of LUN 1, 416 to 431 are its own, at extents
+/// that LUN 1 never has.
+void writeMapOfLun3(const std::string& path, std::uint64_t entries) {
+    std::vector<std::pair<std::uint64_t, MapEntry>> stored;
+    for (std::uint64_t i = 416; i < 432 && i < entries; ++i) stored.push_back({i, {i, 0, true, false, false, false}});
+    for (std::uint64_t i = 640; i < 800 && i < entries; ++i) stored.push_back({i, entryOfLun1(i)});
+    EPFileBuilder map = mapFile(entries, stored.size(), 0);
+    map.set(head0::uuid, 0x42).set(epbuilder::map::parentUUID, 0x40);  // the UUID of LUN 1's map file
+    for (const auto& [index, entry] : stored) map.entry(index, entry.stored());
+    map.write(path);
+}
+
+/// Writes volume 1, for LUN 1 and its snapshot.
+void writeVolume1(const std::string& root, const std::vector<Lun>& luns, std::uint64_t entries) {
     const std::string folder = root + epFolder(1);
     const std::uint64_t dataFiles = 2 + (entries > 0 ? (entries - 1) / extentsPerDataFile : 0);
     tableFile(extentSize1, dataFiles).write(folder + "EP_TBL");
@@ -94,9 +111,10 @@ void writeVolume1(const std::string& root, const Lun& lun, std::uint64_t entries
         dataFile(number, extentSize1, extents, {0, 1, 514, 2047, 2048, 4095, 4096, 5200})
             .write(folder + dataFileName(number));
     }
-    const std::string mapPath = root + mapFilePath(lun);
+    const std::string mapPath = root + mapFilePath(luns[0]);
     mapHeaderOfLun1(entries).write(mapPath);
     writeEntriesOfLun1(mapPath, entries);
+    writeMapOfLun3(root + mapFilePath(luns[2]), entriesOfLun3(entries));
 }
 
 /// Writes volume 2, all for LUN 2: some runs, one of them backwards.
@@ -121,10 +139,12 @@ void writeSampleStore(const std::string& root, std::uint64_t mapEntries) {
          "/volume1", "lun1"},
         {2, extentSize2, entries2 * extentSize2, 0, 7, "THIN", "0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522", "/volume2",
          "lun2"},
+        {3, extentSize1, entriesOfLun3(mapEntries) * extentSize1, 1600000240, 263, "BLUN",
+         "91e80b7c-2d46-4f3a-a6c5-18d07f2b6e33", "/volume1", "lun1-snapshot"},
     };
     EPFileBuilder::journal().write(root + "/var/db/iscsi/EP_JNL");
     writeLunList(root, luns);
-    writeVolume1(root, luns[0], mapEntries);
+    writeVolume1(root, luns, mapEntries);
     writeVolume2(root, luns[1]);
 }
 
