@@ -81,24 +81,27 @@ const Case cases[] = {
      "EP_DAT_00000        3        at least 2        at most 1 …\n…"
      "alone\":null,\naloneAtMost\":0,\naloneAtMost\":4,\naloneBytes\":null,\n"
      "unclaimed\":null,\nunclaimedAtMost\":0,\nunclaimedAtMost\":1,\nunclaimedBytes\":null,\n",
-     "epinspect: " + luns + "THIN1_00000: cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)\n…"},
+     "epinspect: " + luns + "THIN1_00000: cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)\n"
+     "…"},
     {"counts a map of several names once, by the name that a LUN has",
      "ln -s THIN2_00000 r" + luns + "A; ln r" + luns + "THIN2_00000 r" + luns + "Z; rm r" + luns + "THIN[14]*; " +
      of + "usage --json --luns 2-2 | grep -o '\"lid\":.*\"alone\":[0-9]*\\|maps\":[0-9]*'", 0,
-     "\"lid\":2,…\"alone\":4\nmaps\":1\n", says({luns + "THIN2_00000: the same file as " + luns + "A, which counts once",
+     "\"lid\":2,…\"alone\":4\nmaps\":1\n", says({luns + "THIN2_00000: the same file as " + luns +
+     "A, which counts once",
      luns + "Z: the same file as " + luns + "THIN2_00000, which counts once"})},
     {"counts extents of another size, and of an unknown one, apart", "cp r" + luns + "THIN1_00000 r" + luns + "M; "
      "sed -i 's/1000003/4096/' r/var/db/iscsi/luns.json; " + of + "usage | grep /volume7,; " +
      of + "usage --extent-size 4K | grep -A 1 'LUN 1\\|unclaimed' | head -n 5", 0,
      "/volume7, extents of unknown size\n/volume7, extents of 4096 bytes\n/volume7, extents of 1000003 bytes\n"
-     "LUN 1 …8 …6 …5 …0 …5\n…\n--\n…unclaimed…\nEP_DAT_00000 …854 …3 …at most 851 …\n--\n",
+     "LUN 1 …8 …6 …5 …0 …5\n…\n…unclaimed…\nEP_DAT_00000 …854 …3 …at most 851 …\n--\n",
      "epinspect: " + luns + "M: extent size not known, give --extent-size: …volume7: extents of different sizes are "
      "counted apart: 4096, 1000003 bytes\n…"},
     {"finds no EP file", "mkdir none; epinspect --root none usage; epinspect --root none owner " + dat + "0 5", 1,
      "0 maps, 0 data files: 0 entries mapped, 0 extents in use, 0 shared by several\nmaps\n",
      "…none: no EP files found (EP_ERR_NO_PATH, 18990401)\nepinspect: " + dat + "0: cannot be opened: No such …\n"},
     {"draws what is free, in use and shared", "LC_ALL=C COLUMNS=20 " + of + "usage 2 --chart 2>err | tail -n 18", 0,
-     "…" + dat + "0\n0 |#S#|\nOne cell: 1 extent\n" + dat + "1\n0 |S#|\nOne cell: 1 extent\nIn use: . none\n        - <1/3\n"
+     "…" + dat + "0\n0 |#S#|\nOne cell: 1 extent\n" + dat + "1\n0 |S#|\nOne cell: 1 extent\nIn use: . none\n"
+     "        - <1/3\n"
      "        + <2/3\n        * most\n        # all\n        S some shared\n1 map, …", ""},
 
     {"names every owner of a byte, and no other", at0 + "24575 1024579 1024578 3024585 2024582", 1,
@@ -114,30 +117,41 @@ const Case cases[] = {
      "24570-24575: header block, before the first extent\n"
      "24576-1024578: LUN 1 bytes 4000012-5000014: entry 4, from byte 0 of its extent: mapped, pool 0, extent 4398034\n"
      "24576-1024578: LUN 2 bytes 3000009-4000011: entry 3, from byte 0 of its extent: mapped, pool 0, extent 4398034\n"
-     "1024579-2024581: LUN 2 bytes 2000006-3000008: entry 2, from byte 0 of its extent: mapped, pool 0, extent 4398035\n"
-     "2024582-3024584: LUN 1 bytes 7000021-8000023: entry 7, from byte 0 of its extent: mapped, pool 0, extent 4398036\n" +
-     withinFile, says({dat + "1: position 2024582: past the end, the file holds 2024582 bytes (EP_ERR_READ_FAILED, 18990039)"})},
+     "1024579-2024581: LUN 2 bytes 2000006-3000008: entry 2, from byte 0 of its extent: mapped, pool 0, extent "
+     "4398035\n"
+     "2024582-3024584: LUN 1 bytes 7000021-8000023: entry 7, from byte 0 of its extent: mapped, pool 0, extent "
+     "4398036\n" +
+     withinFile, says({dat + "1: position 2024582: past the end, the file holds 2024582 bytes (EP_ERR_READ_FAILED, "
+     "18990039)"})},
     {"writes owners as JSON", at1 + "24580 --json --extent-size 500 --count-from volume; " +
      at0 + "1024580-1024581 --json --address-bits 52", 0,
      R"({"kind":"position","file":")" + dat + R"(1","position":24580,"length":1,"where":"extent","owners":[]})" "\n"
-     R"({"kind":"position","file":")" + dat + R"(0","position":1024580,"length":2,"where":"extent","owners":[{"countFrom")"
-     R"(:"file","map":")" + luns + R"(THIN1_00000","lid":1,"index":1,"remainder":1,"lunOffset":1000004,"extentAddress":1,)"
+     R"({"kind":"position","file":")" + dat + R"(0","position":1024580,"length":2,"where":"extent",)"
+     R"("owners":[{"countFrom")"
+     R"(:"file","map":")" + luns + R"(THIN1_00000","lid":1,"index":1,"remainder":1,"lunOffset":1000004,)"
+     R"("extentAddress":1,)"
      R"("poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":false,"undecided":false},{…,"lid":1,)"
      R"("index":2,…},{…,"lid":2,"index":0,…}]})" "\n", ""},
-    {"leaves undecided from where extents are counted", "large truncate -s 5T r" + dat + "1; " + at1 + "24577 --address-bits 48; " +
+    {"leaves undecided from where extents are counted", "large truncate -s 5T r" + dat + "1; " + at1 +
+     "24577 --address-bits 48; " +
      at1 + "4398047218679 --address-bits 48; " + at1 + "24577 --address-bits 48 --count-from volume", 0,
      "24577: LUN 1 byte 4000013: entry 4, byte 1 of its extent: mapped, pool 0, extent 4398034, if extents are counted "
-     "within the data file\n24577: LUN 2 byte …\nassumed: …; ambiguous: by both ways of counting extents lie inside the "
+     "within the data file\n24577: LUN 2 byte …\n"
+     "assumed: …; ambiguous: by both ways of counting extents lie inside the "
      "data file, --count-from decides\n"
-     "4398047218679: LUN 1 byte …: entry 4, byte …, if extents are counted from the volume's start\n…LUN 2 …\nassumed: …\n"
+     "4398047218679: LUN 1 byte …: entry 4, byte …, if extents are counted from the volume's start\n…LUN 2 …\n"
+     "assumed: …\n"
      "24577: no map uses this\nassumed: …, as --count-from says\n", ""},
     {"is not sure of owners where a map cannot be read", "truncate -s 99 r" + luns + "THIN1*; " + at1 + "1999999;"
      "rm r" + luns + "THIN2*; " + at1 + "1999999", 1,
      "1999999: LUN 2 byte …\n…1999999: no map that could be read uses this\n…", "…ends too early…No such file…"},
-    {"takes a data file of a volume alone", "cp r" + dat + "0 r/x; ln -s EP_DAT_00000 r" + dat + "2; for f in r/x " + luns +
+    {"takes a data file of a volume alone", "cp r" + dat + "0 r/x; ln -s EP_DAT_00000 r" + dat + "2; for f in r/x " +
+     luns +
      "THIN1_00000 " + dat + "3; do " + of + "owner $f 0; done; " + at0 + "9223372036854775808; " + at0 + "5-4", 2, "",
-     "epinspect: r/x: its path names no volume (…)\nepinspect: " + luns + "THIN1_00000: not a name that the target gives to "
-     "a data file (…)\nepinspect: " + dat + "3: cannot be opened: No such …)\nepinspect: POSITION: '9223372036854775808': "
+     "epinspect: r/x: its path names no volume (…)\nepinspect: " + luns + "THIN1_00000: not a name that the target "
+     "gives to "
+     "a data file (…)\nepinspect: " + dat + "3: cannot be opened: No such …)\n"
+     "epinspect: POSITION: '9223372036854775808': "
      "number out of range. Try …\nepinspect: POSITION: '5-4': range runs backwards. Try …\n"},
 };
 // clang-format on
