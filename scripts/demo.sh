@@ -45,6 +45,12 @@ say "Where byte 540000000 of LUN 1 lies, and what its extent starts with"
 inspect locate 1 540000000
 inspect read 1 --offset 514M --length 64 | cat
 
+say "Whose space it is: LUN 3 is a snapshot of LUN 1"
+inspect usage
+
+say "Which LUN a bad sector hurts"
+inspect owner /volume1/@iSCSI/EP/EP_DAT_00001 700000000
+
 say "Who uses an extent"
 inspect find --extent 4194816-4194818
 

@@ -21,7 +21,8 @@ const std::string lun1 = volume1 + "LUN/BLUN6f1c1d0a-58d3-4e0f-9b51-2f7a9c5e0d11
 const std::string lun2 = volume2 + "LUN/THIN0b9d2f64-7c1e-4a55-8a3b-90c4d7e6f522lun2_00000";
 
 const std::string gone1 = lun1 + ": LUN 1: missing-data-file: ", no1 = " and others, but there is no EP_DAT_00001\n";
-const std::string gone3 = volume1 + "LUN/BLUN91e80b7c-2d46-4f3a-a6c5-18d07f2b6e33lun1-snapshot_00000: LUN 3: "
+const std::string gone3 = volume1 +
+                          "LUN/BLUN91e80b7c-2d46-4f3a-a6c5-18d07f2b6e33lun1-snapshot_00000: LUN 3: "
                           "missing-data-file: ";
 const std::string snapshot = "Snapshot: …: LUN 3: shares 160 entries with its parent LUN 1, …\n";
 const std::string uncompared = "Not compared: extent-size: no table file that can be compared: ";
