@@ -96,6 +96,10 @@ const Case cases[] = {
      "LUN 1 …8 …6 …5 …0 …5\n…\n…unclaimed…\nEP_DAT_00000 …854 …3 …at most 851 …\n--\n",
      "epinspect: " + luns + "M: extent size not known, give --extent-size: …volume7: extents of different sizes are "
      "counted apart: 4096, 1000003 bytes\n…"},
+    {"leaves out what the target calls no data file", "for n in 0001 2097152; do cp r" + dat + "0 r/volume7/@iSCSI/EP/"
+     "EP_DAT_$n; done; " + of + "usage 2 | tail -n 2", 0, "1 map, 2 data files: …\n", "…" + says({
+     "/volume7/@iSCSI/EP/EP_DAT_2097152: not a data file of the target, left out",
+     "/volume7/@iSCSI/EP/EP_DAT_0001: not a data file of the target, left out"})},
     {"finds no EP file", "mkdir none; epinspect --root none usage; epinspect --root none owner " + dat + "0 5", 1,
      "0 maps, 0 data files: 0 entries mapped, 0 extents in use, 0 shared by several\nmaps\n",
      "…none: no EP files found (EP_ERR_NO_PATH, 18990401)\nepinspect: " + dat + "0: cannot be opened: No such …\n"},

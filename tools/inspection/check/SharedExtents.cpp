@@ -16,7 +16,7 @@ namespace tool = ISCSI::TOOL;
 
 namespace {
 
-/// A list of uses holds up to half as much again while it grows.
+/// A list of uses takes up to twice what it holds.
 constexpr std::uint64_t growth = 2;
 
 }  // namespace
@@ -170,7 +170,7 @@ void SharedExtents::sweep(const Uses& uses, Each&& each) {
 }
 
 /// Whether `one` is the map that the other one names as its parent.
-bool SharedExtents::isParent(const Map& one, const Map& other) const {
+bool SharedExtents::isParent(const Map& one, const Map& other) {
     return one.uuid == other.parentUUID && one.uuid != other.uuid &&
            one.uuid.find_first_not_of("0-") != std::string::npos;
 }

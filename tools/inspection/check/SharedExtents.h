@@ -77,7 +77,7 @@ private:
     void checkVolume(Volume& volume);
     void append(Uses& uses, const Use& use);
     bool collect(Volume& volume, std::uint32_t map, Uses& uses);
-    bool isParent(const Map& one, const Map& other) const;
+    static bool isParent(const Map& one, const Map& other);
     void reportPiece(const Piece& piece, bool alike);
     void giveUp();
 

@@ -1,6 +1,7 @@
 #include "store/ExtentsInUse.h"
 
 #include <etc/ISCSIEPDiagnostics.h>
+#include <etc/ISCSIEPFormat.h>
 
 #include <algorithm>
 #include <limits>
@@ -13,6 +14,13 @@
 namespace inspection {
 
 namespace tool = ISCSI::TOOL;
+
+namespace {
+
+/// The data files of a volume end before byte 2^63 of it.
+constexpr std::uint64_t mostDataFiles = (std::uint64_t{1} << 63U) / tool::EP_DAT_FILE_SPAN;
+
+}  // namespace
 
 ExtentsInUse::ExtentsInUse(Context& context, const Volume& volume, std::optional<std::uint32_t> extentSize,
                            std::optional<AddressBits> addressBits)
@@ -119,7 +127,11 @@ void ExtentsInUse::countDataFiles() {
     DataFiles files(context_, volume_.folder + "/", false);
     for (const StoreFile& file : volume_.dataFiles) {
         const auto number = dataFileNumberIn(file.targetPath);
-        if (number && !file.misnamed) rowAt(rows, files, *number);
+        if (number && !file.misnamed && *number < mostDataFiles) {
+            rowAt(rows, files, *number);
+        } else {
+            context_.remark(file.path, "not a data file of the target, left out");
+        }
     }
     used_.forEach([&](std::uint64_t first, std::uint64_t count) { addUse(rows, files, first, count, false); });
     shared_.forEach([&](std::uint64_t first, std::uint64_t count) { addUse(rows, files, first, count, true); });

@@ -41,8 +41,7 @@ struct VolumesChoice {
 class Volumes {
 public:
     /// The volumes that the choice names, each with all its maps. A file of several names counts once. Loads LUNs as
-    /// ChosenFiles does, and reports what fails. It is a failure when the
-    /// extent size of a map is not known.
+    /// ChosenFiles does, and reports what fails; that includes a map whose extent size is not known.
     Volumes(Context& context, const VolumesChoice& choice);
 
     /// Calls each(volume) in the order of their numbers, those without one last.
