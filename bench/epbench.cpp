@@ -91,14 +91,15 @@ void uuidFloor(benchmark::State& state) {
     }
 }
 
-/// A map file of `count` mapped entries, whose extent addresses advance by `step`: by 1 they are one run, by 2 as many
-/// runs as entries.
-std::string writeMap(const std::string& name, std::uint64_t count, std::uint64_t step) {
+/// A map file of `count` mapped entries, whose extent addresses advance by `step`, and start again at `end`: by 1 they
+/// are one run, by 2 as many runs as entries.
+std::string writeMap(const std::string& name, std::uint64_t count, std::uint64_t step,
+                     std::uint64_t end = std::uint64_t{1} << 48U) {
     const std::string path = write(name, EPFileBuilder::map().resize(dataStart));
     std::ofstream file(path, std::ios::binary | std::ios::app);
     std::string block;
     for (std::uint64_t i = 0; i < count; ++i) {
-        block += epbuilder::littleEndian(i * step | 1ULL << 63U, 8);
+        block += epbuilder::littleEndian(i * step % end | 1ULL << 63U, 8);
         if (block.size() == 1U << 20U || i + 1 == count) {
             file << block;
             block.clear();
@@ -188,6 +189,27 @@ const std::string& lunRoot() {
         return folder() + "/lun";
     }();
     return root;
+}
+
+constexpr const char* scatteredMap = "space/volume1/@iSCSI/LUN/m";
+constexpr const char* scatteredData = "space/volume1/@iSCSI/EP/EP_DAT_00000";
+
+/// A map in a store of its own, whose entries use all extents of a data file of 4 TiB, each once, in an order without
+/// runs.
+const std::string& scatteredMapFile() {
+    static const std::string path = [] {
+        write(scatteredData, EPFileBuilder::data().resize(dataStart + (std::uint64_t{1} << 42U)));
+        std::filesystem::create_directories(std::filesystem::path(folder() + "/" + scatteredMap).parent_path());
+        return writeMap(scatteredMap, longMapEntries, 40503001, longMapEntries);
+    }();
+    return path;
+}
+
+/// A command on that store, whose extents have 64 KiB.
+void spaceProgram(benchmark::State& state, const std::string& command, const std::string& words) {
+    shell(state,
+          EPINSPECT " " + command + " --root '" + scatteredMapFile().substr(0, folder().size() + 6) + "' " + words,
+          longMapEntries);
 }
 
 void lunProgram(benchmark::State& state) {
@@ -344,9 +366,14 @@ int main(int argc, char** argv) {
     add("map/fragments as a chart", mapProgram, fragmentedMapFile, mapEntries, EPINSPECT " map --chart");
     add("map/fragments, od", mapProgram, fragmentedMapFile, mapEntries, "od -An -v -tx8 -j24576");
     add("map/find", mapProgram, longMapFile, longMapEntries, EPINSPECT " find --pool 1");
-    add("map/check", mapProgram, longMapFile, longMapEntries, EPINSPECT " check --extent-size 1M --luns 0");
-    add("map/check of fragments", mapProgram, fragmentedMapFile, mapEntries,
-        EPINSPECT " check --extent-size 1M --luns 0");
+    add("map/check", mapProgram, longMapFile, longMapEntries, EPINSPECT " check --extent-size 1M");
+    add("map/check of fragments", mapProgram, fragmentedMapFile, mapEntries, EPINSPECT " check --extent-size 1M");
+    const std::string size = "--extent-size 64K ";
+    add("map/scattered", mapProgram, scatteredMapFile, longMapEntries, EPINSPECT " map");
+    add("map/check of scattered", spaceProgram, std::string("check"), size);
+    add("map/usage of scattered", spaceProgram, std::string("usage"), size);
+    add("map/owner in scattered", spaceProgram, std::string("owner"),
+        size + "/volume1/@iSCSI/EP/EP_DAT_00000 123456789012");
     add("map/diff", comparison, EPINSPECT " diff");
     add("map/cmp", comparison, "cmp");
     add("lun/read", lunProgram);
@@ -377,6 +404,10 @@ int main(int argc, char** argv) {
     reporter.printRatio("epinspect find: time against map", "map/find", "map/one run");
     reporter.printRatio("epinspect check: time against map", "map/check", "map/one run");
     reporter.printRatio("epinspect check of fragments: time against map", "map/check of fragments", "map/fragments");
+    for (const char* command : {"check of", "usage of", "owner in"}) {
+        reporter.printRatio(std::string("epinspect ") + command + " scattered extents: time against map",
+                            std::string("map/") + command + " scattered", "map/scattered");
+    }
     reporter.printRatio("epinspect diff: time against map", "map/diff", "map/one run");
     reporter.printRatio("epinspect diff: speed against cmp", "map/cmp", "map/diff");
     reporter.printRatio("epinspect read of a long run: speed against dd bs=1M", "lun/dd", "lun/read");
