@@ -95,6 +95,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
     inspect({"entry", other, small, offset});
     inspect({"locate", "1", small, offset});
     inspect({"locate", other, offset, "--extent-size", sizeOfExtents, "--address-bits", "48"});
+    inspect({"usage", "--luns", "1-2", "--extent-size", sizeOfExtents, "--chart"});
+    inspect({"owner", data, "0-" + offset, small, "--extent-size", sizeOfExtents, "--json"});
     inspect({"read", "1", "--offset", small, "--length", length, "--count-from", "file"});
     inspect({"read", "1", "--output", image, "--offset", small, "--json"});
     inspect({"extent", data, small, "--extent-size", length});

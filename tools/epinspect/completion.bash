@@ -11,7 +11,7 @@ _epinspect_files() {
 
 _epinspect() {
     local word before command='' kind='' root='' files='' piece replaced pieces=() typed=() index
-    local commands='list dump check collect map entry diff find locate read extent lun path help' kinds='tbl fri jnl map dat'
+    local commands='list dump check usage collect map entry diff find locate owner read extent lun path help' kinds='tbl fri jnl map dat'
     local common='--root --verbose --help'
     COMPREPLY=()
     # The words as the shell will see them: bash breaks them at "=" and "@".
@@ -49,11 +49,13 @@ _epinspect() {
         list) options+=' --luns --json' ;;
         dump) options+=' --as --json' ;;
         check) options+=' --each --luns --extent-size --json' ;;
+        usage) options+=' --luns --extent-size --address-bits --chart --json' ;;
         collect) options+=' --luns' ;;
         entry | lun) options+=' --json' ;;
         diff) options+=' --headers --entries --json' ;;
         find) options+=' --extent --pool --luns --json' ;;
         locate) options+=' --extent-size --address-bits --count-from --json' ;;
+        owner) options+=' --extent-size --address-bits --count-from --luns --json' ;;
         read) options+=' --offset --length --output --json --extent-size --address-bits --count-from' ;;
         map) options+=' --first --count --chart --json' ;;
         extent) options+=' --extent-size --raw' ;;
