@@ -32,6 +32,13 @@ protected:
         write("r" + luns + "THIN1_00000", mapOf({m, m + 1, m + 1, m + 3, m + first1, 0, 5, m + first1 + 2}));
         write("r" + luns + "THIN2_00000", mapOf({m + pool16 + 1, m + 2, m + first1 + 1, m + first1}));
         write("r" + luns + "THIN4_00000", mapOf({m + ambiguous + 2}));
+        std::vector<std::uint64_t> one, other;  // 25000 stretches of the volume, and three extents in common
+        for (std::uint64_t i = 0; i < 25000; ++i) {
+            one.push_back(m + (i << 16U));
+            other.push_back(m + (i << 16U) + (i < 3 ? 0 : 1));
+        }
+        write("wide" + luns + "one", mapOf(one));
+        write("wide" + luns + "other", mapOf(other));
     }
 
     static constexpr std::uint64_t first1 = 4398034;
@@ -96,6 +103,9 @@ const Case cases[] = {
      "LUN 1 …8 …6 …5 …0 …5\n…\n…unclaimed…\nEP_DAT_00000 …854 …3 …at most 851 …\n--\n",
      "epinspect: " + luns + "M: extent size not known, give --extent-size: …volume7: extents of different sizes are "
      "counted apart: 4096, 1000003 bytes\n…"},
+    {"counts what is shared where memory does not last for the extents of all maps",
+     "epinspect --root wide usage --extent-size 4K --json | grep -o 'alone\":[0-9]*\\|\"shared\":[0-9]*,\"s'", 0,
+     "alone\":24997\n\"shared\":3,\"s\nalone\":24997\n\"shared\":3,\"s\n\"shared\":3,\"s\n\"shared\":0,\"s\n", "…"},
     {"leaves out what the target calls no data file", "for n in 0001 2097152; do cp r" + dat + "0 r/volume7/@iSCSI/EP/"
      "EP_DAT_$n; done; " + of + "usage 2 | tail -n 2", 0, "1 map, 2 data files: …\n", "…" + says({
      "/volume7/@iSCSI/EP/EP_DAT_2097152: not a data file of the target, left out",
