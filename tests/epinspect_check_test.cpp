@@ -170,7 +170,8 @@ R"("rule":"kind","stored":3,"found":"fri"
      R"("notCompared":["missing-data-file, beyond-data-file: entries with bits 48 to 51 set: address-bits_00000"],)"
      R"("changed":[],"snapshots":[]}
 )", ""},
-    {"check multiplies in 64 bits", "epsample s; printf '\\0\\20\\0\\0\\0\\20' | dd of=$(echo s/volume1/*/LUN/*lun1_00000) bs=1 "
+    {"check multiplies in 64 bits", "epsample s; printf '\\0\\20\\0\\0\\0\\20' | dd of=$(echo "
+     "s/volume1/*/LUN/*lun1_00000) bs=1 "
      "seek=76 conv=notrunc status=none; epinspect check --root s", 3,
      "…: lun-size: 17592186048512 entries of 1048576 bytes are more than 18446744073709551615 bytes, the LUN has …\n"
      "…: total-count: 17592186048512 stored, 4096 entries found\n…2 findings: …\n", ""},
@@ -205,7 +206,10 @@ R"("rule":"kind","stored":3,"found":"fri"
      "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",
      "…LUN 0-255: none is known: The LUN list ./var/db/iscsi/luns.json is missing or cannot be read: No such file or "
      "directory (code 9002)\n"},
-    {"check writes findings as JSON", "epinspect check x y --json | sed -n 3p", 0, R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","entries":1,"runs":1,"first":5,"count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by entry 1 of this map too"}
+    {"check writes findings as JSON", "epinspect check x y --json | sed -n 3p", 0,
+     R"({"kind":"finding","file":"x","rule":"shared-extents","stored":11,"found":"x","entries":1,"runs":1,"first":5,)"
+     R"("count":1,"otherFile":"x","otherFirst":1,"message":"x: shared-extents: entry 5: pool 0, extent 11, used by )"
+     R"(entry 1 of this map too"}
 )", ""},
     {"check says what it could not compare", "epsample s; cd s; sed -i 's,/volume2,/share,;"
      " s/lun1\"/new\"/' var/db/iscsi/luns.json;"

@@ -130,7 +130,8 @@ const Case cases[] = {
      R"({"kind":"field","file":")" + data2 + R"(","otherFile":")" + data2 + R"(","field":"size","a":16801792,"b":99999}
 {"kind":"summary","file":"own","otherFile":"b","summary":true,"files":12,"fields":2,"same":5376,…})" "\n",
      "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"},
-    {"an empty store is no success", "mkdir e; epinspect --root e collect c; echo $?; epinspect diff own e/ | tail -n 1; "
+    {"an empty store is no success", "mkdir e; epinspect --root e collect c; echo $?; epinspect diff own e/ |"
+     " tail -n 1; "
      "epinspect diff $PWD/e e", 1, "0 files and 0 LUNs collected, 0 bytes: c\n1\n"
      "11 files: 11 only in the first, …\n0 files: …\n",
      "epinspect: LUN 0-255: …\nepinspect: e: no EP files found (EP_ERR_NO_PATH, 18990401)\n" + incomplete +

@@ -74,7 +74,8 @@ const Case cases[] = {
     {"takes the volume from the path on the target", "epinspect --root store path tbl store/./volume1/x; "
      "epinspect path fri store/volume1/x; epinspect path map 1 --root .", 1, "/volume1/@iSCSI/EP/EP_TBL\n",
      says({"store/volume1/x: path names no volume (EP_ERR_NO_PATH, 18990401)",
-           "LUN 1" + noLun + "The LUN list ./var/db/iscsi/luns.json is missing or cannot be read: No such file or directory (code 9002)"})},
+           "LUN 1" + noLun + "The LUN list ./var/db/iscsi/luns.json is missing or cannot be read: No such file or "
+           "directory (code 9002)"})},
     {"refuses extent addresses without a position", "for a in '8796093022207 --extent-size 1M' "
      "'8796093022208 --extent-size 1M' '9223372036854775808 --extent-size 1'; do "
      "epinspect path dat /volume1/x --extent-address $a; done", 1,
@@ -86,7 +87,8 @@ const Case cases[] = {
     {"looks for the LUN list below root only", "mkdir -p r/var/db/iscsi; ln -s ../../../../luns.json r/var/db/iscsi; "
      "epinspect --root r/ lun 7 8", 1, "",
      says({"/var/db/iscsi/luns.json" + leadsOut,
-           "LUN 7" + noLun + "The LUN list /dev/null is missing or cannot be read: Invalid argument (code 9002)", "LUN 8…"})},
+           "LUN 7" + noLun + "The LUN list /dev/null is missing or cannot be read: Invalid argument (code 9002)",
+           "LUN 8…"})},
     {"refuses links out of root", "mkdir r; cp data r/EP_DAT_1; ln -s EP_DAT_1 r/EP_DAT_2; ln -s ../data r/out; "
      "ln -s out r/in; cp data r2; ln -s ../r2 r/beside; epinspect --root r dump --json EP_DAT_1 EP_DAT_2 out in beside",
      1, "{\"kind\":\"dat\",…\n{\"kind\":\"dat\",…\n{\"kind\":\"error\",…{\"kind\":\"error\",…{\"kind\":\"error\",…\n",

@@ -37,7 +37,8 @@ const Case cases[] = {
      "10 files, 5376 entries, 2 findings: 2 missing-data-file\n" + snapshot +
      gone1 + "entries 512-767: extent 4194816" + no1 + gone1 + "entries 1536-1791: extent 4195840" + no1 +
      gone1 + "entries 3584-3839: extent 4197888" + no1 +
-     gone3 + "entries 640-767: extent 4194944" + no1 + "10 files, 5376 entries, 4 findings: 4 missing-data-file\n" + snapshot,
+     gone3 + "entries 640-767: extent 4194944" + no1 + "10 files, 5376 entries, 4 findings: 4 missing-data-file\n" +
+     snapshot,
      ""},
     {"all there is", "epinspect check --root none; mkdir none; epinspect check --root none", 1,
      "0 files, 0 entries, 0 findings\n"
@@ -47,7 +48,8 @@ const Case cases[] = {
     {"the table of a map that is named, which another file replaces or which is gone",
      "cd own; E=volume2/@iSCSI/EP M=volume2/@iSCSI/LUN; cp $E/EP_TBL EP; cp $M/* $E/EP_TBL;"
      "epinspect --root . check $E/EP_TBL $M/* | head -n 1; rm $E/EP_TBL; epinspect --root . check $M/* | head -n 1; "
-     "printf '\\3' | dd of=EP bs=1 seek=16 conv=notrunc status=none; mv EP $E/EP_TBL; epinspect --root . check 2; rm $E/EP_TBL; "
+     "printf '\\3' | dd of=EP bs=1 seek=16 conv=notrunc status=none; mv EP $E/EP_TBL; epinspect --root . check 2;"
+     " rm $E/EP_TBL; "
      "cp var/db/iscsi/EP_JNL $E/EP_DAT_00000; epinspect --root . check $M/*", 1,
      "volume2/@iSCSI/EP/EP_TBL: kind: type 4, a map file, but named like a table file\n"
      "/volume2/@iSCSI/EP/EP_TBL: LUN 2: missing-file: no file, but this LUN needs it\n"

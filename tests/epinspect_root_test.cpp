@@ -84,7 +84,8 @@ const Case cases[] = {
      "epinspect --root r $c; done | grep -ac 'LUN 3'", 0, "2\n",
      "…LUN 3 bytes 0-4095: path names no volume (EP_ERR_NO_PATH, 18990401)\n…"},
     {"a map is missing only where nothing is", lun + closed + "mkdir -p r/volume1/@iSCSI/LUN; cp map r" + map +
-     "; for p in /../../volume1 volume1 /volume1/@iSCSI/.. /volume3 $(printf %0256d 0); do lun $p; epinspect --root r lun 3 --json; "
+     "; for p in /../../volume1 volume1 /volume1/@iSCSI/.. /volume3 $(printf %0256d 0); do lun $p;"
+     " epinspect --root r lun 3 --json; "
      "done | grep -o 'missing.*'; lun /volume1; chmod 644 r/volume1/@iSCSI; "
      "(closed epinspect --root r lun 3 --json); s=$?; chmod 755 r/volume1/@iSCSI; exit $s", 1,
      "missing\":false}\nmissing\":false}\nmissing\":false}\nmissing\":true}\nmissing\":null}\n"
