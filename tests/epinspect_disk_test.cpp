@@ -82,7 +82,7 @@ const Case cases[] = {
      "--output i); echo $?; ls", 0, "1\n1\ndisk\nfour\nimage\nstore\n",
      says({data + "0: bytes 1048576-1048580: …", "i: removed, nothing could be read",
            "i: removed, nothing was written to it: File too large"})},
-    {"what is missing is said before an interrupted read ends", "rm disk" + data + "1; mkfifo p; " + ofDisk +
+    {"an interrupted read reports what is missing before it ends", "rm disk" + data + "1; mkfifo p; " + ofDisk +
      "--offset 640K >p & exec 3<p; head -c 1 <&3 >byte; kill -TERM $!; wait $!; echo $?", 0, "143\n",
      says({data + "1: LUN 1 bytes 655360-786431: " + cannotOpen}) + "…"},
     {"JSON is of an image only", ofDisk + "--json", 2, "",

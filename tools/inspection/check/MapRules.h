@@ -1,4 +1,4 @@
-// Rules for a map file: what its header says of its entries, and what the entries point at.
+// Rules for a map file: its header against its entries, and where the entries point.
 #pragma once
 
 #include <ISCSIEPFileMAP.h>

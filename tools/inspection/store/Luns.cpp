@@ -23,7 +23,7 @@ struct Miss {
     int reason;
     std::vector<std::string> log;
 
-    /// Whether the configuration is damaged: nothing else is said that way.
+    /// Whether the configuration is damaged: that reason stands for nothing else.
     bool isDamage() const { return reason == EBADMSG; }
 };
 
