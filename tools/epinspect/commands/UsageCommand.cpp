@@ -53,8 +53,7 @@ void run(const UsageOptions& options, Session& session) {
 
 void addUsage(Command& parent, Session& session) {
     const auto options = std::make_shared<UsageOptions>();
-    Command& command =
-        parent.add("usage", "Show who uses the space: LUNs alone or together, and of data files how much");
+    Command& command = parent.add("usage", "Show who uses the space, by LUN and by data file");
     command.arguments("MAP", "Maps to show: LUN ids, or paths of map files (default: all of the store)",
                       options->volumes.names, parseMap, Command::Need::severalOrNone);
     addLunsOption(command, options->volumes.lids);
