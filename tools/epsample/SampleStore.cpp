@@ -91,8 +91,9 @@ void writeEntriesOfLun1(const std::string& path, std::uint64_t entries) {
 /// that LUN 1 never has.
 void writeMapOfLun3(const std::string& path, std::uint64_t entries) {
     std::vector<std::pair<std::uint64_t, MapEntry>> stored;
-    for (std::uint64_t i = 416; i < 432 && i < entries; ++i) stored.push_back({i, {i, 0, true, false, false, false}});
-    for (std::uint64_t i = 640; i < 800 && i < entries; ++i) stored.push_back({i, entryOfLun1(i)});
+    for (std::uint64_t i = 416; i < 432 && i < entries; ++i)
+        stored.emplace_back(i, MapEntry{i, 0, true, false, false, false});
+    for (std::uint64_t i = 640; i < 800 && i < entries; ++i) stored.emplace_back(i, entryOfLun1(i));
     EPFileBuilder map = mapFile(entries, stored.size(), 0);
     map.set(head0::uuid, 0x42).set(epbuilder::map::parentUUID, 0x40);  // the UUID of LUN 1's map file
     for (const auto& [index, entry] : stored) map.entry(index, entry.stored());

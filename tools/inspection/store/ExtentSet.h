@@ -142,7 +142,8 @@ void ExtentSet::add(const std::array<std::uint64_t, most>& extents, std::size_t 
     for (std::size_t i = 0; i < count; ++i) {
         const std::uint64_t number = extents[i] / pageExtents;
         const Bits* bits = number < near_.size() ? near_[static_cast<std::size_t>(number)].bits.get() : nullptr;
-        if (bits != nullptr) __builtin_prefetch(&(*bits)[extents[i] % pageExtents / wordBits], 1);
+        if (bits != nullptr)
+            __builtin_prefetch(&(*bits)[static_cast<std::size_t>(extents[i] % pageExtents / wordBits)], 1);
     }
     for (std::size_t i = 0; i < count; ++i) {
         Page& page = pageAt(extents[i] / pageExtents);
@@ -176,7 +177,7 @@ void ExtentSet::visitPage(std::uint64_t number, const Page& page, unsigned int f
     for (std::uint64_t at = first; at < first + count;) {
         const auto bit = static_cast<unsigned int>(at % wordBits);
         const Word wanted = mask(bit, first + count - at);
-        visitWord(start + at - bit, (*page.bits)[at / wordBits] & wanted, visit);
+        visitWord(start + at - bit, (*page.bits)[static_cast<std::size_t>(at / wordBits)] & wanted, visit);
         at += wordBits - bit;
     }
 }
