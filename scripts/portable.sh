@@ -9,15 +9,16 @@ cd "$(dirname "$0")/.."
 fail() { echo "scripts/portable.sh: $*" >&2; exit 1; }
 
 architecture=${1:-armel}
+build=Release
 case $architecture in # the oldest processor that Debian's programs for it run on
   armel) compiler=g++-arm-linux-gnueabi processor=arm926 ;;
   armhf) compiler=g++-arm-linux-gnueabihf processor=cortex-a8 ;;
-  amd64) compiler=g++ processor= ;;
+  amd64) compiler=g++ processor= build=MinSizeRel ;; # as Release too large
   *) echo "scripts/portable.sh: unknown architecture '$architecture', known: armel armhf amd64" >&2 && exit 2 ;;
 esac
 need "${build_packages[@]}" binutils jq "$compiler" ${processor:+qemu-user-static}
 setup=(-DISCSIEPTOOL_STATIC=ON -DBUILD_TESTING=OFF -DISCSIEPTOOL_BUILD_BENCH=OFF -DCMAKE_UNITY_BUILD=ON
-  -DCMAKE_BUILD_TYPE=Release "-DCMAKE_CXX_FLAGS_RELEASE=-O2 -DNDEBUG")
+  "-DCMAKE_BUILD_TYPE=$build" "-DCMAKE_CXX_FLAGS_RELEASE=-O2 -DNDEBUG")
 if [ "$processor" ]; then
   setup+=("-DCMAKE_TOOLCHAIN_FILE=$PWD/cmake/$architecture.cmake")
 elif [ "$(dpkg --print-architecture)" != amd64 ]; then
