@@ -13,7 +13,7 @@ build=Release
 case $architecture in # the oldest processor that Debian's programs for it run on
   armel) compiler=g++-arm-linux-gnueabi processor=arm926 ;;
   armhf) compiler=g++-arm-linux-gnueabihf processor=cortex-a8 ;;
-  amd64) compiler=g++ processor= build=MinSizeRel ;; # as Release too large
+  amd64) compiler=g++ processor='' build=MinSizeRel ;; # as Release too large
   *) echo "scripts/portable.sh: unknown architecture '$architecture', known: armel armhf amd64" >&2 && exit 2 ;;
 esac
 need "${build_packages[@]}" binutils jq "$compiler" ${processor:+qemu-user-static}
