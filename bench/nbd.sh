@@ -5,6 +5,8 @@
 # of disk, and 2 GiB of memory for the image.
 set -euo pipefail
 build=$(realpath "${1:-build/release}") other=${2:+$(realpath "$2")}
+plugin=$build/lib/nbdkit-ep-plugin.so
+[ -e "$plugin" ] || { echo "$plugin is not there: it is built where nbdkit-plugin-dev is installed" >&2; exit 1; }
 scratch=$(mktemp -d "${TMPDIR:-/var/tmp}/epnbdXXXXXX")
 image=$(mktemp -u /dev/shm/epnbdXXXXXX)
 trap 'rm -rf "$scratch" "$image"' EXIT
@@ -29,7 +31,7 @@ nbdcopied() { nbdkit -U - "$@" --run 'nbdcopy --connections=4 "$uri" null:'; }
 written() { "$@" >"$image"; }
 for _ in {1..7}; do
   run "file plugin" nbdcopied file disk
-  run "ep plugin" nbdcopied "$build/lib/nbdkit-ep-plugin.so" 1 root=store
+  run "ep plugin" nbdcopied "$plugin" 1 root=store
   run "read > image" written "$build/bin/epinspect" --root store read 1
   run "read --output image" "$build/bin/epinspect" --root store read 1 --output "$image"
   run "dd bs=1M > image" written dd if=disk bs=1M status=none
