@@ -190,8 +190,10 @@ TEST_F(Disk, AnyRangeIsReadAsTheStoreIsNow) {
     bytes.readData({LunPart::Kind::data, 524288, 262144, 1, 1572864}, reinterpret_cast<unsigned char*>(rest.data()),
                    [&](const LunPart& part) { return !(lost += messageOf(bytes.failureOf(part))).empty(); });
     EXPECT_EQ(image_.substr(524288, 100001) + std::string(162143, '\0'), rest);
-    EXPECT_EQ(data + "1: LUN 1 bytes 624289-786431: past the end, the file holds 1672865 bytes of extents "
-              "(EP_ERR_READ_FAILED, 18990039)", lost);
+    EXPECT_EQ(data +
+                  "1: LUN 1 bytes 624289-786431: past the end, the file holds 1672865 bytes of extents "
+                  "(EP_ERR_READ_FAILED, 18990039)",
+              lost);
     fs::resize_file(file, size / 2);
     EXPECT_LT(100000U, check(": past the end, the file holds "));
     fs::resize_file(file, size);  // what was cut off reads as zeros now, without a failure

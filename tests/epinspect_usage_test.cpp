@@ -83,10 +83,12 @@ const Case cases[] = {
      R"({"kind":"summary","file":null,"summary":true,"maps":1,"dataFiles":2,"mapped":4,"extents":4,"shared":3,)"
      R"("changed":[]})" "\n", ""},
     {"is not sure where a map cannot be read", "rm r" + luns + "THIN1*; " + of + "usage 2; " +
-     of + "usage --json | grep -o 'alone[^,]*,\\|unclaimed[^,]*,' | LC_ALL=C sort -u", 0,
+     of + "usage --json | grep -o 'alone[^,]*,\\|unclaimed[^,]*,\\|shared\":null,\"sharedAtLeast\":0,\"ch' | "
+     "LC_ALL=C sort -u", 0,
      "…LUN 2               4                 4                4        at most 4    at least 0\n…"
-     "EP_DAT_00000        3        at least 2        at most 1 …\n…"
+     "EP_DAT_00000        3        at least 2        at most 1 …, at least 0 shared by\nseveral maps\n"
      "alone\":null,\naloneAtMost\":0,\naloneAtMost\":4,\naloneBytes\":null,\n"
+     "shared\":null,\"sharedAtLeast\":0,\"ch\n"
      "unclaimed\":null,\nunclaimedAtMost\":0,\nunclaimedAtMost\":1,\nunclaimedBytes\":null,\n",
      "epinspect: " + luns + "THIN1_00000: cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)\n"
      "…"},
@@ -103,6 +105,13 @@ const Case cases[] = {
      "LUN 1 …8 …6 …5 …0 …5\n…\n…unclaimed…\nEP_DAT_00000 …854 …3 …at most 851 …\n--\n",
      "epinspect: " + luns + "M: extent size not known, give --extent-size: …volume7: extents of different sizes are "
      "counted apart: 4096, 1000003 bytes\n…"},
+    {"counts apart where the LUN's extent size is 0", "sed -i 's/1000003/0/' r/var/db/iscsi/luns.json; " + of +
+     "usage | head -n 3; " + at0 + "24580", 1,
+     "/volume7, extents of unknown size\n       entries  mapped  extents …\n"
+     "LUN 1        8       6        5  at most 5  at least 0\n"
+     "24580: no map that could be read uses this\n" + assumed,
+     says({"LUN 1: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)", left,
+           "LUN 1: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)"})},
     {"counts what is shared where memory does not last for the extents of all maps",
      "epinspect --root wide usage --extent-size 4K --json | grep -o 'alone\":[0-9]*\\|\"shared\":[0-9]*,\"s'", 0,
      "alone\":24997\n\"shared\":3,\"s\nalone\":24997\n\"shared\":3,\"s\n\"shared\":3,\"s\n\"shared\":0,\"s\n", "…"},

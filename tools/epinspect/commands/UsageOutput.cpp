@@ -133,6 +133,7 @@ void UsageOutput::print(const ExtentsInUse& use) {
         dataFiles_.insert(file.path);
         if (chart_ && file.extents) drawDataFile(use, file);
     }
+    isSure_ = isSure_ && use.isComplete();
     extents_ += use.askedExtents();
     shared_ += use.askedShared();
 }
@@ -194,9 +195,13 @@ void UsageOutput::printSummary() const {
             .number("maps", maps_)
             .number("dataFiles", dataFiles_.size())
             .number("mapped", mapped_)
-            .number("extents", extents_)
-            .number("shared", shared_)
-            .texts("changed", session_.changedFiles());
+            .number("extents", extents_);
+        if (isSure_) {
+            json.number("shared", shared_);
+        } else {
+            json.null("shared").number("sharedAtLeast", shared_);
+        }
+        json.texts("changed", session_.changedFiles());
         if (!isAll_) json.boolean("incomplete", true);
         json.end();
         return;
@@ -205,8 +210,8 @@ void UsageOutput::printSummary() const {
     epinspect::print(wrapped((isAll_ ? "" : "without what could not be counted: ") + counted(maps_, "map", "maps") +
                                  ", " + counted(dataFiles_.size(), "data file", "data files") + ": " +
                                  counted(mapped_, "entry", "entries") + " mapped, " +
-                                 counted(extents_, "extent", "extents") + " in use, " + std::to_string(shared_) +
-                                 " shared by several maps",
+                                 counted(extents_, "extent", "extents") + " in use, " + (isSure_ ? "" : "at least ") +
+                                 std::to_string(shared_) + " shared by several maps",
                              outputWidth(), 0));
 }
 

@@ -33,6 +33,7 @@ private:
     const Session& session_;
     bool chart_;
     bool isAll_ = true;
+    bool isSure_ = true;  ///< all maps that could share an extent could be read
     std::set<std::string> dataFiles_;
     std::uint64_t maps_ = 0, mapped_ = 0, extents_ = 0, shared_ = 0;
 };
