@@ -92,7 +92,7 @@ const Case cases[] = {
      "0 files and 3 LUNs collected, 0 bytes: c\n1\n8\n10 files and 3 LUNs …: c\n"
      R"({"kind":"error","file":"c","error":null,"code":0,"message":"c: files may be missing, the collection is )"
      "incomplete\"}\n1\n1\n…", "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
-     "epinspect: c: a collection of …\n" + mayMiss + "…epinspect: " + table2 + ": cannot be opened: neither …)\n" +
+     "epinspect: c: a collection of …\n" + mayMiss + "…epinspect: " + table2 + ": cannot be opened: is a folder…)\n" +
      incomplete + "epinspect: c: a collection of …\n" + mayMiss + "…" + mayMiss + mayMiss},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
     damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not a collection's list"),

@@ -32,6 +32,9 @@ std::string json(const char* kind, const char* file, unsigned int type, const ch
 const std::string noFile =
     ": cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)";
 
+const std::string folder = ": cannot be opened: is a folder, not a file, --root names the folder of a store "
+                           "(EP_ERR_OPEN_FAILED, 18990038)";
+
 const Case cases[] = {
     {"shows files of every kind and goes on after a failure", "epinspect dump EP_TBL EP_FRI gone EP_DAT_7 @iSCSI/LUN/m "
      "EP_JNL 2>&1; epinspect dump EP_TBL", 0,
@@ -81,7 +84,7 @@ const Case cases[] = {
            "part: ends inside an entry, 5 of its 8 bytes are there"})},
     {"says why a file cannot be read", "mkfifo f; ln -s l l; truncate -s 24575 EP_TBL; "
      "epinspect dump EP_TBL - . f /dev/zero l \"$(printf 'a\\033\\nb')\"", 1, "",
-     says({"EP_TBL: ends too early (EP_ERR_READ_FAILED, 18990039)", "-" + missing, "." + noFile, "f" + noFile,
+     says({"EP_TBL: ends too early (EP_ERR_READ_FAILED, 18990039)", "-" + missing, "." + folder, "f" + noFile,
            "/dev/zero" + noFile,
            "l: cannot be opened: Too many levels of symbolic links (EP_ERR_OPEN_FAILED, 18990038)",
            "a\\x1b\\x0ab" + missing})},

@@ -59,13 +59,15 @@ const std::string noList = "The LUN list s/var/db/iscsi/luns.json is missing or 
 const Case cases[] = {
     {"takes an id wherever it takes a map", "for c in 'map M --json' 'map M --chart' 'entry M 0-9 --json' "
      "'find M --pool 0' 'find M --extent 4 --json' 'locate M 5M' 'locate M 5M --json' 'diff 2 M --json' "
-     "'read M --length 99K' 'check M --json'; do for m in 1 " + map1 + "; do "
+     "'read M --length 99K' 'check M --json' 'dump M'; do for m in 1 " + map1 + "; do "
      "epinspect --root store $(echo \"$c\" | sed s,M,$m,) >$(basename $m) || echo \"$c: $?\"; done; "
      "cmp 1 $(basename " + map1 + ") && test -s 1 || echo \"$c differs\"; done; "
-     "epinspect --root store map 1 | tail -n 1; epinspect --root store entry 2 1 --json", 0,
+     "epinspect --root store map 1 | tail -n 1; epinspect --root store entry 2 1 --json; "
+     "epinspect --root store dump 2 gone --json", 1,
      "diff 2 M --json: 3\ndiff 2 M --json: 3\n"
      "LUN 1: 4096 entries in …\n{\"kind\":\"entry\",\"file\":\"/volume2/@iSCSI/LUN/THIN…_00000\",\"lid\":2,\"index\":1,"
-     "…\n", ""},
+     "…\n{\"kind\":\"map\",\"file\":\"/volume2/@iSCSI/LUN/THIN…_00000\",\"lid\":2,\"head0Checksum\":…\n"
+     "{\"kind\":\"error\",\"file\":\"gone\",\"error\":…\n", "epinspect: gone: cannot be opened: …\n"},
     {"takes a file of digits after a dot", "cp store" + map1 + " 7; epinspect map ./7 | tail -n 1; epinspect map 7", 1,
      "4096 entries in …\n",
      says({"LUN 7: configuration cannot be loaded: The LUN list /var/db/iscsi/luns.json is missing or cannot be read: "

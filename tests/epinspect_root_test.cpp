@@ -76,9 +76,9 @@ const Case cases[] = {
      says({"b/b/out" + table + leadsOut, "/var/db/iscsi/luns.json" + leadsOut, noList, "/var/db/iscsi" + leadsOut,
            "/volume2/@iSCSI/EP" + leadsOut, "/volume2/@iSCSI/LUN" + leadsOut})},
     {"no more links are followed than by the system", tables + lun + "ln -s ." + table + " r/1; for i in $(seq 40); do "
-     "ln -s $i r/$((i + 1)); done; t --as tbl 40 41; lun /volume1; mv r/var/db/iscsi/luns.json .; ln -sf ../luns.json "
-     "r/1; ln -s /41 r/var/db/iscsi/luns.json; epinspect --root r lun 3", 1, in + refused,
-     says({"41" + tooMany, "/var/db/iscsi/luns.json" + tooMany, noList})},
+     "ln -s $i r/$((i + 1)); done; t --as tbl ./40 ./41; lun /volume1; mv r/var/db/iscsi/luns.json .; "
+     "ln -sf ../luns.json r/1; ln -s /41 r/var/db/iscsi/luns.json; epinspect --root r lun 3", 1, in + refused,
+     says({"./41" + tooMany, "/var/db/iscsi/luns.json" + tooMany, noList})},
     {"a path of the target is none that the user typed", lun + "lun \"$PWD/r\"; m=$PWD/r/@iSCSI/LUN; "
      "mkdir -p r/@iSCSI \"r$m\"; cp map \"r$m/THINun_00000\"; for c in list 'find --pool 0' 'read 3'; do "
      "epinspect --root r $c; done | grep -ac 'LUN 3'", 0, "2\n",

@@ -3,6 +3,7 @@
 
 #include "commands/Commands.h"
 #include "commands/HeaderOutput.h"
+#include "commands/MapArguments.h"
 #include "frame/Json.h"
 #include "frame/Output.h"
 #include "store/Doubts.h"
@@ -15,7 +16,7 @@ namespace tool = ISCSI::TOOL;
 namespace {
 
 struct DumpOptions {
-    std::vector<std::string> files;
+    std::vector<LunName> files;
     const FileKind* kind = nullptr;  ///< --as
 };
 
@@ -36,8 +37,10 @@ const FileKind* parseKind(const std::string& name) {
     return kind;
 }
 
-void dumpFile(const DumpOptions& options, Session& session, const std::string& name) {
-    const std::optional<std::string> path = session.openablePath(name, NamedBy::user);
+/// `lids` are those of the LUN whose map was named by its id.
+void dumpFile(const DumpOptions& options, Session& session, const std::string& name, NamedBy by,
+              const std::vector<std::uint32_t>& lids) {
+    const std::optional<std::string> path = session.openablePath(name, by);
     if (!path) return;
     const FileKind* byName = options.kind == nullptr ? kindByName(session.root.targetPath(name)) : nullptr;
     const FileKind* kind = options.kind != nullptr ? options.kind : byName;
@@ -49,7 +52,7 @@ void dumpFile(const DumpOptions& options, Session& session, const std::string& n
     remarkOnDataStart(session, *file, name);
     if (kind->type == tool::EP_FILE_TYPE_MAP) remarkOnPartialEntry(session, *file, name);
     if (session.json) {
-        Json object(name);
+        Json object(name, lids);
         object.begin(kind->name);
         for (const HeaderField& field : headerFieldsOf(*file)) writeValue(object, field.name, field);
         object.end();
@@ -59,19 +62,27 @@ void dumpFile(const DumpOptions& options, Session& session, const std::string& n
     print(file->toString());
 }
 
+void dumpNamed(const DumpOptions& options, Session& session, const LunName& name) {
+    if (!name.lid) {
+        dumpFile(options, session, name.file, NamedBy::user, {});
+    } else if (const std::optional<NamedMap> map = findMap(session, name)) {
+        dumpFile(options, session, map->file, map->by, map->lids());
+    }
+}
+
 }  // namespace
 
 void addDump(Command& parent, Session& session) {
     const auto options = std::make_shared<DumpOptions>();
     parent.add("dump", "Show the header block of EP files")
-        .arguments("FILE", "EP files", options->files)
+        .arguments("FILE", "EP files, or LUN ids for their maps", options->files, parseMap)
         .option("--as", "KIND",
                 "Kind of the files, whatever their name and type: tbl, map, dat, fri, jnl, or head for "
                 "HEAD[0] alone",
                 options->kind, parseKind)
         .flag("--json", "One JSON object per file", session.json)
         .action([options, &session] {
-            for (const std::string& name : options->files) dumpFile(*options, session, name);
+            for (const LunName& name : options->files) dumpNamed(*options, session, name);
         });
 }
 

@@ -49,7 +49,7 @@ std::optional<Failure> Located::obstacle(const std::string& name) const {
 
 std::optional<Failure> Located::obstacleToFile(const std::string& name) const {
     if (!isThere() || S_ISREG(mode) || S_ISBLK(mode)) return obstacle(name);
-    return cannotBeOpened(name, "neither a regular file nor a block device");
+    return cannotBeOpened(name, isFolder() ? "is a folder, not a file" : "neither a regular file nor a block device");
 }
 
 std::error_code TargetRoot::set(const std::string& folder) {
