@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# How much memory each command takes, in KiB, on maps of 1, 10 and 67 million entries: such as epsample makes, where every
-# tenth entry starts a run, and in "each a run" with extents at random on a volume of 64 TiB, where every entry does.
-# bench/memory.sh [BUILD_DIR]: needs 4 GiB of disk, GNU time and python3.
+# How much memory each command takes, in KiB, on maps of ENTRIES entries (default: 1, 10 and 67 million): such as epsample
+# makes, where every tenth entry starts a run, and in "each a run" with extents at random on a volume of 64 TiB, where
+# every entry does. bench/memory.sh [BUILD_DIR]: needs 4 GiB of disk, GNU time and python3.
 set -euo pipefail
 bin=$(realpath "${1:-build/release}")/bin
 scratch=$(mktemp -d "${TMPDIR:-/var/tmp}/epmemoryXXXXXX")
@@ -15,7 +15,7 @@ show() { # WHAT COMMAND...: findings and differences are no failure
   printf '%9d  %-22s %7d KiB\n' "$entries" "$1" "$(cat kib)"
 }
 
-for entries in 1000000 10000000 67108864; do
+for entries in ${ENTRIES:-1000000 10000000 67108864}; do
   rm -rf store
   "$bin/epsample" --map-entries "$entries" store
   inspect=("$bin/epinspect" --root store)

@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
-# How fast a LUN of 2 GiB, all mapped and in the page cache, is read: through the plugin against nbdkit's own file plugin
-# on the same bytes in one file, and by `read`, `read --output` and `dd` to files. The best of several runs in turn.
-# bench/nbd.sh [BUILD_DIR [OTHER_EPINSPECT]]: another program, an older version for instance, is measured too. Takes 4 GiB
-# of disk, and 2 GiB of memory for the image.
+# How fast a LUN of SIZE bytes (default 2G), all mapped and in the page cache, is read: through the plugin against nbdkit's own file plugin
+# on the same bytes in one file, and by `read`, `read --output` and `dd` to files. The best of ROUNDS (7) in turn.
+# bench/nbd.sh [BUILD_DIR [OTHER_EPINSPECT]]: another program, an older version for instance, is measured too. Takes twice
+# SIZE of disk, and SIZE of memory for the image.
 set -euo pipefail
 build=$(realpath "${1:-build/release}") other=${2:+$(realpath "$2")}
 plugin=$build/lib/nbdkit-ep-plugin.so
@@ -11,7 +11,7 @@ scratch=$(mktemp -d "${TMPDIR:-/var/tmp}/epnbdXXXXXX")
 image=$(mktemp -u /dev/shm/epnbdXXXXXX)
 trap 'rm -rf "$scratch" "$image"' EXIT
 cd "$scratch"
-head -c 2G /dev/urandom >disk
+head -c "${SIZE:-2G}" /dev/urandom >disk
 "$build/bin/epsample" --disk disk store
 cat disk store/volume1/@iSCSI/EP/EP_DAT_* >/dev/null
 
@@ -29,7 +29,7 @@ run() { # NAME COMMAND...
 # shellcheck disable=SC2016 # nbdkit sets uri
 nbdcopied() { nbdkit -U - "$@" --run 'nbdcopy --connections=4 "$uri" null:'; }
 written() { "$@" >"$image"; }
-for _ in {1..7}; do
+for ((round = 0; round < ${ROUNDS:-7}; ++round)); do
   run "file plugin" nbdcopied file disk
   run "ep plugin" nbdcopied "$plugin" 1 root=store
   run "read > image" written "$build/bin/epinspect" --root store read 1
@@ -39,6 +39,6 @@ for _ in {1..7}; do
 done
 cmp "$image" disk
 for name in "${!best[@]}"; do
-  printf '%-22s %8d ms %8d MiB/s\n' "$name" $((best[$name] / 1000)) $((2048 * 1000000 / best[$name]))
+  printf '%-22s %8d ms %8d MiB/s\n' "$name" $((best[$name] / 1000)) $(($(stat -c %s disk) * 1000000 / 1048576 / best[$name]))
 done | sort
 printf 'ep plugin against file plugin: %d %% of the speed\n' $((100 * best["file plugin"] / best["ep plugin"]))
