@@ -31,6 +31,9 @@ protected:
         write("pools", mapOf({m + pool1 + 4, m + pool1 + 5, 0, m + 5, m + 16 * pool1, 0, 5}));
         write("x", mapOf({m + 10, m + 11, m + 12, m + 13, 0, m + 11, pool1 + 12}));
         write("one", mapOf({0}));
+        write("first", mapOf({m + 50, m + 51}));
+        write("second", mapOf({0, 0, m + 52, m + 53}));
+        write("both", mapOf({m + 50, m + 51, m + 52, m + 53}));
         write("there", mapOf({m + 10, m + 11, m + 30}));
         write("back", mapOf({m + 30, m + 10, m + 11}));
         write("late", EPFileBuilder::data().set(head0::dataStartOffset, 24577));
@@ -190,6 +193,9 @@ R"("rule":"kind","stored":3,"found":"fri"
      "5 files, 20012 entries, 5 findings: 1 data-start, 1 unmapped-bits, 1 address-bits, 2 shared-extents\n"
      "Not compared: …the extent size is not known, give --extent-size: …shared-extents: maps in different folders "
      "whose paths name no volume\n", ""},
+    {"check names each map that shares", "epinspect check first second both", 3,
+     "both: shared-extents: entries 0-1: pool 0, extents 50-51, used by entries 0-1 of first too; …\n"
+     "both: shared-extents: entries 2-3: pool 0, extents 52-53, used by entries 2-3 of second too; …\n…", ""},
     {"check joins what two maps share", "epinspect check there back --json | sed -n '1s/.*\"entries/\"entries/p';"
      " epinspect check there back --each | grep -c ' too$'", 0,
      R"("entries":3,"runs":2,"first":0,"count":1,"otherFile":"there","otherFirst":2,"message":"back: shared-extents: )"

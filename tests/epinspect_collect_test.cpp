@@ -94,8 +94,13 @@ const Case cases[] = {
      "incomplete\"}\n1\n1\n…", "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
      "epinspect: c: a collection of …\n" + mayMiss + "…epinspect: " + table2 + ": cannot be opened: is a folder…)\n" +
      incomplete + "epinspect: c: a collection of …\n" + mayMiss + "…" + mayMiss + mayMiss},
+    {"names what it may not read", "chmod 0 own" + table2 + "; setpriv --bounding-set=-all --inh-caps=-all epinspect "
+     "--root own collect c", 1, "10 files and 3 LUNs …: c\n", "epinspect: " + table2 + ": cannot be opened: Permission "
+     "denied (EP_ERR_OPEN_FAILED, 18990038)\n" + incomplete},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
     damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not a collection's list"),
+    damaged("with a size that is none", "sed -i 's/\"size\":24576,/\"size\":24576.5,/' collection.json",
+            "not a collection's list"),
     damaged("that took more than there was", "sed -i s/6442475520/24575/ collection.json", "not a collection's list"),
     damaged("with a path from nowhere", "sed -i 's,\"/var,\"var,' collection.json", "not a collection's list"),
     damaged("whose list does not fit a file", "truncate -s 9 var/db/iscsi/EP_JNL",

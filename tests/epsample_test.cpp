@@ -8,10 +8,12 @@ using Epsample = ProgramTest;
 // clang-format off
 const Case cases[] = {
     {"makes stores that fit together", "epsample plain; epsample tiny --map-entries 0X2ff; "
-     "epsample deep/big --map-entries 4198401; for s in plain tiny deep/big; do epinspect check --root $s; done", 0,
+     "epsample deep/big --map-entries 4198401; for s in plain tiny deep/big; do epinspect check --root $s; done; "
+     "cd deep/big; epinspect dump volume*/@iSCSI/EP/EP_TBL | grep 'total count'", 0,
      "11 files, 5376 entries, 0 findings\nSnapshot: …: LUN 3: shares 160 entries with its parent LUN 1, …\n"
      "11 files, 1790 entries, 0 findings\nSnapshot: …: LUN 3: shares 127 entries with …\n"
-     "12 files, 4199681 entries, 0 findings\nSnapshot: …: LUN 3: shares 160 entries with its parent LUN 1, …\n", ""},
+     "12 files, 4199681 entries, 0 findings\nSnapshot: …: LUN 3: shares 160 entries with its parent LUN 1, …\n"
+     "total count:\t\t12582912\ntotal count:\t\t67108864\n", ""},
     {"overwrites nothing", "mkdir full; touch full/x; for d in full full/x full/x/y; do epsample $d; echo $?; done; "
      "ls full", 0, "1\n1\n1\nx\n",
      "epsample: full: not empty, and nothing is overwritten; name a new folder or an empty one\n"

@@ -34,18 +34,17 @@ void Session::remarkOnCollection() {
 }
 
 void Session::report(const Failure& failure) {
-    if (json) {
-        const Subject& subject = failure.subject;
-        Json object(subject.file.empty() ? subject.map : subject.file, lidsOf(subject));
-        object.begin("error");
-        if (const char* name = ISCSI::TOOL::GetErrorName(failure.error)) {
-            object.text("error", name);
-        } else {
-            object.null("error");
-        }
-        object.number("code", failure.error).text("message", messageOf(failure)).end();
+    complainOf(failure);  // first, for standard output may be lost
+    if (!json) return;
+    const Subject& subject = failure.subject;
+    Json object(subject.file.empty() ? subject.map : subject.file, lidsOf(subject));
+    object.begin("error");
+    if (const char* name = ISCSI::TOOL::GetErrorName(failure.error)) {
+        object.text("error", name);
+    } else {
+        object.null("error");
     }
-    complainOf(failure);
+    object.number("code", failure.error).text("message", messageOf(failure)).end();
 }
 
 void Session::complainOf(const Failure& failure) {
