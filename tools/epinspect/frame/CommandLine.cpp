@@ -44,12 +44,9 @@ std::string Command::asTyped(const std::string& text) {
     return text;
 }
 
-void Command::requireLongNames(const std::string& names) {
-    for (std::size_t name = 0;; name += 2) {
-        if (names.compare(name, 2, "--") != 0) throw std::logic_error("a short option with a value: " + names);
-        name = names.find(", ", name);
-        if (name == std::string::npos) return;
-    }
+void Command::requireLongName(std::string_view name) {
+    if (name.substr(0, 2) == "--" && name.find(',') == std::string_view::npos) return;
+    throw std::logic_error("an option with a value has one long name, not " + std::string(name));
 }
 
 Command& Command::flag(const char* name, const char* about, const std::function<void()>& take) {

@@ -5,6 +5,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "frame/UsageError.h"
@@ -43,12 +44,12 @@ public:
         return arguments(name, about, target, asTyped, need);
     }
 
-    /// An option with a value: "--first N". Its names are long ones, for short ones take no value; others throw
-    /// std::logic_error.
+    /// An option with a value: "--first N". Short options take none: throws std::logic_error where `name` is not one
+    /// long name.
     template <typename Target, typename Parse>
     Command& option(const char* name, const char* value, const char* about, Target& target, Parse parse,
                     Need need = Need::oneOrNone) {
-        requireLongNames(name);
+        requireLongName(name);
         options_.push_back({name, value, about, assignTo(target, parse), need});
         return *this;
     }
@@ -90,7 +91,7 @@ private:
     };
 
     static std::string asTyped(const std::string& text);
-    static void requireLongNames(const std::string& names);
+    static void requireLongName(std::string_view name);
 
     template <typename Target, typename Parse>
     static Take assignTo(Target& target, Parse parse) {
