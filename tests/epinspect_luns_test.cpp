@@ -88,6 +88,10 @@ const Case cases[] = {
      " do epinspect -v --root s $c | tail -n 1; done", 0, "…1 match of 1 entry\n…",
      "epinspect: iSCSI:ISCSILUNConfInfo.cpp:43:loadFromConfig …lid: 9 ,…\nepinspect: " + lun9 + "\nepinspect: iSCSI:…" +
      lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n…" + lun9 + "\n"},
+    {"shows log lines after LUN ids were tried", "epsample s; truncate -s 9 s/volume2/@iSCSI/LUN/*; "
+     "epinspect -v --root s find --pool 1", 1, "5120 entries …\n",
+     "epinspect: iSCSI:ISCSIEPFile.cpp:42:readHeader …\nepinspect: iSCSI:ISCSIEPFile.cpp:59:parseHead0 …\n…"
+     "…ends too early (EP_ERR_READ_FAILED, 18990039)\n"},
     {"reports a damaged LUN once", twoLuns + "epinspect --root s find 9 --extent 7", 1,
      "0 entries in 0 maps: 0 matches of 0 entries\n", says({lun9})},
     {"names the map in errors about a LUN", "epinspect --root store locate 1 4G --json; epsample s;"

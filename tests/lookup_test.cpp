@@ -125,6 +125,8 @@ TEST(MapEntry, BitsBecomeMembersAndALine) {
     std::uint64_t index = 0;
     for (const auto& [stored, line] : lines) builder.entry(index++, stored);
     ISCSIEPFileMAP file(folder.write("map", builder));
+    EXPECT_EQ("pool number: 0 ,extent address: 0 ,mapped: false ,vpushed: false ,vpulled: false ,synced: false\n",
+              ISCSIEPMapEntryInfo().toString());
     std::vector<ISCSIEPMapEntryInfo> entries;
     EXPECT_EQ(0, file.getMapEntries(0, maximum, entries));
     ASSERT_EQ(lines.size(), entries.size());
