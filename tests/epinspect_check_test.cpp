@@ -52,10 +52,10 @@ protected:
         write("large", mapOf(large));
         write("moved", mapOf(moved));
         write("scattered", mapOf(scattered));
-        // Of extents of 1 MiB, 4194304 fill a data file. The first one lacks a byte, the second one holds two extents.
+        // Of extents of 1 MiB, 4194304 fill a data file. The first one lacks a byte, the second one holds one extent.
         EPFileBuilder data = EPFileBuilder::data();
         write("volume1/@iSCSI/EP/EP_DAT_00000", data.set(serialNumber, 0).resize(24575 + (std::uint64_t{1} << 42U)));
-        write("volume1/@iSCSI/EP/EP_DAT_00001", data.set(serialNumber, 1).resize(24576 + (2U << 20U)));
+        write("volume1/@iSCSI/EP/EP_DAT_00001", data.set(serialNumber, 1).resize(24576 + (1U << 20U)));
         const std::uint64_t n = m + 0x400000;
         write("volume1/@iSCSI/LUN/m",
               mapOf({n - 2, n - 1, n, n + 1, n + 2, m + 0x800000, m + 0x7ffffffffff, m + 0x80000000000}));
@@ -206,8 +206,8 @@ R"("rule":"kind","stored":3,"found":"fri"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 5: extent 8388608, but there is no EP_DAT_00002\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 6: extent 8796093022207, but there is no EP_DAT_2097151\n"
      "/volume1/@iSCSI/LUN/m: missing-data-file: entry 7: extent 8796093022208, but there is no data file\n"
-     "/volume1/@iSCSI/LUN/m: beyond-data-file: entry 4: extent 4194306, past the end of EP_DAT_00001, which holds 2 "
-     "extents\n"
+     "/volume1/@iSCSI/LUN/m: beyond-data-file: entries 3-4: extent 4194305 and others, past the end of "
+     "EP_DAT_00001, which holds 1 extent\n"
      "3 files, 8 entries, 5 findings: 3 missing-data-file, 2 beyond-data-file\n"
      "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",
      "…LUN 0-255: none is known: The LUN list ./var/db/iscsi/luns.json is missing or cannot be read: No such file or "

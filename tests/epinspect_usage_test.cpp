@@ -129,6 +129,19 @@ const Case cases[] = {
      "…" + dat + "0\n0 |#S#|\nOne cell: 1 extent\n" + dat + "1\n0 |S#|\nOne cell: 1 extent\nIn use: . none\n"
      "        - <1/3\n"
      "        + <2/3\n        * most\n        # all\n        S some shared\n1 map, …", ""},
+    {"draws extents that lie far apart", "mkdir wide/volume7/@iSCSI/EP; cp r" + dat + "0 wide" + dat + "0; "
+     "large truncate -s 4T wide" + dat + "0; LC_ALL=C COLUMNS=60 epinspect --root wide usage --extent-size 512 "
+     "--chart 2>err | sed -n '/EP_DAT_00000$/,$p' | grep -v '|[.]*|$'", 0,
+     dat + "0\n         0 |S----------------------------------------------|\n"
+     " 536870942 |-----------------------------------------------|\n"
+     "1073741884 |-----------------------------------------------|\n"
+     "1610612826 |---............................................|\nOne cell: 11422786 extents\n…", ""},
+    {"compares a map from elsewhere on the volume", "cp r" + luns + "THIN2_00000 r/volume7/y; cp r" + luns +
+     "THIN2_00000 r/z; for m in volume7/y z; do " + of + "usage /$m --extent-size 1000003 | grep -A 1 '^/.*[yz]$'; "
+     "done", 0,
+     "/volume7/y\n                    4        4          4        0         4\n"
+     "/z\n        4        4        4        at most 4    at least 0\n", says({"/z: its path names no volume: "
+     "which other maps share its extents is not known (EP_ERR_NO_PATH, 18990401)"})},
 
     {"names every owner of a byte, and no other", at0 + "24575 1024579 1024578 3024585 2024582", 1,
      "24575: header block, before the first extent\n"

@@ -52,7 +52,8 @@ private:
 
 std::string titleOf(const ExtentsInUse& use) {
     const auto size = use.extentSize();
-    return forReader(use.volume().folder) + ", extents of " +
+    const std::string& folder = use.volume().folder;
+    return forReader(folder.empty() ? "/" : folder) + ", extents of " +
            (size ? counted(*size, "byte", "bytes") : "unknown size") + "\n";
 }
 
