@@ -94,6 +94,11 @@ const Case cases[] = {
      "incomplete\"}\n1\n1\n…", "epinspect: c/var/db/iscsi/EP_JNL: cannot be written: File too large\n" + incomplete +
      "epinspect: c: a collection of …\n" + mayMiss + "…epinspect: " + table2 + ": cannot be opened: is a folder…)\n" +
      incomplete + "epinspect: c: a collection of …\n" + mayMiss + "…" + mayMiss + mayMiss},
+    {"keeps a name that is not UTF-8", "cd own/volume2/@iSCSI/LUN; mv * \"$(printf 'n\\377')\"; cd ../../../..; "
+     "epinspect --root own collect c; epinspect --root c list 2>err | tail -n 3 | grep -ac \"$(printf 'n\\377')\"; "
+     "grep -ao 'pathHex[^}]*' c/collection.json; for x in x 0 00; do sed \"s/pathHex...../&$x/\" c/collection.json >j; "
+     "cp -r c d; cp j d/collection.json; epinspect --root d list 2>&1 | grep -c damaged; done", 0,
+     "11 files …\n1\npathHex\":\"2f766f6c756d65322f4069534353492f4c554e2f6eff\"\n1\n1\n1\n", ""},
     {"names what it may not read", "chmod 0 own" + table2 + "; setpriv --bounding-set=-all --inh-caps=-all epinspect "
      "--root own collect c", 1, "10 files and 3 LUNs …: c\n", "epinspect: " + table2 + ": cannot be opened: Permission "
      "denied (EP_ERR_OPEN_FAILED, 18990038)\n" + incomplete},
@@ -112,6 +117,17 @@ const Case cases[] = {
      "for o in '' --headers --entries; do epinspect diff own" + map2 + " m $o; done", 3,
      "mappedCount: 128 -> 255\n0: flags changed: mapped synced, …\n1 field differs; 256 entries: 255 same, …, 1 with "
      "other flags\nmappedCount: 128 -> 255\n1 field differs\n0: flags changed: …\n256 entries: 255 same, …\n", ""},
+    {"diff shows fields of every form", "cp own" + map2 + " m; for p in 8 24 44; do "
+     "printf '\\377' | dd of=m bs=1 seek=$p conv=notrunc status=none; done; "
+     "printf '\\001' | dd of=m bs=1 seek=4168 conv=notrunc status=none; epinspect diff own" + map2 + " m", 3,
+     "head0MagicCode: 0x1122334455667788 -> 0x11223344556677ff\n"
+     "head0UUID: 41424344-4546-4748-494a-4b4c4d4e4f50 -> 41424344-ff46-4748-494a-4b4c4d4e4f50\n"
+     "head0CreateTime: Sun Sep 13 12:26:40 UTC 2020 -> Sun Sep 13 12:30:55 UTC 2020\nseg0PoolCount: 2 -> 1\n"
+     "poolUUIDs #2: b0b1b2b3-b4b5-b6b7-b8b9-babbbcbdbebf -> none\n5 fields differ; 256 entries: no difference\n", ""},
+    {"diff of an unknown kind", "cp own" + map2 + " x; printf '\\011' | dd of=x bs=1 seek=16 conv=notrunc status=none; "
+     "cp x y; epinspect diff x y", 0, "no field differs\n",
+     "epinspect: x: kind not known from its name or type, only HEAD[0] is compared\n"
+     "epinspect: y: kind not known from its name or type, only HEAD[0] is compared\n"},
     {"diff writes fields as JSON", "cp own" + map2 + " m; "
      "printf '\\001' | dd of=m bs=1 seek=4168 conv=notrunc status=none; "
      "printf '\\377' | dd of=m bs=1 seek=44 conv=notrunc status=none; epinspect diff --json own" + map2 + " m", 3,

@@ -43,6 +43,12 @@ protected:
         write("four" + lun, EPFileBuilder::map().entry(1, mapped).entry(1000, mapped | 2).entry(4095, mapped | 1));
         EPFileBuilder file = EPFileBuilder::data().bytes(24576, std::string(MiB, 'a'));
         write("four" + data + "0", file.bytes(24576 + 2 * MiB, std::string(MiB, 'c')));
+        EPFileBuilder many = EPFileBuilder::map(), missing = EPFileBuilder::map();
+        for (std::uint64_t i = 0; i < 10000; ++i) missing.entry(i, mapped | i);
+        for (std::uint64_t i = 0; i < 70; ++i) many.entry(i, mapped | (i + 10) << 30U);
+        write("many" + lun, many);
+        write("many" + lun + "2", missing);
+        fs::create_directories(path("many/volume1/@iSCSI/EP"));
         std::mt19937 random(20);
         for (std::size_t i = 0; i < 6 * MiB - 65536; ++i)
             image_ += static_cast<char>(i / 65536 % 12 < 4 ? 0 : random());
@@ -79,7 +85,7 @@ const Case cases[] = {
      "epinspect: LUN 1: 2187264 of 6225920 bytes could not be read, zeros stand in their place\n6225920\n", ""},
     {"no image is left of what holds nothing", "rm four" + data + "0; " + ofFour +
      "--offset 1M --length 5 --output i; echo $?; rm disk" + data + "*; (ulimit -f 100; " + ofDisk +
-     "--output i); echo $?; ls", 0, "1\n1\ndisk\nfour\nimage\nstore\n",
+     "--output i); echo $?; ls", 0, "1\n1\ndisk\nfour\nimage\nmany\nstore\n",
      says({data + "0: bytes 1048576-1048580: …", "i: removed, nothing could be read",
            "i: removed, nothing was written to it: File too large"})},
     {"an interrupted read reports what is missing before it ends", "rm disk" + data + "1; mkfifo p; " + ofDisk +
@@ -87,6 +93,14 @@ const Case cases[] = {
      says({data + "1: LUN 1 bytes 655360-786431: " + cannotOpen}) + "…"},
     {"JSON is of an image only", ofDisk + "--json", 2, "",
      says({"--json needs --output. Try 'epinspect read --help'."})},
+    {"bytes are read on where only the flags change", "epinspect --root store read 1 --output i "
+     "--offset 783M --length 2M", 0, "i: 2097152 bytes: 2097152 data, 0 holes, 0 missing\n", ""},
+    {"a LUN may lie in many data files", "for i in $(seq 10 79); do "
+     "cp four" + data + "0 many/volume1/@iSCSI/EP/EP_DAT_000$i; done; "
+     "epinspect --root many read " + lun + " --extent-size 4K | tr -d a | wc -c", 0, "0\n", ""},
+    {"a long range that is missing is one", "epinspect --root many read " + lun + "2 --extent-size 512 | wc -c", 0,
+     "5120000\n", says({data + "0: bytes 0-5119999: " + cannotOpen,
+     lun + "2: 5120000 of 5120000 bytes could not be read, zeros stand in their place"})},
     {"holes are as long as they are", "truncate -s 200K four" + lun + "; large epinspect --root four read " + lun +
      " --extent-size 512 --output i", 0, "i: 11534336 bytes: 1536 data, 11532800 holes, 0 missing\n", ""},
     {"an image whose end nobody hears of is incomplete", "rm disk" + data + "1; " + ofDisk +

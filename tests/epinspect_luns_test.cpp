@@ -92,6 +92,10 @@ const Case cases[] = {
      "epinspect -v --root s find --pool 1", 1, "5120 entries …\n",
      "epinspect: iSCSI:ISCSIEPFile.cpp:42:readHeader …\nepinspect: iSCSI:ISCSIEPFile.cpp:59:parseHead0 …\n…"
      "…ends too early (EP_ERR_READ_FAILED, 18990039)\n"},
+    {"takes the first of two LUNs with one map", twoLuns + "sed -i 's/300/200/' s/var/db/iscsi/luns.json; "
+     "epinspect --root s locate " + map1 + " 70000 2>err | head -n 1; cat err >&2", 0,
+     "LUN 1 byte 70000: entry 0, byte 70000 of its extent\n",
+     says({map1 + ": LUN 200 has this map file too, with another extent size"})},
     {"reports a damaged LUN once", twoLuns + "epinspect --root s find 9 --extent 7", 1,
      "0 entries in 0 maps: 0 matches of 0 entries\n", says({lun9})},
     {"names the map in errors about a LUN", "epinspect --root store locate 1 4G --json; epsample s;"

@@ -129,6 +129,20 @@ TEST_F(ProgramOnStore, EndsInOrderWhereverMemoryRunsOut) {
         EXPECT_EQ(1, statusOf({"epinspect", "collect", full.c_str()}, pieces)) << pieces;
 }
 
+TEST_F(ProgramOnStore, NeverTakesForSoundWhatMemoryDidNotHold) {
+    const std::string root = path("store");
+    for (const std::vector<const char*>& words :
+         {std::vector<const char*>{"check"}, {"usage"}, {"owner", "/volume1/@iSCSI/EP/EP_DAT_00000", "30000"}}) {
+        std::vector<const char*> all = {"epinspect", "--root", root.c_str()};
+        all.insert(all.end(), words.begin(), words.end());
+        int status = 1;
+        std::uint64_t pieces = 1;
+        for (; status == 1; pieces += 1 + pieces / 8) status = statusOf(all, pieces);
+        EXPECT_EQ(0, status) << words[0] << ' ' << pieces;
+        EXPECT_GT(pieces, 300U) << words[0];
+    }
+}
+
 TEST(CommandLine, TakesNoShortOptionWithAValue) {
     std::uint64_t value = 0;
     for (const char* name : {"-f", "-f, --first", "--first, -f"}) {

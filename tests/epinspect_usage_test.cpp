@@ -37,6 +37,14 @@ protected:
             one.push_back(m + (i << 16U));
             other.push_back(m + (i << 16U) + (i < 3 ? 0 : 1));
         }
+        write("far", mapOf({m, m + (std::uint64_t{1} << 47U), m + (std::uint64_t{1} << 47U) + 1}));
+        std::vector<std::uint64_t> longRun, longer;
+        for (std::uint64_t i = 0; i < 50000; ++i) {
+            longRun.push_back(m + 100 + i);
+            longer.push_back(m + 100 + i % 40000 + (i < 40000 ? 0 : 100000));
+        }
+        write("long", mapOf(longRun));
+        write("longer", mapOf(longer));
         write("wide" + luns + "one", mapOf(one));
         write("wide" + luns + "other", mapOf(other));
     }
@@ -105,6 +113,11 @@ const Case cases[] = {
      "LUN 1 …8 …6 …5 …0 …5\n…\n…unclaimed…\nEP_DAT_00000 …854 …3 …at most 851 …\n--\n",
      "epinspect: " + luns + "M: extent size not known, give --extent-size: …volume7: extents of different sizes are "
      "counted apart: 4096, 1000003 bytes\n…"},
+    {"counts stretches of the volume as single extents", "cp long* r" + luns + "; for c in check usage; do "
+     "epinspect --root r $c /volume7/@iSCSI/LUN/long /volume7/@iSCSI/LUN/longer --extent-size 4K --json 2>err; done | "
+     "grep -o '\"found\":\"/.*first\":[0-9]*\\|\"alone\":[0-9]*\\|\"used\":7[0-9]*\\|\"beyond\":[1-9][0-9]*'", 0,
+     R"("found":"/volume7/@iSCSI/LUN/long","entries":40000,"runs":1,"first":0)" "\n"
+     "\"alone\":10000\n\"alone\":10000\n\"used\":754\n\"beyond\":59246\n…", ""},
     {"counts apart where the LUN's extent size is 0", "sed -i 's/1000003/0/' r/var/db/iscsi/luns.json; " + of +
      "usage | head -n 3; " + at0 + "24580", 1,
      "/volume7, extents of unknown size\n       entries  mapped  extents …\n"
@@ -171,6 +184,19 @@ const Case cases[] = {
      R"("extentAddress":1,)"
      R"("poolNumber":0,"mapped":true,"vpushed":false,"vpulled":false,"synced":false,"undecided":false},{…,"lid":1,)"
      R"("index":2,…},{…,"lid":2,"index":0,…}]})" "\n", ""},
+    {"writes positions as JSON that lie in no extent", at1 + "24575-24576 2024581-2024583 --json 2>err | grep -o "
+     "'\"position\":[^[]*'", 0,
+     R"("position":24575,"length":1,"where":"header","owners":)" "\n"
+     R"("position":24576,"length":1,"where":"extent","owners":)" "\n"
+     R"("position":2024581,"length":1,"where":"extent","owners":)" "\n"
+     R"("position":2024582,"length":2,"where":"past-end","owners":)" "\n", ""},
+    {"counts what has no place in the data files", "large truncate -s 5T r" + dat + "1; " + of + "usage 2 >out; "
+     "cp far r" + luns + "; for s in '' '--extent-size 64K'; do " + of + "usage " + luns + "far $s --json | "
+     "grep lunUsage; done", 0,
+     R"({"kind":"lunUsage",…,"extentSize":null,"entries":3,"entriesBytes":null,"mapped":3,…,"extents":3,…})" "\n"
+     R"({"kind":"lunUsage",…,"extentSize":65536,…})" "\n", "epinspect: " + dat + "1: larger than its part of the "
+     "volume: extents may be counted from the volume's start, these figures count within the file\n"
+     "…epinspect: /volume7: 2 extents in use end past byte 2^63 of the volume (EP_ERR_SEEK_FAILED, 18990041)\n…"},
     {"leaves undecided from where extents are counted", "large truncate -s 5T r" + dat + "1; " + at1 +
      "24577 --address-bits 48; " +
      at1 + "4398047218679 --address-bits 48; " + at1 + "24577 --address-bits 48 --count-from volume", 0,
