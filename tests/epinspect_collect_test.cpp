@@ -102,6 +102,9 @@ const Case cases[] = {
     {"names what it may not read", "chmod 0 own" + table2 + "; setpriv --bounding-set=-all --inh-caps=-all epinspect "
      "--root own collect c", 1, "10 files and 3 LUNs …: c\n", "epinspect: " + table2 + ": cannot be opened: Permission "
      "denied (EP_ERR_OPEN_FAILED, 18990038)\n" + incomplete},
+    {"is damaged where its list may not be read", "epinspect --root own collect c >/dev/null; "
+     "chmod 0 c/collection.json; setpriv --bounding-set=-all --inh-caps=-all epinspect --root c list", 1, "",
+     "epinspect: c/collection.json: …Permission denied…\n"},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
     damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not a collection's list"),
     damaged("with a size that is none", "sed -i 's/\"size\":24576,/\"size\":24576.5,/' collection.json",

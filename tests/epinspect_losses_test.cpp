@@ -45,6 +45,9 @@ const Case cases[] = {
      "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",
      "epinspect: --root: 'none': No such file or directory. Try …\n"
      "epinspect: LUN 0-255: none is known: …\nepinspect: none: no EP files found (EP_ERR_NO_PATH, 18990401)\n"},
+    {"the journal", "rm own/var/db/iscsi/EP_JNL; epinspect --root own check", 3,
+     "/var/db/iscsi/EP_JNL: LUN 1: missing-file: no file, but this LUN and 2 others need it\n10 files, 5376 entries, 1 "
+     "finding: 1 missing-file\n" + snapshot, ""},
     {"the table of a map that is named, which another file replaces or which is gone",
      "cd own; E=volume2/@iSCSI/EP M=volume2/@iSCSI/LUN; cp $E/EP_TBL EP; cp $M/* $E/EP_TBL;"
      "epinspect --root . check $E/EP_TBL $M/* | head -n 1; rm $E/EP_TBL; epinspect --root . check $M/* | head -n 1; "

@@ -62,6 +62,8 @@ TEST(Numbers, AreReadWholeOrRefused) {
     expect(parseSize, {{"8", 8}, {"3K", 3072}, {"0x10M", 16777216}, {"1G", 1073741824}, {"2T", 2199023255552},
                        {"1KiB", 1024}, {"1MiB", 1048576}, {"1GiB", 1073741824}, {"1TiB", 1099511627776},
                        {"16777215T", 18446742974197923840U}}, "K", "1KB", "1kib", "1KiBx", "1KK", "1E", "16777216T");
+    const auto lastPosition = [](const std::string& text) { return parsePositions(text).last; };
+    expect(lastPosition, {{"5-2K", 2048}, {"9223372036854775807", INT64_MAX}}, "9223372036854775808");
     expect(last, {{"5", 5}, {"5-5", 5}, {"5-0x9", 9}, {"5-18446744073709551615", UINT64_MAX}},
            "6-5", "5-", "-5", "1-2-3", "-", "0-18446744073709551616");
     expect(parseNumber32, {{"4294967295", UINT32_MAX}}, "4294967296");

@@ -125,6 +125,8 @@ const Case cases[] = {
      "24580: no map that could be read uses this\n" + assumed,
      says({"LUN 1: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)", left,
            "LUN 1: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)"})},
+    {"counts a map that is alone on its volume", "mkdir -p one/volume3/@iSCSI/LUN; cp far one/volume3/@iSCSI/LUN; "
+     "epinspect --root one usage --extent-size 4K | head -n 1", 0, "/volume3, extents of 4096 bytes\n", "…"},
     {"reports a data file that is missing", "rm r" + dat + "1; " + of + "usage 2 >out; echo $?; grep DAT_00001 out", 0,
      "1\nEP_DAT_00001  unknown        3    unknown        1   unknown\n",
      says({dat + "1: cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)"})},
