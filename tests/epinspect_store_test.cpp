@@ -104,8 +104,8 @@ const Case cases[] = {
      file + ep.substr(0, ep.size() - 4) + R"(99999","fileKind":"dat","size":3694592,"missing":false})" "\n" +
      file + ep.substr(0, ep.size() - 4) + R"(100000","fileKind":"dat","size":0,"missing":false})" "\n" +
      file + lun5 + R"(","fileKind":"map","size":24616,"missing":false,"entries":5,"typeName":"THIN","uuid":")" + uuid +
-     R"(","name":"five"})" "\n" + file + maps + no + same + "\n" + file + maps + "a-" + std::string(40, '0') + "_00000" + same + "\n" +
-     file + maps + "a-b" + same + "\n",
+     R"(","name":"five"})" "\n" + file + maps + no + same + "\n" +
+     file + maps + "a-" + std::string(40, '0') + "_00000" + same + "\n" + file + maps + "a-b" + same + "\n",
      "epinspect: LUN 0-255: none is known: The LUN list ../../var/db/iscsi/luns.json is missing or cannot be read: No "
      "such file or directory (code 9002)\n"},
     {"list says what may not be opened", "rm far/var/db/iscsi/*; cd far/volume91/@iSCSI; mv EP LUN/folder; "
