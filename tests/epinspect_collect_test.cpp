@@ -146,11 +146,13 @@ const Case cases[] = {
      "(EP_ERR_WRONG_FILE_TYPE, 18990400)\n"},
     {"diff compares stores", "large cp -a own b; rm b" + table2 + "; >b/volume1/@iSCSI/EP/EP_DAT_00009; "
      "truncate -s 99999 b" + data2 + "; printf '\\377' | dd of=b/var/db/iscsi/EP_JNL bs=1 seek=4 conv=notrunc "
-     "status=none; epinspect diff own b/; epinspect diff own b --json | tail -n 2; epinspect diff own b" + map2, 2,
+     "status=none; epinspect diff own b/; epinspect diff own b --json | tail -n 3; epinspect diff own b" + map2, 2,
      "/var/db/iscsi/EP_JNL: head0Version: 33752069 -> 33752319\n"
      "/volume1/@iSCSI/EP/EP_DAT_00009: only in the second: data file, 0 bytes\n" + table2 +
      ": only in the first: table file, 24576 bytes\n" + data2 + ": size: 16801792 -> 99999\n"
      "12 files: 1 only in the first, 1 only in the second; 2 fields differ; 5376 entries: no difference\n"
+     R"({"kind":"storeDifference","file":")" + table2 +
+     R"(","otherFile":null,"difference":"only-first","fileKind":"tbl","size":24576})" "\n"
      R"({"kind":"field","file":")" + data2 + R"(","otherFile":")" + data2 + R"(","field":"size","a":16801792,"b":99999}
 {"kind":"summary","file":"own","otherFile":"b","summary":true,"files":12,"fields":2,"same":5376,…})" "\n",
      "epinspect: A and B must both be files, or both be folders. Try 'epinspect diff --help'.\n"},
