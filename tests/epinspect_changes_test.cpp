@@ -113,9 +113,12 @@ TEST_F(Changes, AreNoticedByEveryCommandThatWalks) {
             EXPECT_TRUE(fits(content(".err"), before + says + (whole ? "" : "…"))) << words[0] << ": " << what;
             const std::string changed = !change ? "" : "\"" + name + "\"";
             const bool isPassing = words[0] == std::string("check") && change;
+            const bool isShort = words[0] == std::string("check") && !whole;
+            const std::string rest =
+                isShort ? "…total-count, mapped-count, sync-count: not all entries could be read: m…" : "…";
             const std::string list = (isPassing ? "…\"passing\":true" : "") + ("…\"changed\":[" + changed + "]…");
             const bool hasSummary = words[0] != std::string("owner") && words[0] != std::string("entry");
-            EXPECT_TRUE(fits(content(".out"), whole && hasSummary ? list : "…")) << words[0] << ": " << what;
+            EXPECT_TRUE(fits(content(".out"), whole && hasSummary ? list : rest)) << words[0] << ": " << what;
         }
     }
 }

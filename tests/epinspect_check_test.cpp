@@ -94,6 +94,8 @@ const Case cases[] = {
     {"diff takes a hole for nothing", "cp a b; truncate -s +24 b; "
      "epinspect diff --entries a b && epinspect diff --entries b a", 0,
      "12 entries: no difference\n12 entries: no difference\n", ""},
+    {"map joins what two blocks share", "epinspect map large", 0,
+     "0-19999: mapped, pool 0, extents 4096-24095\n20000 entries in 1 run: 20000 mapped, …\n", ""},
     {"diff joins what two blocks share", "epinspect diff --entries large moved", 3,
      "4000-4199: moved: mapped, pool 0, extents 8096-8295 -> mapped, pool 0, extents 4000-4199\n"
      "20000 entries: 19800 same, 0 only in the first, 0 only in the second, 200 moved, 0 with other flags\n", ""},

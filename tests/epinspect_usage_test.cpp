@@ -91,8 +91,8 @@ const Case cases[] = {
      R"({"kind":"summary","file":null,"summary":true,"maps":1,"dataFiles":2,"mapped":4,"extents":4,"shared":3,)"
      R"("changed":[]})" "\n", ""},
     {"is not sure where a map cannot be read", "rm r" + luns + "THIN1*; " + of + "usage 2; " +
-     of + "usage --json | grep -o 'lid\":[0-9]*,\"e\\|alone[^,]*,\\|unclaimed[^,]*,\\|shared\":null,\"sharedAtLeast\":0,\"ch' | "
-     "LC_ALL=C sort -u", 0,
+     of + "usage --json | grep -o 'lid\":[0-9]*,\"e\\|alone[^,]*,\\|unclaimed[^,]*,\\|"
+     "shared\":null,\"sharedAtLeast\":0,\"ch' | LC_ALL=C sort -u", 0,
      "…LUN 2               4                 4                4        at most 4    at least 0\n…"
      "EP_DAT_00000        3        at least 2        at most 1 …, at least 0 shared by\nseveral maps\n"
      "alone\":null,\naloneAtMost\":0,\naloneAtMost\":4,\naloneBytes\":null,\n"
