@@ -92,6 +92,13 @@ const Case cases[] = {
      "epinspect -v --root s find --pool 1", 1, "5120 entries …\n",
      "epinspect: iSCSI:ISCSIEPFile.cpp:42:readHeader …\nepinspect: iSCSI:ISCSIEPFile.cpp:59:parseHead0 …\n…"
      "…ends too early (EP_ERR_READ_FAILED, 18990039)\n"},
+    {"names what may be the LUN of a map", twoLuns + "cp s" + map1 + " s/volume1/@iSCSI/LUN/copy; "
+     "cp s" + map1 + " s/x; for m in volume1/@iSCSI/LUN/copy 'x --extent-size 1M'; do "
+     "epinspect --root s locate /$m 0; done", 1,
+     "/x byte 0: entry 0, byte 0 of its extent\n0: mapped synced, pool 0, extent 0\nassumed: …\n",
+     says({lun9, "/volume1/@iSCSI/LUN/copy: extent size not known, give --extent-size: no LUN with an id from 0 to 255 "
+     "has this map file (EP_ERR_BAD_EXTENT_SIZE, 18990507)", "/x: byte 0: path names no volume (EP_ERR_NO_PATH, "
+     "18990401)"})},
     {"takes the first of two LUNs with one map", twoLuns + "sed -i 's/300/200/' s/var/db/iscsi/luns.json; "
      "epinspect --root s locate " + map1 + " 70000 2>err | head -n 1; cat err >&2", 0,
      "LUN 1 byte 70000: entry 0, byte 70000 of its extent\n",

@@ -209,6 +209,11 @@ const Case cases[] = {
      "4398047218679: LUN 1 byte …: entry 4, byte …, if extents are counted from the volume's start\n…LUN 2 …\n"
      "assumed: …\n"
      "24577: no map uses this\nassumed: …, as --count-from says\n", ""},
+    {"counts nothing from the volume's start that would lie past the end", "large truncate -s 4398048218681 r" + dat +
+     "1; " + at1 + "4398048218680-4398048218690 --address-bits 48", 1,
+     "4398048218680: LUN 1 byte 5000014: …\n4398048218680: LUN 2 byte 4000011: …start\nassumed: …\n",
+     says({dat + "1: position 4398048218681: past the end, the file holds 4398048218681 bytes (EP_ERR_READ_FAILED, "
+     "18990039)"})},
     {"is not sure of owners where a map cannot be read", "truncate -s 99 r" + luns + "THIN1*; " + at1 + "1999999;"
      "rm r" + luns + "THIN2*; " + at1 + "1999999", 1,
      "1999999: LUN 2 byte …\n…1999999: no map that could be read uses this\n…", "…ends too early…No such file…"},
