@@ -40,6 +40,9 @@ const Case cases[] = {
      gone3 + "entries 640-767: extent 4194944" + no1 + "10 files, 5376 entries, 4 findings: 4 missing-data-file\n" +
      snapshot,
      ""},
+    {"a data file that a named map needs", "rm own/volume2/@iSCSI/EP/EP_DAT_00000; epinspect --root own check 2", 3,
+     "…lun2_00000: LUN 2: missing-data-file: 128 entries in 2 runs, first entries 0-63: extent 16 and others, but "
+     "there is no EP_DAT_00000\n1 file, 256 entries, 1 finding: 1 missing-data-file\nNot compared: magic, …\n", ""},
     {"all there is", "epinspect check --root none; mkdir none; epinspect check --root none", 1,
      "0 files, 0 entries, 0 findings\n"
      "Not compared: lun-size, extent-size, missing-map, missing-file: no LUN with an id from 0 to 255 is known\n",

@@ -37,6 +37,7 @@ protected:
             one.push_back(m + (i << 16U));
             other.push_back(m + (i << 16U) + (i < 3 ? 0 : 1));
         }
+        write("edge", mapOf({m + 34093383807, m + 34093383808}));  // of 129 bytes: the last extent to start in 4 TiB
         write("far", mapOf({m, m + (std::uint64_t{1} << 47U), m + (std::uint64_t{1} << 47U) + 1}));
         std::vector<std::uint64_t> longRun, longer;
         for (std::uint64_t i = 0; i < 50000; ++i) {
@@ -125,6 +126,11 @@ const Case cases[] = {
      "24580: no map that could be read uses this\n" + assumed,
      says({"LUN 1: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)", left,
            "LUN 1: extent size cannot be used (EP_ERR_BAD_EXTENT_SIZE, 18990507)"})},
+    {"takes an extent for that of the data file it starts in", "cp edge r/volume7/x; "
+     "epinspect --root r locate /volume7/x 0 129 --extent-size 129 --json 2>err | "
+     "grep -o 'file\",\"dataFile[^,]*,\"extent\":[0-9]*'", 0,
+     "file\",\"dataFile\":\"" + dat + "0\",\"extent\":34093383807\nfile\",\"dataFile\":\"" + dat +
+     "1\",\"extent\":0\n", ""},
     {"counts a map that is alone on its volume", "mkdir -p one/volume3/@iSCSI/LUN; cp far one/volume3/@iSCSI/LUN; "
      "epinspect --root one usage --extent-size 4K | head -n 1", 0, "/volume3, extents of 4096 bytes\n", "…"},
     {"reports a data file that is missing", "rm r" + dat + "1; " + of + "usage 2 >out; echo $?; grep DAT_00001 out", 0,
