@@ -32,7 +32,7 @@ std::string json(const char* kind, const char* file, unsigned int type, const ch
 const std::string noFile =
     ": cannot be opened: neither a regular file nor a block device (EP_ERR_OPEN_FAILED, 18990038)";
 
-const std::string folder = ": cannot be opened: is a folder, not a file, --root names the folder of a store "
+const std::string folder = ": cannot be opened: is a folder, not a file; --root takes the folder of a store "
                            "(EP_ERR_OPEN_FAILED, 18990038)";
 
 const Case cases[] = {

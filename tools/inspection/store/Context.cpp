@@ -63,7 +63,7 @@ void Context::changed(const std::string& name) {
 std::optional<std::string> Context::openablePath(const std::string& name, NamedBy by) {
     Located located = by == NamedBy::user ? root.locateNamed(name) : root.locate(name);
     auto obstacle = located.obstacleToFile(name);
-    if (by == NamedBy::user && located.isFolder()) obstacle->what += ", --root names the folder of a store";
+    if (by == NamedBy::user && located.isFolder()) obstacle->what += "; --root takes the folder of a store";
     const bool left = !root.isFolder() && located.error != 0;  // the library meets the same failure, and logs it
     if (!obstacle || left) return std::move(located.hostPath);
     failed(*obstacle);
