@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
-# How fast a LUN of SIZE bytes (default 2G), all mapped and in the page cache, is read: through the plugin against nbdkit's own file plugin
-# on the same bytes in one file, and by `read`, `read --output` and `dd` to files. The best of ROUNDS (7) in turn.
-# bench/nbd.sh [BUILD_DIR [OTHER_EPINSPECT]]: another program, an older version for instance, is measured too. Takes twice
-# SIZE of disk, and SIZE of memory for the image.
+# How fast a LUN of SIZE bytes (default 2G), all mapped and in the page cache, is read: through the plugin against nbdkit's
+# own file plugin on the same bytes in one file, and by `read`, `read --output` and `dd` to files. The best of ROUNDS (7)
+# in turn. bench/nbd.sh [BUILD_DIR [OTHER_EPINSPECT]]: another program, an older version for instance, is measured too.
+# Takes twice SIZE of disk, and SIZE of memory for the image.
 set -euo pipefail
 build=$(realpath "${1:-build/release}") other=${2:+$(realpath "$2")}
 plugin=$build/lib/nbdkit-ep-plugin.so
