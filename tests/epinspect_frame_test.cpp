@@ -131,6 +131,10 @@ const Case cases[] = {
      "  --root DIR            Folder that stands for / of the target\n"
      "  -v, --verbose         Show the library's log lines on standard error\n"
      "  -h, --help            Show this help and exit\nepinspect 1.0.0\n", ""},
+    {"shows arguments and options", "epinspect help lun | head -n 10", 0,
+     "Show the configuration of LUNs and the paths of their map files.\n\nUsage: epinspect lun LID... [--json]\n\n"
+     "Arguments:\n  LID                   LUN id; FIRST-LAST for those that exist from FIRST to\n"
+     "                        LAST\n\nOptions:\n  --json                One JSON object per LUN\n", ""},
     {"fails when output cannot be written", "(ulimit -f 1; epinspect help >limited; echo $?; "
      "epinspect help map >/dev/full; echo $?; epinspect -V >&-; echo $?)", 0, "1\n1\n1\n",
      says({"standard output: File too large", "standard output: No space left on device",
