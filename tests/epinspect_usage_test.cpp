@@ -131,6 +131,11 @@ const Case cases[] = {
      "grep -o 'file\",\"dataFile[^,]*,\"extent\":[0-9]*'", 0,
      "file\",\"dataFile\":\"" + dat + "0\",\"extent\":34093383807\nfile\",\"dataFile\":\"" + dat +
      "1\",\"extent\":0\n", ""},
+    {"divides a run between two data files", "rm r" + luns + "*; cp edge r" + luns + "; " + of +
+     "usage --extent-size 1 2>err | head -n 1; " + of + "usage --extent-size 129 2>err | grep ^EP | head -n 2", 0,
+     "/volume7, extents of 1 byte\n"
+     "EP_DAT_00000    27131       0    at most 27131       0         1\n"
+     "EP_DAT_00001    15503       1    at most 15502       0         0\n", ""},
     {"counts a map that is alone on its volume", "mkdir -p one/volume3/@iSCSI/LUN; cp far one/volume3/@iSCSI/LUN; "
      "epinspect --root one usage --extent-size 4K | head -n 1", 0, "/volume3, extents of 4096 bytes\n", "…"},
     {"reports a data file that is missing", "rm r" + dat + "1; " + of + "usage 2 >out; echo $?; grep DAT_00001 out", 0,
@@ -214,7 +219,8 @@ const Case cases[] = {
      "data file, --count-from decides\n"
      "4398047218679: LUN 1 byte …: entry 4, byte …, if extents are counted from the volume's start\n…LUN 2 …\n"
      "assumed: …\n"
-     "24577: no map uses this\nassumed: …, as --count-from says\n", ""},
+     "24577: no map uses this\nassumed: entry i holds bytes from i x extent size; extents counted from the volume's "
+     "start, as --count-from says\n", ""},
     {"counts nothing from the volume's start that would lie past the end", "large truncate -s 4398048218681 r" + dat +
      "1; " + at1 + "4398048218680-4398048218690 --address-bits 48", 1,
      "4398048218680: LUN 1 byte 5000014: …\n4398048218680: LUN 2 byte 4000011: …start\nassumed: …\n",
