@@ -158,7 +158,8 @@ const Case cases[] = {
      "grep -abo '[a-z][a-z]*' image; epinspect --root far read 5 --count-from file --address-bits 48 2>/dev/null | "
      "grep -abo '[a-z][a-z]*'", 0, "1\n6291456\n4194304:three\n1048576:here\n2097152:two\n4194304:three\n",
      "epinspect: " + ep + "0: LUN 5 bytes 0-1048575: " + beyond0 + "epinspect: " + ep +
-     "1: LUN 5 bytes 1048576-1572863: ambiguous: …, and both places lie inside the file; --count-from decides …\n"
+     "1: LUN 5 bytes 1048576-1572863: ambiguous: extents may be counted within the data file or from the volume's "
+     "start, and both places lie inside the file; --count-from decides …\n"
      "epinspect: LUN 5 bytes 2097152-3145727: " + open2 +
      "epinspect: " + ep + "2: LUN 5 bytes 3145728-4194303: " + notFound + "epinspect: " + ep + "0: LUN 5 bytes "
      "4718592-5242879: " + beyond0 + "epinspect: " + lun5 + ": LUN 5 bytes 5242880-6291455: past the end, …\n"
