@@ -75,11 +75,13 @@ protected:
     void write(const std::string& name, const EPFileBuilder& builder) const { folder_.write(name, builder); }
 
     /// What makes the shell do `command` in the test's folder. There `large` lifts the limit of a file's size, as
-    /// epsample needs it for its sparse files.
+    /// epsample needs it for its sparse files, and `closed` takes the rights of a superuser away.
     std::string script(const std::string& command) const {
         return "unset COLUMNS; PATH='" PROGRAMS
                "':\"$PATH\"; large() { (ulimit -S -f unlimited; \"$@\"); }; "
-               "epsample() { large command epsample \"$@\"; }; cd '" +
+               "epsample() { large command epsample \"$@\"; }; "
+               "closed() { if [ $(id -u) = 0 ]; then setpriv --bounding-set=-all --inh-caps=-all \"$@\"; "
+               "else \"$@\"; fi; }; cd '" +
                path("") + "'; {\n" + command + "\n}";
     }
 

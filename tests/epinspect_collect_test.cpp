@@ -100,11 +100,11 @@ const Case cases[] = {
      "grep -ao 'pathHex[^}]*' c/collection.json; for x in x 0 00; do sed \"s/pathHex...../&$x/\" c/collection.json >j; "
      "cp -r c d; cp j d/collection.json; epinspect --root d list 2>&1 | grep -c damaged; done", 0,
      "11 files …\n1\npathHex\":\"2f766f6c756d65322f4069534353492f4c554e2f6eff\"\n1\n1\n1\n", ""},
-    {"names what it may not read", "chmod 0 own" + table2 + "; setpriv --bounding-set=-all --inh-caps=-all epinspect "
+    {"names what it may not read", "chmod 0 own" + table2 + "; closed epinspect "
      "--root own collect c", 1, "10 files and 3 LUNs …: c\n", "epinspect: " + table2 + ": cannot be opened: Permission "
      "denied (EP_ERR_OPEN_FAILED, 18990038)\n" + incomplete},
     {"is damaged where its list may not be read", "epinspect --root own collect c >/dev/null; "
-     "chmod 0 c/collection.json; setpriv --bounding-set=-all --inh-caps=-all epinspect --root c list", 1, "",
+     "chmod 0 c/collection.json; closed epinspect --root c list", 1, "",
      "epinspect: c/collection.json: …Permission denied…\n"},
     damaged("whose list is not JSON", "echo '{' >collection.json", "not JSON"),
     damaged("whose list lacks something", "sed -i s/complete/x/ collection.json", "not a collection's list"),

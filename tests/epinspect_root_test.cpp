@@ -13,14 +13,11 @@ protected:
     }
 };
 
-/// Shell functions: the extent sizes that dump shows of tables below r, and the program without a superuser's rights;
-/// then a LUN list below r, of LUN 3 with its map below a folder; and below r a link `b/b` that leads deeper than a
-/// path may be long, with a link there that leads out of r and one that does not.
+/// Shell functions: the extent sizes that dump shows of tables below r; then a LUN list below r, of LUN 3 with its map
+/// below a folder; and below r a link `b/b` that leads deeper than a path may be long, with a link there that leads out
+/// of r and one that does not.
 const std::string tables =
                       "t() { epinspect --root r dump --json \"$@\" | grep -oE 'tSize.:[0-9]*|\"error.:.[A-Z_]*'; };",
-                  closed =
-                      "closed() { if [ $(id -u) = 0 ]; then setpriv --bounding-set=-all --inh-caps=-all \"$@\"; "
-                      "else \"$@\"; fi; };",
                   lun =
                       "lun() { mkdir -p r/var/db/iscsi; printf '[{\"lid\":3,\"extentSize\":4096,\"size\":4096,"
                       "\"restoreTime\":0,\"type\":7,\"uuid\":\"u\",\"rootPath\":\"%s\",\"name\":\"n\"}]' \"$1\" "
@@ -83,7 +80,7 @@ const Case cases[] = {
      "mkdir -p r/@iSCSI \"r$m\"; cp map \"r$m/THINun_00000\"; for c in list 'find --pool 0' 'read 3'; do "
      "epinspect --root r $c; done | grep -ac 'LUN 3'", 0, "2\n",
      "…LUN 3 bytes 0-4095: path names no volume (EP_ERR_NO_PATH, 18990401)\n…"},
-    {"a map is missing only where nothing is", lun + closed + "mkdir -p r/volume1/@iSCSI/LUN; cp map r" + map +
+    {"a map is missing only where nothing is", lun + "mkdir -p r/volume1/@iSCSI/LUN; cp map r" + map +
      "; for p in /../../volume1 volume1 /volume1/@iSCSI/.. /volume3 $(printf %0256d 0); do lun $p;"
      " epinspect --root r lun 3 --json; "
      "done | grep -o 'missing.*'; lun /volume1; chmod 644 r/volume1/@iSCSI; "
@@ -116,7 +113,7 @@ const Case cases[] = {
      "cp map 'r/volume1/@iSCSI/LUN/a  b  c'; for c in 20 49 70 '' x 0; do COLUMNS=$c epinspect --root r list; done", 0,
      "map         24584\n      1 entry\n      /volume1/@iSCSI/LUN/a  b  c\n"
      "map         24584  1 entry\n      /volume1/@iSCSI/LUN/a  b  c\n" + abc + abc + abc + abc, "…"},
-    {"a closed folder is one message that names it", lun + closed + "lun /volume1; mkdir r/volume1/@iSCSI/LUN; "
+    {"a closed folder is one message that names it", lun + "lun /volume1; mkdir r/volume1/@iSCSI/LUN; "
      "cp map r" + map + "; cd r/volume1; >@iSCSI/EP/EP_FRI; for f in '000 @iSCSI/EP' '444 @iSCSI/EP' "
      "'311 @iSCSI/EP' '600 @iSCSI' '600 .'; do chmod $f; (cd ..; closed epinspect --root . list --luns 3; echo $?); "
      "chmod 755 \"$PWD\"; chmod -R u=rwX .; done 2>../../err | grep -v jnl; cat ../../err >&2", 0,

@@ -26,8 +26,9 @@ const Case cases[] = {
      "epsample: DIR is missing\nTry 'epsample --help'.\nepsample: 'b': only one DIR is possible\n…"
      "--map-entries: '1x' is not a number from 0 to 4294967296\n…'4294967297' is not a number from 0 to 4294967296\n…"
      "--map-entries and --broken exclude each other\n…epsample: DIR…"},
-    {"names an image that is missing", "epsample --disk none d", 1, "",
-     "epsample: none: No such file or directory\nepsample: d: what has been written is not a whole store\n"},
+    {"names an image that may not be read", "echo x >i; chmod 0 i; closed "
+     "epsample --disk i d", 1, "",
+     "epsample: i: Permission denied\nepsample: d: what has been written is not a whole store\n"},
     {"helps", "epsample -h | head -n 1; epsample --version; epsample --help >/dev/full", 1,
      "Usage: epsample …\nepsample 1.0.0\n", "epsample: standard output: …\n"},
 };
