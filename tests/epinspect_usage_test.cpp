@@ -93,11 +93,11 @@ const Case cases[] = {
      R"("changed":[]})" "\n", ""},
     {"is not sure where a map cannot be read", "rm r" + luns + "THIN1*; " + of + "usage 2; " +
      of + "usage --json | grep -o 'lid\":[0-9]*,\"e\\|alone[^,]*,\\|unclaimed[^,]*,\\|"
-     "shared\":null,\"sharedAtLeast\":0,\"ch' | LC_ALL=C sort -u", 0,
+     "shared\":0,\"sharedAtLeast\":0,\"ch' | LC_ALL=C sort -u", 0,
      "…LUN 2               4                 4                4        at most 4    at least 0\n…"
      "EP_DAT_00000        3        at least 2        at most 1 …, at least 0 shared by\nseveral maps\n"
      "alone\":null,\naloneAtMost\":0,\naloneAtMost\":4,\naloneBytes\":null,\n"
-     "lid\":2,\"e\nlid\":4,\"e\nshared\":null,\"sharedAtLeast\":0,\"ch\n"
+     "lid\":2,\"e\nlid\":4,\"e\nshared\":0,\"sharedAtLeast\":0,\"ch\n"
      "unclaimed\":null,\nunclaimedAtMost\":0,\nunclaimedAtMost\":1,\nunclaimedBytes\":null,\n",
      "epinspect: " + luns + "THIN1_00000: cannot be opened: No such file or directory (EP_ERR_OPEN_FAILED, 18990038)\n"
      "…"},

@@ -196,12 +196,9 @@ void UsageOutput::printSummary() const {
             .number("maps", maps_)
             .number("dataFiles", dataFiles_.size())
             .number("mapped", mapped_)
-            .number("extents", extents_);
-        if (isSure_) {
-            json.number("shared", shared_);
-        } else {
-            json.null("shared").number("sharedAtLeast", shared_);
-        }
+            .number("extents", extents_)
+            .number("shared", shared_);
+        if (!isSure_) json.number("sharedAtLeast", shared_);
         json.texts("changed", session_.changedFiles());
         if (!isAll_) json.boolean("incomplete", true);
         json.end();
