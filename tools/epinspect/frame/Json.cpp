@@ -37,8 +37,10 @@ Json::Json(const std::string& file, const std::vector<std::uint32_t>& lids)
 }
 
 Json& Json::begin(const char* kind) {
+    if (kind != kind_) begin_ = std::string(R"({"kind":")") + kind + "\"," + file_;
+    kind_ = kind;
     line_.clear();
-    line_.add(R"({"kind":")", kind, "\",", file_);
+    line_.add(begin_);
     inner_ = true;
     return *this;
 }

@@ -19,7 +19,7 @@ public:
     /// map it is, as far as they are known: "lid" the first, and "lids" all where there are several.
     explicit Json(const std::string& file, const std::vector<std::uint32_t>& lids = {});
 
-    /// Starts an object: "kind" and "file".
+    /// Starts an object: "kind", a literal, and "file".
     Json& begin(const char* kind);
 
     /// Ends the object and prints its line. Throws OutputFailure.
@@ -95,7 +95,9 @@ private:
 
     void anyKey(std::string_view name);
 
-    std::string file_;  ///< the members that tell the file, ready to be written
+    std::string file_;            ///< the members that tell the file, ready to be written
+    const char* kind_ = nullptr;  ///< of the object before
+    std::string begin_;           ///< how it began
     LineBuffer line_;
     bool inner_ = false;  ///< a comma must come before the next member
 };
