@@ -138,6 +138,7 @@ TEST_F(ProgramOnStore, EndsInOrderWhereverMemoryRunsOut) {
 
 TEST_F(ProgramOnStore, NeverTakesForSoundWhatMemoryDidNotHold) {
     const std::string root = path("store");
+    unsetenv("KELPISCSIEP_LUNS");
     for (const std::vector<const char*>& words :
          {std::vector<const char*>{"check"}, {"usage"}, {"owner", "/volume1/@iSCSI/EP/EP_DAT_00000", "30000"}}) {
         std::vector<const char*> all = {"epinspect", "--root", root.c_str()};
